@@ -1,0 +1,35 @@
+# Independent libraries used only by tests and benchmarks as oracles and peers.
+# The product never links them. Each found library gives an imported target
+# and a variable ZT_HAVE_<NAME>.
+find_path(ZT_CLIPPER_INCLUDE polyclipping/clipper.hpp)
+find_library(ZT_CLIPPER_LIB polyclipping)
+if(ZT_CLIPPER_INCLUDE AND ZT_CLIPPER_LIB)
+  set(ZT_HAVE_CLIPPER ON)
+  add_library(oracle_clipper INTERFACE IMPORTED)
+  target_include_directories(oracle_clipper INTERFACE ${ZT_CLIPPER_INCLUDE})
+  target_link_libraries(oracle_clipper INTERFACE ${ZT_CLIPPER_LIB})
+endif()
+
+find_path(ZT_BOOST_POLYGON_INCLUDE boost/polygon/voronoi.hpp)
+if(ZT_BOOST_POLYGON_INCLUDE)
+  set(ZT_HAVE_BOOST ON)
+  add_library(oracle_boost INTERFACE IMPORTED)
+  target_include_directories(oracle_boost INTERFACE ${ZT_BOOST_POLYGON_INCLUDE})
+endif()
+
+find_path(ZT_GEOS_INCLUDE geos_c.h)
+find_library(ZT_GEOS_LIB geos_c)
+if(ZT_GEOS_INCLUDE AND ZT_GEOS_LIB)
+  set(ZT_HAVE_GEOS ON)
+  add_library(oracle_geos INTERFACE IMPORTED)
+  target_include_directories(oracle_geos INTERFACE ${ZT_GEOS_INCLUDE})
+  target_link_libraries(oracle_geos INTERFACE ${ZT_GEOS_LIB})
+endif()
+
+foreach(o CLIPPER BOOST GEOS)
+  if(ZT_HAVE_${o})
+    message(STATUS "oracle ${o}: found")
+  else()
+    message(WARNING "oracle ${o}: NOT found - the tests and benchmarks that need it are skipped")
+  endif()
+endforeach()
