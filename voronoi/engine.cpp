@@ -12,15 +12,6 @@ namespace zt {
 
 using namespace zt::vd;
 
-namespace vd {
-
-Engine& Vd() {
-  static Engine* engine = new Engine;  // process-wide, never destroyed
-  return *engine;
-}
-
-}  // namespace vd
-
 namespace {
 
 // A corner dummy value in points-only mode replaces a bound factor of 1.
