@@ -177,3 +177,43 @@ TEST(PointDiagram, CornerPointsReturnToTheirSlotsAfterARepairAppendedAPoint) {
 
 }  // namespace
 }  // namespace zt
+
+namespace zt {
+namespace {
+
+using namespace vdtest;
+
+TEST(PointDiagram, CornerPointsFixTheMaximalOffset) {
+  Store({{0, 0}, {1, 0}, {1, 1}, {0, 1}});
+  ASSERT_TRUE(ComputePoints());  // points only: bound factor 1 becomes 5
+  const vd::Engine& g = vd::Vd();
+  const double w = 5.01;
+  EXPECT_DOUBLE_EQ(g.maxOffset, 0.49 * std::sqrt(2 * w * w));
+  EXPECT_EQ(g.points[0].x, -w);
+  EXPECT_EQ(g.points[0].y, -w);
+  EXPECT_EQ(g.points[g.points.count - 1].x, 1 + w);
+  EXPECT_EQ(g.points[g.points.count - 2].y, -w);
+  // A wide box: the height margin is raised to half the width margin.
+  Store({{0, 0}, {1, 0.1}});
+  ASSERT_TRUE(VD_ComputeDiagram(false, 2, true, false, 0, 0, 0.0, 0.0, true));
+  EXPECT_DOUBLE_EQ(g.points[1].y - 0.1, 2.01 / 2);
+}
+
+TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
+  // Every pair closer than the merge distance costs one restart.
+  std::vector<Pt> pts{{0, 0}, {1, 1}};
+  for (int i = 0; i < 600; ++i) {
+    const double x = (i + 0.5) / 601.0, y = std::fmod(i * 0.618, 1.0);
+    pts.push_back({x, y});
+    pts.push_back({x + 1e-13, y});
+  }
+  EXPECT_EXIT(
+      {
+        Store(pts);
+        ComputePoints();
+      },
+      testing::ExitedWithCode(2), "\nerror in ComputeVD\\(\\) - aborting computation -- too many restarts!");
+}
+
+}  // namespace
+}  // namespace zt
