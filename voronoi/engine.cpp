@@ -7,6 +7,7 @@
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/point_insertion.hpp"
 
 namespace zt {
 
@@ -124,6 +125,7 @@ void VD_Terminate() {
   g.stack.Free();
   g.offsetCurves.Free();
   g.offsetElements.Free();
+  ReleaseInsertionScratch();
   g.initialised = false;
 }
 

@@ -168,6 +168,13 @@ RecordArray<Cut> gCuts;
 
 }  // namespace
 
+void ReleaseInsertionScratch() {
+  gLeaving.Free();
+  gTreeEdges.Free();
+  gCuts.Free();
+  gFrames.Free();
+}
+
 void InsertPoint(std::int32_t p) {
   Engine& g = Vd();
   PointRecord& pt = g.points[p];
