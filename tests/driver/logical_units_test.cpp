@@ -161,5 +161,26 @@ TEST_F(RecordStops, WritingFaults) {
               "unit 9");
 }
 
+// Regression: a run that stops on a fault leaves no half-written record file
+// (it would have no end marker, or worse, look complete); a finished one stays.
+TEST_F(RecordStops, RegressionIncompleteOutputIsRemoved) {
+  const std::string in = dir.file("short.bin");
+  test::write_bytes(in, test::record_file({Bytes(4, 0)}));
+  const std::string done = dir.file("done.bin");
+  const std::string out = dir.file("stock2.bin");
+  auto stop_while_writing = [&] {
+    attach_record_output(4, done);
+    close_unit(4);
+    attach_record_output(5, out);
+    const Point2f sq[] = {{0, 0}, {1, 0}, {0, 0}};
+    std::int32_t ierr = 0;
+    write_contour(3, sq, 1.0f, 5, ierr);
+    read_all(in);
+  };
+  EXPECT_EXIT(stop_while_writing(), ::testing::ExitedWithCode(15), "short.bin\", record 1");
+  EXPECT_FALSE(std::filesystem::exists(out));
+  EXPECT_EQ(test::read_bytes(done), (Bytes{0x4b, 0x82}));
+}
+
 }  // namespace
 }  // namespace zt
