@@ -3,10 +3,13 @@
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cmath>
 #include <random>
+#include <string>
 #include <vector>
 
 namespace {
@@ -263,3 +266,28 @@ TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
 }
 
 }  // namespace
+
+// zonetool simplify's text form: blank lines only between polylines, shortest
+// numbers, bad input refused with status 2.
+TEST(ZonetoolSimplify, TextRoundTrip) {
+  const std::string tool = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool";
+  if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
+  auto run = [&](const std::string& args, const std::string& input, int& status) {
+    const std::string cmd = "printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null";
+    FILE* p = popen(cmd.c_str(), "r");
+    if (!p) return std::string("popen failed");
+    std::string out;
+    char buf[256];
+    for (size_t n; (n = fread(buf, 1, sizeof buf, p)) > 0;) out.append(buf, n);
+    status = WEXITSTATUS(pclose(p));
+    return out;
+  };
+  int status = -1;
+  EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),
+            "0 0\n2.5 0\n\n1 1\n");
+  EXPECT_EQ(status, 0);
+  run("--tolerance 0.01", "1 2 3\\n", status);
+  EXPECT_EQ(status, 2);
+  run("--tolerance -1", "", status);
+  EXPECT_EQ(status, 2);
+}
