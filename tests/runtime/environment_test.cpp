@@ -61,6 +61,14 @@ TEST_F(ConfigFileTest, MalformedLinesWarnAndAreSkipped) {
   EXPECT_EQ(var("OK"), "1");
   ASSERT_TRUE(load("[var]\n" + std::string(1022, 'y') + "=1\n"));  // 1024 characters fit
   EXPECT_EQ(var(std::string(1022, 'y')), "1");
+  // A section name of 100 characters or more: its entries are skipped, not
+  // filed under the previous section.
+  warnings.clear();
+  ASSERT_TRUE(load("[var]\n[" + std::string(100, 's') + "]\nLOST = 1\n[var]\nKEPT = 1\n"));
+  EXPECT_EQ(var("LOST"), "<none>");
+  EXPECT_EQ(var("KEPT"), "1");
+  ASSERT_EQ(warnings.size(), 1u);
+  EXPECT_EQ(warnings[0], fatal_text(2, "Section name too long"));
 }
 
 TEST_F(ConfigFileTest, ConditionsSelectLines) {

@@ -117,6 +117,8 @@ TEST_F(ErrorReportTest, FatalReportAndExitStatus) {
   std::filesystem::remove(path("tmp/kvlerror.prg"));
   EXPECT_EXIT(report_fatal(0, "x", 1), ::testing::ExitedWithCode(255), "");
   EXPECT_EXIT(report_fatal(-3, "x", 1), ::testing::ExitedWithCode(253), "");
+  // Regression: 256 used to end with the status 0 of a normal end.
+  EXPECT_EXIT(report_fatal(256, "x", 1), ::testing::ExitedWithCode(255), "");
   EXPECT_NE(read_file("tmp/kvlerror.prg")->find("Error number -3: x"), std::string::npos);
 }
 

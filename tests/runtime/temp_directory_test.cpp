@@ -36,6 +36,10 @@ TEST_F(TempDirectoryTest, KvltmpdirIsTakenAsIs) {
   EXPECT_EQ(status, kExpandOk);
   EXPECT_TRUE(fatals.empty());          // KVLZONE is unset: it was never needed
   EXPECT_FALSE(exists("forced"));       // and nothing is created
+  // An empty KVLTMPDIR would put $TMP at the filesystem root: it counts as unset.
+  set_env("KVLTMPDIR", "");
+  EXPECT_EQ(temp_directory(), nullptr);
+  EXPECT_EQ(fatals.at(0), "KVLZONE is not defined\n");
 }
 
 TEST_F(TempDirectoryTest, NewWorkzoneTakesNextCounterNumber) {
