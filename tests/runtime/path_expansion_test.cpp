@@ -251,5 +251,25 @@ TEST_F(ExpansionTest, DeleteFileByExpandableName) {
   EXPECT_FALSE(exists("a,b"));
 }
 
+TEST_F(ExpansionTest, SmallBufferHuntingAids) {
+  set_env("KVL_EXPAND_MIN_BUFFER_SIZE", "-512");
+  set_env("KVL_EXPAND_LOGFILE_NAME", path("expand.log"));
+  expand("a", 512);  // in place: 512 is below 513
+  char out[600];
+  std::int32_t status;
+  expand_name("b", 1, out, 600, status);  // large enough: not logged
+  const std::string log = read_file("expand.log").value_or("");
+  EXPECT_EQ(log.rfind(" expanding 'a'", 0), 0u) << log;
+  EXPECT_NE(log.find("MinBufferSize="), std::string::npos);
+  EXPECT_EQ(log.find("'b'"), std::string::npos);
+  set_env("KVL_EXPAND_WATCH", "watched");
+  EXPECT_DEATH(expand("watched/name", 16), "");
+  unset_env("KVL_EXPAND_MIN_BUFFER_SIZE");
+  set_env("KVL_BUFFER_TOO_SMALL_OPTION", "crash");
+  EXPECT_DEATH(expand_name("toolong", 7, out, 4, status), "");
+  expand_name("fits", 4, out, 5, status);
+  EXPECT_EQ(status, kExpandOk);
+}
+
 }  // namespace
 }  // namespace zt
