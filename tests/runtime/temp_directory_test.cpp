@@ -101,8 +101,13 @@ TEST_F(TempDirectoryTest, UndefinedWorkzoneVariablesAreErrors) {
   EXPECT_NE(status, kExpandUndefined);
 
   fatals.clear();
+  set_env("KVLZONE", "");  // empty is no better than undefined
+  EXPECT_EQ(temp_directory(), nullptr);
+  EXPECT_EQ(fatals.at(0), "KVLZONE is not defined\n");
+
+  fatals.clear();
   new_workzone("0\n");
-  unset_env("KVLTMP");
+  set_env("KVLTMP", "");
   EXPECT_EQ(temp_directory(), nullptr);
   ASSERT_EQ(fatals.size(), 1u);
   EXPECT_EQ(fatals[0], "KVLTMP is not defined\n");
