@@ -3,6 +3,7 @@
 #include "runtime/environment.hpp"
 
 #include <algorithm>
+#include <random>
 #include <string>
 
 #include "runtime/detail/runtime_state.hpp"
@@ -166,6 +167,23 @@ TEST_F(ConfigFileTest, DoublingReferencesAreCut) {
   ASSERT_TRUE(load(content));
   EXPECT_LE(var("X").size(), kMaxResolvedValue);
   EXPECT_FALSE(warnings.empty());
+}
+
+// Random lines of configuration syntax: the reader ends every file with a
+// result, whatever the diagnostics (recorded here, so fatal ones return).
+TEST_F(ConfigFileTest, RandomFilesNeverCrash) {
+  const char* const pieces[] = {"/if ", "/else", "/endif", "/ifx", "(", ")", "{", "}", "==", "!=",
+                                "[var]", "[", "]", "=", "+", "++", "#", "##", " ", "\t", "\r",
+                                "\n", "X", "Y", "1", "\x01", "\xff"};
+  std::mt19937 random(777);
+  for (int round = 0; round < 300; ++round) {
+    std::string content;
+    for (int i = 0; i < 60; ++i) content += pieces[random() % std::size(pieces)];
+    load(content);
+    var("X");
+    var("Y");
+  }
+  SUCCEED();
 }
 
 class EnvironmentTest : public testing::RuntimeTest {};

@@ -3,6 +3,7 @@
 #include "runtime/path_expansion.hpp"
 
 #include <cstring>
+#include <random>
 #include <string>
 
 #include "runtime/environment.hpp"
@@ -242,6 +243,38 @@ TEST_F(ExpansionTest, DeleteFileByExpandableName) {
   delete_file("$D/a,b", 6, status);
   EXPECT_EQ(status, kExpandOk);
   EXPECT_FALSE(exists("a,b"));
+}
+
+// Random texts over the expansion's alphabet: only the documented statuses,
+// the buffer untouched on error, and a result that is a normalised path.
+TEST_F(ExpansionTest, RandomTextsKeepTheInvariants) {
+  set_env("A", "a/");
+  set_env("B", "$A\\$A");
+  set_env("CPATH", "?{B}");
+  const std::string alphabet = "$?{}()/\\ABCxy_";
+  std::mt19937 random(12345);
+  for (int round = 0; round < 3000; ++round) {
+    std::string input;
+    const int length = static_cast<int>(random() % 12);
+    for (int i = 0; i < length; ++i) input.push_back(alphabet[random() % alphabet.size()]);
+    const std::int32_t capacity = 1 + static_cast<std::int32_t>(random() % 24);
+    if (input.size() + 1 > static_cast<std::size_t>(capacity)) continue;
+    const Expanded e = expand(input, capacity);
+    switch (e.status) {
+      case kExpandOk:
+      case kExpandUndefined:
+        EXPECT_LT(e.text.size(), static_cast<std::size_t>(capacity)) << input;
+        EXPECT_EQ(e.text.find('\\'), std::string::npos) << input;
+        EXPECT_EQ(e.text.find("//"), std::string::npos) << input;
+        break;
+      case kExpandSyntax:
+      case kExpandTooSmall:
+        EXPECT_EQ(e.text, input);
+        break;
+      default:
+        ADD_FAILURE() << input << " gave " << e.status;
+    }
+  }
 }
 
 TEST_F(ExpansionTest, SmallBufferHuntingAids) {
