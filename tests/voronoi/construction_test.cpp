@@ -42,7 +42,10 @@ TEST(PointDiagram, ClusteredPointsTakeTheQuadtree) {
   const std::vector<Pt> pts = ClusteredPoints(6400, 7);
   Store(pts);
   CheckingObserver obs;
-  obs.every = 3;  // 2133 checks
+  // Every insertion up to 2000 (the search leaves the grid after 1536
+  // sampled points), then every 50th.
+  obs.allUpTo = 2000;
+  obs.every = 50;
   obs.Attach();
   ASSERT_TRUE(ComputePoints());
   EXPECT_TRUE(vd::Vd().usedQuadtree);
