@@ -7,7 +7,7 @@
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 PointSite pt(std::int32_t i, double x, double y) { return {i, {x, y}}; }
@@ -173,4 +173,4 @@ TEST(NodeExamples, OrientationMemoryIsSetOnlyByDegenerateLinesAndCanBeReset) {
 }
 
 }  // namespace
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

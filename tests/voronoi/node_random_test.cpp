@@ -10,7 +10,7 @@
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 // Oracle distance to a closed segment, written apart from the product's.
@@ -244,4 +244,4 @@ INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom,
                          [](const auto& info) { return std::string(info.param.name); });
 
 }  // namespace
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

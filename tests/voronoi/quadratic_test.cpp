@@ -6,7 +6,7 @@
 #include <algorithm>
 #include <cmath>
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 TEST(Quadratic, RootsDoNotDependOnScale) {
@@ -69,4 +69,4 @@ TEST(Quadratic, CancellationFreeSmallRoot) {
 }
 
 }  // namespace
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

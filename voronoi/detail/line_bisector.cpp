@@ -3,7 +3,7 @@
 
 #include <cmath>
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 bool line_bisector(const OrientedLine& l1, const SegSite& s1, const OrientedLine& l2, const SegSite& s2,
                    Point2d ref, LineBisector& out) {
@@ -43,4 +43,4 @@ bool line_bisector(const OrientedLine& l1, const SegSite& s1, const OrientedLine
   return true;
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -5,7 +5,7 @@
 
 #include "voronoi/detail/node_geometry.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // A segment's line, possibly negated so that the node sought lies on its
 // positive side.
@@ -32,4 +32,4 @@ struct LineBisector {
 bool line_bisector(const OrientedLine& l1, const SegSite& s1, const OrientedLine& l2, const SegSite& s2,
                    Point2d ref, LineBisector& out);
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -7,7 +7,7 @@
 
 #include "voronoi/detail/root_selection.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 Point2d lerp(Point2d a, Point2d b, double u) { return {a.x + (b.x - a.x) * u, a.y + (b.y - a.y) * u}; }
@@ -112,4 +112,4 @@ bool search_or_copy(const EdgeFrame& e, const SiteRef& s, NodeResult& out) {
   return copy_kept_node(e, out);
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -11,7 +11,7 @@
 
 #include "voronoi/detail/node_geometry.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // The point of edge e at u in [0, 1], from the kept end node (0) to the
 // deleted one (1): straight for edges between two points, two segments, or a
@@ -35,4 +35,4 @@ bool finish_node(const EdgeFrame& e, const SiteRef& s, Point2d n, double r, Node
 // No closed form: bisects, else copies. Always true.
 bool search_or_copy(const EdgeFrame& e, const SiteRef& s, NodeResult& out);
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

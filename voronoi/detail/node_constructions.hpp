@@ -13,7 +13,7 @@
 
 #include "voronoi/detail/node_geometry.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // Two points p, q and a segment s; `fresh` is the new site (one of the three).
 bool node_pps(const EdgeFrame& e, const SiteRef& fresh, const PointSite& p, const PointSite& q, const SegSite& s,
@@ -33,4 +33,4 @@ bool node_sss(const EdgeFrame& e, const SiteRef& fresh, const SegSite& sa, const
 bool compute_node(const EdgeFrame& e, const SiteRef& fresh, NodeMemory& memory, SuspectPair& suspect,
                   NodeResult& out);
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -1,7 +1,7 @@
 // Dispatch of the node constructions by site kinds.
 #include "voronoi/detail/node_constructions.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 bool compute_node(const EdgeFrame& e, const SiteRef& fresh, NodeMemory& memory, SuspectPair& suspect,
                   NodeResult& out) {
@@ -27,4 +27,4 @@ bool compute_node(const EdgeFrame& e, const SiteRef& fresh, NodeMemory& memory, 
   return false;
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -3,7 +3,7 @@
 
 #include <cmath>
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 double distance(Point2d u, Point2d v) { return std::hypot(u.x - v.x, u.y - v.y); }
 
@@ -53,4 +53,4 @@ double SiteRef::strip_dist(Point2d q, double band) const {
   return std::fabs(seg.D(q));
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

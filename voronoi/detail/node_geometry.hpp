@@ -12,15 +12,16 @@
 
 #include <cstdint>
 
+#include "voronoi/detail/records.hpp"
 #include "zone/core/points.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // Site kinds as the diagram codes them.
-inline constexpr std::int32_t kKindSeg = 0;
-inline constexpr std::int32_t kKindArc = 1;
-inline constexpr std::int32_t kKindPnt = 2;
-inline constexpr std::int32_t kKindNone = 8;
+inline constexpr std::int32_t kKindSeg = SEG;
+inline constexpr std::int32_t kKindArc = ARC;
+inline constexpr std::int32_t kKindPnt = PNT;
+inline constexpr std::int32_t kKindNone = kNoSiteKind;
 
 // A point, or the line through a segment, at or within this distance of
 // another site counts as lying on it (degenerate input).
@@ -157,4 +158,4 @@ struct NodeMemory {
   void reset() { orient_by_kept = false; }
 };
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

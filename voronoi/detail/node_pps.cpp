@@ -7,7 +7,7 @@
 #include "voronoi/detail/quadratic.hpp"
 #include "voronoi/detail/root_selection.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 // Neither point ends the segment: the node lies on the bisector of the two
@@ -83,4 +83,4 @@ bool node_pps(const EdgeFrame& e, const SiteRef& fresh, const PointSite& p0, con
   return search_or_copy(e, fresh, out);
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -8,7 +8,7 @@
 #include "voronoi/detail/quadratic.hpp"
 #include "voronoi/detail/root_selection.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 double sign_of(double v) { return v > 0.0 ? 1.0 : (v < 0.0 ? -1.0 : 0.0); }
@@ -121,4 +121,4 @@ bool node_pss(const EdgeFrame& e, const SiteRef& fresh, const PointSite& p, cons
   return pss_general(e, fresh, p, s1, s2, memory, suspect, out);
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -8,7 +8,7 @@
 #include "voronoi/detail/quadratic.hpp"
 #include "voronoi/detail/root_selection.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 // Pivots at or below this: two of the lines are parallel.
@@ -106,4 +106,4 @@ bool node_sss(const EdgeFrame& e, const SiteRef& fresh, const SegSite& sa, const
   return finish_node(e, fresh, node, std::fabs(ll.D(node)), out);
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

@@ -3,7 +3,7 @@
 
 #include <cmath>
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 int normalize_quadratic(QuadCoefs& q) {
   int steps = 0;
@@ -48,4 +48,4 @@ QuadRoots solve_quadratic(QuadCoefs q) {
   return r;
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

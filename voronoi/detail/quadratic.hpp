@@ -8,7 +8,7 @@
 // apart by the thresholds below, never by exact comparison with zero.
 #pragma once
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // Coefficients up to this magnitude count as "small" for the rescaling.
 inline constexpr double kQuadSmall = 1.0 / 128.0;
@@ -38,4 +38,4 @@ struct QuadRoots {
 // Normalises a copy of the coefficients and solves.
 QuadRoots solve_quadratic(QuadCoefs q);
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

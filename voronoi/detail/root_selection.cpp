@@ -4,7 +4,7 @@
 #include <algorithm>
 #include <cmath>
 
-namespace zt::detail {
+namespace zt::vd::geo {
 namespace {
 
 bool is_own_end(const SiteRef& seg, const SiteRef& pnt) {
@@ -85,4 +85,4 @@ bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain
   return !(norm2(sub(n2, g)) < norm2(sub(n1, g)));
 }
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo

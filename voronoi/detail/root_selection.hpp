@@ -13,7 +13,7 @@
 
 #include "voronoi/detail/node_geometry.hpp"
 
-namespace zt::detail {
+namespace zt::vd::geo {
 
 // Signed position of end node x along the edge relative to candidate c, as a
 // length: cross product along the bisector of two points, across the line of a
@@ -41,4 +41,4 @@ struct RootChain {
 // True when the first candidate wins.
 bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain& chain);
 
-}  // namespace zt::detail
+}  // namespace zt::vd::geo
