@@ -176,6 +176,8 @@ bool VD_ComputeDiagram(bool clean, std::int32_t boundFactor, bool pointsOnly, bo
                        std::int32_t sampleDensity, std::int32_t arcPieces, double arcTolerance,
                        double arcTolerance2, bool autoArcTolerance) {
   Engine& g = Vd();
+  // A second computation of the same input starts from the caller's input.
+  ReopenInput();
   // Refuse what the scaling and the search grid cannot take: a non-finite
   // coordinate would make the scaling loop spin and the grid index garbage.
   const std::int32_t realEnd = g.dummiesAdded ? g.points.count - 2 : g.points.count;
