@@ -51,16 +51,89 @@ Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rm
   return c;
 }
 
-TEST(SegmentDiagram, StarPolygons) {
-  for (int n : {4, 5, 10, 30, 100, 400}) {
-    for (std::uint32_t seed = 1; seed <= 6; ++seed) {
-      StoreContours({StarPolygon(n, seed * 7919 + n)});
-      ASSERT_TRUE(ComputeSegments()) << n << " " << seed;
-      ASSERT_EQ(FinalCheck(), "") << n << " " << seed;
-      EXPECT_EQ(VD_GetRestartCount(), 0) << n << " " << seed;
-      EXPECT_FALSE(VD_InRecoveryMode()) << n << " " << seed;
+Contour Reversed(Contour c) {
+  std::reverse(c.begin(), c.end());
+  return c;
+}
+
+// A circle approximated by n chord points.
+Contour Circle(int n, Pt centre, double r, double phase = 0.1) {
+  Contour c;
+  for (int i = 0; i < n; ++i) {
+    const double a = phase + 2 * M_PI * i / n;
+    c.push_back({centre.x + r * std::cos(a), centre.y + r * std::sin(a)});
+  }
+  return c;
+}
+
+// A rectilinear staircase: axis-parallel edges only.
+Contour Staircase(int steps, double size) {
+  Contour c{{0, 0}};
+  const double h = size / steps;
+  for (int i = 0; i < steps; ++i) {
+    c.push_back({(i + 1) * h, i * h});
+    c.push_back({(i + 1) * h, (i + 1) * h});
+  }
+  c.push_back({0, size});
+  return c;
+}
+
+// A square with k collinear points on each side.
+Contour DenseSquare(int k, double size, double at = 0.0) {
+  Contour c;
+  for (int side = 0; side < 4; ++side) {
+    for (int i = 0; i < k; ++i) {
+      const double t = size * i / k;
+      const Pt p = side == 0 ? Pt{t, 0} : side == 1 ? Pt{size, t} : side == 2 ? Pt{size - t, size} : Pt{0, size - t};
+      c.push_back({p.x + at, p.y + at});
     }
   }
+  return c;
+}
+
+// Computes with the checker after every insertion; returns the first error.
+std::string RunChecked(const std::vector<Contour>& contours, int every = 1) {
+  StoreContours(contours);
+  CheckingObserver obs;
+  obs.every = every;
+  obs.Attach();
+  if (!ComputeSegments()) return "not computed";
+  if (!obs.firstError.empty()) return obs.firstError;
+  return FinalCheck();
+}
+
+void ExpectClean(const std::vector<Contour>& contours, const std::string& what, int every = 1) {
+  EXPECT_EQ(RunChecked(contours, every), "") << what;
+  EXPECT_EQ(VD_GetRestartCount(), 0) << what;
+  EXPECT_FALSE(VD_InRecoveryMode()) << what;
+}
+
+TEST(SegmentDiagram, StarPolygons) {
+  for (int n : {4, 5, 10, 30, 100}) {
+    for (std::uint32_t seed = 1; seed <= 6; ++seed) {
+      ExpectClean({StarPolygon(n, seed * 7919 + n)}, "star " + std::to_string(n) + " seed " + std::to_string(seed));
+    }
+  }
+  ExpectClean({StarPolygon(2000, 5)}, "star 2000", 97);
+}
+
+TEST(SegmentDiagram, NestedContoursWithHoles) {
+  for (std::uint32_t seed = 1; seed <= 5; ++seed) {
+    ExpectClean({StarPolygon(40, seed, {0.5, 0.5}, 0.4, 0.48), Reversed(StarPolygon(12, seed + 100, {0.5, 0.5}, 0.1, 0.2)),
+                 Reversed(Circle(16, {0.5, 0.5}, 0.3, 0.05 * seed))},
+                "nested " + std::to_string(seed));
+  }
+}
+
+TEST(SegmentDiagram, AxisAlignedAndCollinearContours) {
+  ExpectClean({Staircase(20, 1.0)}, "staircase");
+  ExpectClean({DenseSquare(10, 1.0)}, "dense square");
+  ExpectClean({DenseSquare(7, 3.0), Reversed(DenseSquare(3, 1.0, 1.0))}, "dense squares nested");
+}
+
+TEST(SegmentDiagram, ChordPointsOfArcs) {
+  ExpectClean({Circle(64, {0, 0}, 10.0)}, "circle 64");
+  ExpectClean({Circle(200, {5, 5}, 1.0), Reversed(Circle(50, {5, 5}, 0.5))}, "annulus");
 }
 
 }  // namespace
