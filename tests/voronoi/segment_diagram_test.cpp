@@ -114,7 +114,41 @@ TEST(SegmentDiagram, StarPolygons) {
       ExpectClean({StarPolygon(n, seed * 7919 + n)}, "star " + std::to_string(n) + " seed " + std::to_string(seed));
     }
   }
-  ExpectClean({StarPolygon(2000, 5)}, "star 2000", 97);
+  ExpectClean({StarPolygon(5000, 5)}, "star 5000", 997);
+}
+
+bool Cross(Pt a, Pt b, Pt c, Pt d) {
+  const auto o = [](Pt p, Pt q, Pt r) { return (q.x - p.x) * (r.y - p.y) - (q.y - p.y) * (r.x - p.x); };
+  return o(a, b, c) * o(a, b, d) < 0 && o(c, d, a) * o(c, d, b) < 0;
+}
+
+// A random simple polygon: random points, crossings removed by 2-opt moves.
+Contour RandomSimplePolygon(int n, std::uint32_t seed) {
+  std::mt19937 rng(seed);
+  std::uniform_real_distribution<double> u(0.0, 1.0);
+  Contour c(n);
+  for (Pt& p : c) p = {u(rng), u(rng)};
+  for (bool changed = true; changed;) {
+    changed = false;
+    for (int i = 0; i < n; ++i) {
+      for (int j = i + 2; j < n; ++j) {
+        if (i == 0 && j == n - 1) continue;
+        if (Cross(c[i], c[i + 1], c[j], c[(j + 1) % n])) {
+          std::reverse(c.begin() + i + 1, c.begin() + j + 1);
+          changed = true;
+        }
+      }
+    }
+  }
+  return c;
+}
+
+TEST(SegmentDiagram, RandomSimplePolygons) {
+  for (int n : {10, 40, 150}) {
+    for (std::uint32_t seed = 1; seed <= 4; ++seed) {
+      ExpectClean({RandomSimplePolygon(n, seed * 31 + n)}, "polygon " + std::to_string(n) + " seed " + std::to_string(seed));
+    }
+  }
 }
 
 TEST(SegmentDiagram, NestedContoursWithHoles) {

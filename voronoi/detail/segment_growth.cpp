@@ -148,9 +148,6 @@ bool PlaceOnRay(std::int32_t e, std::int32_t p, Point2d u, double tol) {
   const NodeRecord& b = g.nodes[er.n2];
   if (!(a.r > kZeroRadius) || !(b.r > kZeroRadius)) return false;
   const Point2d pp{g.points[p].x, g.points[p].y};
-  const double sa = geo::cross(u, {a.x - pp.x, a.y - pp.y});
-  const double sb = geo::cross(u, {b.x - pp.x, b.y - pp.y});
-  if (!((sa > kSideBand && sb < -kSideBand) || (sa < -kSideBand && sb > kSideBand))) return false;
   // The edge's site other than p.
   std::int32_t site, kind;
   if (er.lft == p && er.ltype == PNT) {
@@ -161,6 +158,15 @@ bool PlaceOnRay(std::int32_t e, std::int32_t p, Point2d u, double tol) {
     kind = er.ltype;
   } else {
     return false;
+  }
+  // A straight edge meets the ray's line once, between end nodes on opposite
+  // sides of it. A parabola around p (a segment not ending at p) may meet it
+  // twice with both end nodes on one side: there the foot positions decide.
+  const bool parabola = kind == SEG && g.segments[site].i1 != p && g.segments[site].i2 != p;
+  if (!parabola) {
+    const double sa = geo::cross(u, {a.x - pp.x, a.y - pp.y});
+    const double sb = geo::cross(u, {b.x - pp.x, b.y - pp.y});
+    if (!((sa > kSideBand && sb < -kSideBand) || (sa < -kSideBand && sb > kSideBand))) return false;
   }
   double t;
   if (kind == PNT) {
