@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "tests/voronoi/vd_test_util.hpp"
+#include "voronoi/detail/segment_checks.hpp"
 
 namespace zt::vdtest {
 namespace {
@@ -99,7 +100,8 @@ std::string RunChecked(const std::vector<Contour>& contours, int every = 1) {
   obs.Attach();
   if (!ComputeSegments()) return "not computed";
   if (!obs.firstError.empty()) return obs.firstError;
-  return FinalCheck();
+  const std::string error = FinalCheck();
+  return error.empty() ? vd::CheckSegmentEdges() : error;
 }
 
 void ExpectClean(const std::vector<Contour>& contours, const std::string& what, int every = 1) {
