@@ -12,15 +12,6 @@ namespace zt {
 
 using namespace zt::vd;
 
-namespace vd {
-
-Engine& Vd() {
-  static Engine* engine = new Engine;  // process-wide, never destroyed
-  return *engine;
-}
-
-}  // namespace vd
-
 namespace {
 
 // A corner dummy value in points-only mode replaces a bound factor of 1.
@@ -232,6 +223,12 @@ std::int32_t VD_GetDuplicateCount() { return Vd().duplicatePoints; }
 std::int32_t VD_GetNodeCount() { return Vd().nodes.count; }
 std::int32_t VD_GetEdgeCount() { return Vd().edges.count; }
 std::int32_t VD_GetPointCount() { return Vd().points.count; }
+std::int32_t VD_GetPointTag(std::int32_t point) {
+  return Vd().points.Valid(point) ? Vd().points[point].tag : -1;
+}
+std::int32_t VD_GetSegmentTag(std::int32_t segment) {
+  return Vd().segments.Valid(segment) ? Vd().segments[segment].tag : -1;
+}
 
 VD_NodeInfo VD_GetNode(std::int32_t i) {
   const Engine& g = Vd();

@@ -67,5 +67,8 @@ VD_NodeInfo VD_GetNode(std::int32_t i);
 VD_EdgeInfo VD_GetEdge(std::int32_t i);
 // Number of stored points including the reserved and corner slots.
 std::int32_t VD_GetPointCount();
+// The caller's tag of a point or segment site (-1 for an unknown index).
+std::int32_t VD_GetPointTag(std::int32_t point);
+std::int32_t VD_GetSegmentTag(std::int32_t segment);
 
 }  // namespace zt

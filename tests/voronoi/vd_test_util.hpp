@@ -10,6 +10,8 @@
 #include <vector>
 
 #include "voronoi/detail/checker.hpp"
+#include "voronoi/detail/compute_vd.hpp"
+#include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/engine.hpp"
 

@@ -132,7 +132,11 @@ struct Engine {
   void* insertionObserverContext = nullptr;
 };
 
-Engine& Vd();
+// Created on first use, never destroyed.
+inline Engine& Vd() {
+  static Engine* const engine = new Engine;
+  return *engine;
+}
 
 // Internal <-> user coordinates of the current transform.
 inline double ToUserX(double x) { return x / Vd().scale + Vd().shiftX; }
