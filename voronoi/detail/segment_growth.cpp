@@ -41,9 +41,11 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
     std::int32_t e = e0;
     do {
       const EdgeRecord er = g.edges[e];
+      const std::int32_t w = OtherNode(er, n);
+      g.edges.Prefetch(CcwAt(er, n));
+      g.nodes.Prefetch(w);
       RecordSite(er.lft, er.ltype);
       RecordSite(er.rgt, er.rtype);
-      const std::int32_t w = OtherNode(er, n);
       const NodeRecord& wn = g.nodes[w];
       if (wn.status == UNCHECKED) {
         if (wn.site >= 0) {
@@ -53,6 +55,9 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
         } else if (!IsFarNode(w) && ConflictValue(si, w, tol) <= tol) {
           TouchNode(w, VISITED);
           g.stack.Append(w, kScratchGrowth);
+          // The growth goes on from w along its other edges.
+          g.edges.Prefetch(CcwAt(er, w));
+          g.edges.Prefetch(CwAt(er, w));
         } else {
           TouchNode(w, CHECKED);
         }

@@ -139,6 +139,9 @@ bool RepairSegmentAgainstAll(std::int32_t s) {
     for (std::int32_t p = 2; p < end; ++p) {
       const PointRecord& r = g.points[p];
       if (p == e || r.deleted || q.deleted) continue;
+      // The distance is at least the larger coordinate difference: most
+      // points are ruled out without the costly hypot, with the same result.
+      if (std::fabs(r.x - q.x) > kRepairPointDistance || std::fabs(r.y - q.y) > kRepairPointDistance) continue;
       if (std::hypot(r.x - q.x, r.y - q.y) <= kRepairPointDistance) {
         MergePointsToMidpoint(e, p);
         return true;

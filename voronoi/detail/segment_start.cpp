@@ -31,6 +31,7 @@ Candidate SearchRegion(const SegmentInsertion& si, std::int32_t p, std::int32_t 
   do {
     const std::int32_t n = RegionExitNode(e, p, PNT);
     const EdgeRecord& er = g.edges[e];
+    if (n >= 0) g.edges.Prefetch(CwAt(er, n));  // the walk's next edge
     if (n >= 0 && !IsFarNode(n) && g.nodes[n].site < 0) {
       const double v = ConflictValue(si, n, tol);
       if (best.node < 0 || v < best.value) best = {n, v};

@@ -42,6 +42,16 @@ struct RecordArray {
   void EnsureOneMore(std::int32_t step) {
     if (count >= capacity) Reserve(std::int64_t{capacity} + step);
   }
+  // A hint that record i is wanted soon: a traversal of the diagram hops
+  // between records far apart in memory, and starting the next loads while
+  // the current record is worked on hides most of their latency. Both cache
+  // lines a record may straddle are requested. No effect on results.
+  void Prefetch(std::int32_t i) const {
+    if (i < 0 || i >= capacity) return;
+    const char* p = reinterpret_cast<const char*>(data + i);
+    __builtin_prefetch(p);
+    __builtin_prefetch(p + sizeof(T) - 1);
+  }
   std::int32_t Append(const T& value, std::int32_t step) {
     EnsureOneMore(step);
     data[count] = value;
