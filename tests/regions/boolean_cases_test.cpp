@@ -174,6 +174,24 @@ TEST(BooleanCases, DroppedOpenPolylineWithoutCrossingsIsNotAFailure) {
   EXPECT_EQ(contours_of(r).size(), 2u);
 }
 
+// B's long edge runs from beyond A's corner (2, 0), along A's bottom edge
+// within the tolerance, to beyond (0, 0): the pair test asks for the roles to
+// be exchanged, and A's corners become splits of B's edge.
+TEST(BooleanCases, NearlyCollinearOverlapThroughTheRetry) {
+  TaggedPointList a, b;
+  fill_list(a, {rect(0, 0, 2, 2, 1)});
+  const double d = 18 * 0x1p-48;  // just above the tolerance once normalised
+  fill_list(b, {{{3, 0, 2}, {-1, d, 2}, {1, -2, 2}}});
+  TaggedPointList u, i, diff;
+  ASSERT_EQ(rg_boolean(a, b, "u", &u), 0);
+  ASSERT_EQ(rg_boolean(a, b, "i", &i), 0);
+  ASSERT_EQ(rg_boolean(a, b, "d", &diff), 0);
+  EXPECT_NEAR(total_area(u), 8.0, 1e-12);
+  EXPECT_EQ(i.count(), 0);
+  EXPECT_NEAR(std::fabs(total_area(diff)), 4.0, 1e-12);
+  ASSERT_EQ(contours_of(u).size(), 1u);
+}
+
 TEST(BooleanCases, DisjointIntersectionIsEmpty) {
   TaggedPointList a, b, r;
   fill_list(a, {rect(0, 0, 1, 1)});
