@@ -1,0 +1,136 @@
+// Finishing a polygon set: its contours' points become grid vertices, its
+// consecutive distinct vertices edges with integer boxes, and the boxes are
+// indexed by a box tree split at the median of the longer side.
+#include <cmath>
+#include <utility>
+
+#include "regions/detail/engine.hpp"
+
+namespace zt::detail {
+
+std::int32_t box_coordinate(double v, std::int32_t pad) {
+  double f = std::floor(kBoxUnitsPerSquare * v);
+  if (std::isnan(f)) f = 0.0;
+  if (f > kIndexClamp) f = kIndexClamp;
+  if (f < -kIndexClamp) f = -kIndexClamp;
+  return static_cast<std::int32_t>(f) + pad;
+}
+
+namespace {
+
+int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
+  Edge* edge = e.edges.take();
+  if (!edge) return -1;
+  *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
+  EdgeBox* box = e.boxes.take();
+  if (!box) return -1;
+  box->xmin = box_coordinate(std::fmin(from->x, to->x), -1);
+  box->xmax = box_coordinate(std::fmax(from->x, to->x), 1);
+  box->ymin = box_coordinate(std::fmin(from->y, to->y), -1);
+  box->ymax = box_coordinate(std::fmax(from->y, to->y), 1);
+  box->edge = edge;
+  return 0;
+}
+
+int key_of(const EdgeBox& b, bool byX) { return byX ? b.xmin : b.ymin; }
+
+BoxTreeNode* build_node(BooleanEngine& e, std::int32_t first, std::int32_t last) {
+  BoxTreeNode* node = e.nodes.take();
+  if (!node) return nullptr;
+  *node = BoxTreeNode{};
+  node->first = first;
+  node->last = last;
+  const EdgeBox& b0 = e.boxes[first];
+  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
+  for (std::int32_t i = first + 1; i <= last; ++i) {
+    const EdgeBox& b = e.boxes[i];
+    if (b.xmin < node->xmin) node->xmin = b.xmin;
+    if (b.ymin < node->ymin) node->ymin = b.ymin;
+    if (b.xmax > node->xmax) node->xmax = b.xmax;
+    if (b.ymax > node->ymax) node->ymax = b.ymax;
+  }
+  if (last - first <= kLeafSpan) return node;
+  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
+  const std::int32_t m = first + (last - first) / 2;
+  select_median(e.boxes, first, last, m, byX);
+  node->low = build_node(e, first, m);
+  if (!node->low) return nullptr;
+  node->high = build_node(e, m + 1, last);
+  if (!node->high) return nullptr;
+  return node;
+}
+
+}  // namespace
+
+std::int64_t select_median(BoxPool& boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
+  std::int64_t comparisons = 0;
+  // Hoare partitions around the key at m; both scans stop on keys equal to
+  // the pivot and swap them, so runs of equal keys split evenly instead of
+  // degrading into one-element steps.
+  while (hi - lo >= kLeafSpan) {
+    const int pivot = key_of(boxes[m], byX);
+    std::int32_t i = lo, j = hi;
+    while (i <= j) {
+      while (++comparisons, key_of(boxes[i], byX) < pivot) ++i;
+      while (++comparisons, key_of(boxes[j], byX) > pivot) --j;
+      if (i <= j) {
+        std::swap(boxes[i], boxes[j]);
+        ++i;
+        --j;
+      }
+    }
+    if (m <= j) {
+      hi = j;
+    } else if (m >= i) {
+      lo = i;
+    } else {
+      return comparisons;  // m lies in a run equal to the pivot
+    }
+  }
+  for (std::int32_t p = lo; p <= m; ++p) {
+    std::int32_t best = p;
+    for (std::int32_t q = p + 1; q <= hi; ++q) {
+      ++comparisons;
+      if (key_of(boxes[q], byX) < key_of(boxes[best], byX)) best = q;
+    }
+    if (best != p) std::swap(boxes[p], boxes[best]);
+  }
+  return comparisons;
+}
+
+int finish_set(BooleanEngine& e, PolygonSet& set) {
+  set.firstBox = e.boxes.count();
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) {
+    InputContour& c = set.contours[ci];
+    c.firstEdge = e.edges.count();
+    Vertex* firstVertex = nullptr;
+    Vertex* prev = nullptr;
+    std::int32_t prevTag = 0;
+    bool failed = false;
+    for_each_stored_point(c, [&](const TaggedPoint& p) {
+      if (failed) return;
+      Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
+      if (!v) {
+        failed = true;
+        return;
+      }
+      if (!firstVertex) {
+        firstVertex = v;
+      } else if (v != prev && append_edge(e, prev, v, prevTag) != 0) {
+        failed = true;
+        return;
+      }
+      prev = v;
+      prevTag = p.tag;
+    });
+    if (failed) return -1;
+    if (c.closed && prev != firstVertex && append_edge(e, prev, firstVertex, prevTag) != 0) return -1;
+    c.endEdge = e.edges.count();
+  }
+  set.lastBox = e.boxes.count() - 1;
+  if (set.lastBox < set.firstBox) return -1;
+  set.root = build_node(e, set.firstBox, set.lastBox);
+  return set.root ? 0 : -1;
+}
+
+}  // namespace zt::detail
