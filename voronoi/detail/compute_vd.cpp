@@ -86,8 +86,11 @@ bool SegmentPhase() {
     BuildOrder(0, g.segments.count);
   }
   while (g.orderRemaining > 0) {
-    InsertSegment(DrawNext());
+    const std::int32_t s = DrawNext();
+    InsertSegment(s);
     if (g.restartPending) return false;
+    // Segments reach the test hook as -1 - index.
+    if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, -1 - s);
   }
   g.segmentsDone = true;
   return true;

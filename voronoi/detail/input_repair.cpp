@@ -4,6 +4,7 @@
 #include <cmath>
 
 #include "voronoi/detail/engine_state.hpp"
+#include "voronoi/detail/segment_repair.hpp"
 
 namespace zt::vd {
 
@@ -23,7 +24,7 @@ bool RepairPointPoint(std::int32_t a, std::int32_t b) {
 
 bool TestPair(const SuspectPair& s) {
   if (s.kind1 == PNT && s.kind2 == PNT) return RepairPointPoint(s.site1, s.site2);
-  return false;
+  return RepairSuspectWithSegment(s);
 }
 
 }  // namespace
@@ -78,12 +79,15 @@ bool RepairInput(std::int32_t site, std::int32_t kind, bool checkAllAllowed) {
     for (std::int32_t q = 2; q < end; ++q) {
       if (RepairPointPoint(site, q)) return true;
     }
+    if (RepairPointAgainstSegments(site)) return true;
   }
+  if (kind == SEG && RepairSegmentAgainstAll(site)) return true;
   if (checkAllAllowed && g.checkAllRepair) {
     const std::int32_t end = g.dummiesAdded ? g.points.count - 2 : g.points.count;
     for (std::int32_t a = 2; a < end; ++a)
       for (std::int32_t b = a + 1; b < end; ++b)
         if (RepairPointPoint(a, b)) return true;
+    if (RepairAllSegmentPairs()) return true;
   }
   return false;
 }

@@ -30,7 +30,11 @@ constexpr double kMinCellFactor = 2.0;
 constexpr double kMaxCellFactor = 4.0;
 constexpr std::int32_t kEntryGrowth = 32768;
 
+// A bucket entry carries its point's coordinates, so scanning a cell never
+// leaves the entry array.
 struct Entry {
+  double x;
+  double y;
   std::int32_t point;
   std::int32_t next;
 };
@@ -152,14 +156,13 @@ void NearestPointSearch::GridLink(std::int32_t p) {
   const PointRecord& pt = Vd().points[p];
   const std::int32_t cell = Row(pt.y) * cols_ + Column(pt.x);
   if (heads_[cell] < 0) ++nonEmpty_;
-  heads_[cell] = entries_.Append(Entry{p, heads_[cell]}, kEntryGrowth);
+  heads_[cell] = entries_.Append(Entry{pt.x, pt.y, p, heads_[cell]}, kEntryGrowth);
 }
 
 void NearestPointSearch::ScanCell(std::int32_t cell, double x, double y, std::int32_t& best,
                                   double& bestD2) const {
-  const RecordArray<PointRecord>& pts = Vd().points;
   for (std::int32_t e = heads_[cell]; e >= 0; e = entries_[e].next) {
-    const PointRecord& q = pts[entries_[e].point];
+    const Entry& q = entries_[e];
     const double dx = q.x - x, dy = q.y - y;
     const double d2 = dx * dx + dy * dy;
     if (d2 < bestD2) {

@@ -80,15 +80,16 @@ std::int32_t FindSeed(std::int32_t q, std::int32_t p, std::int32_t& fallback) {
 bool Joins(std::int32_t f, std::int32_t v, const PointRecord& pt) {
   Engine& g = Vd();
   const NodeRecord& node = g.nodes[v];
-  if (node.status != UNCHECKED) return false;
+  // The conflict test first: it needs only v's own record, and most nodes
+  // reached fail it.
+  if (node.status != UNCHECKED || !(node.r > Dist2(node, pt))) return false;
   const EdgeRecord& ef = g.edges[f];
   const std::int32_t g1 = CcwAt(ef, v);
   const std::int32_t g2 = CcwAt(g.edges[g1], v);
   const std::int32_t across = LeftSiteFrom(g.edges[g1], v);
   if (across < 0 || LeftKindFrom(g.edges[g1], v) != PNT || g.points[across].marked) return false;
   if (g.nodes[OtherNode(g.edges[g1], v)].status == DELETED) return false;
-  if (g.nodes[OtherNode(g.edges[g2], v)].status == DELETED) return false;
-  return node.r > Dist2(node, pt);
+  return g.nodes[OtherNode(g.edges[g2], v)].status != DELETED;
 }
 
 // Grows the tree from the seed depth first, in counter-clockwise order
