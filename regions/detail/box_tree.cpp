@@ -2,6 +2,7 @@
 // consecutive distinct vertices edges with integer boxes, and the boxes are
 // indexed by a box tree split at the median of the longer side.
 #include <cmath>
+#include <new>
 #include <utility>
 
 #include "regions/detail/engine.hpp"
@@ -34,16 +35,19 @@ int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
 
 int key_of(const EdgeBox& b, bool byX) { return byX ? b.xmin : b.ymin; }
 
-BoxTreeNode* build_node(BooleanEngine& e, std::int32_t first, std::int32_t last) {
+// Builds the node over boxes[first..last] of the scratch copy; `base` is the
+// pool index of the scratch's first box, so node ranges are pool indexes.
+BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std::int32_t first,
+                        std::int32_t last) {
   BoxTreeNode* node = e.nodes.take();
   if (!node) return nullptr;
   *node = BoxTreeNode{};
-  node->first = first;
-  node->last = last;
-  const EdgeBox& b0 = e.boxes[first];
+  node->first = base + first;
+  node->last = base + last;
+  const EdgeBox& b0 = boxes[first];
   node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
   for (std::int32_t i = first + 1; i <= last; ++i) {
-    const EdgeBox& b = e.boxes[i];
+    const EdgeBox& b = boxes[i];
     if (b.xmin < node->xmin) node->xmin = b.xmin;
     if (b.ymin < node->ymin) node->ymin = b.ymin;
     if (b.xmax > node->xmax) node->xmax = b.xmax;
@@ -52,17 +56,36 @@ BoxTreeNode* build_node(BooleanEngine& e, std::int32_t first, std::int32_t last)
   if (last - first <= kLeafSpan) return node;
   const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
-  select_median(e.boxes, first, last, m, byX);
-  node->low = build_node(e, first, m);
+  select_median(boxes, first, last, m, byX);
+  node->low = build_node(e, boxes, base, first, m);
   if (!node->low) return nullptr;
-  node->high = build_node(e, m + 1, last);
+  node->high = build_node(e, boxes, base, m + 1, last);
   if (!node->high) return nullptr;
   return node;
 }
 
+// The tree is built on a contiguous copy of the set's boxes (the selection
+// moves them a lot), which is then written back in its new order.
+int build_tree(BooleanEngine& e, PolygonSet& set) {
+  const std::int32_t n = set.lastBox - set.firstBox + 1;
+  if (n > e.boxScratchCapacity) {
+    delete[] e.boxScratch;
+    e.boxScratch = nullptr;
+    e.boxScratchCapacity = 0;
+    if (!allocationAllowed()) return -1;
+    e.boxScratch = new (std::nothrow) EdgeBox[static_cast<std::size_t>(n)];
+    if (!e.boxScratch) return -1;
+    e.boxScratchCapacity = n;
+  }
+  for (std::int32_t i = 0; i < n; ++i) e.boxScratch[i] = e.boxes[set.firstBox + i];
+  set.root = build_node(e, e.boxScratch, set.firstBox, 0, n - 1);
+  for (std::int32_t i = 0; i < n; ++i) e.boxes[set.firstBox + i] = e.boxScratch[i];
+  return set.root ? 0 : -1;
+}
+
 }  // namespace
 
-std::int64_t select_median(BoxPool& boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
+std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
   std::int64_t comparisons = 0;
   // Hoare partitions around the key at m; both scans stop on keys equal to
   // the pivot and swap them, so runs of equal keys split evenly instead of
@@ -129,8 +152,7 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
   }
   set.lastBox = e.boxes.count() - 1;
   if (set.lastBox < set.firstBox) return -1;
-  set.root = build_node(e, set.firstBox, set.lastBox);
-  return set.root ? 0 : -1;
+  return build_tree(e, set);
 }
 
 }  // namespace zt::detail
