@@ -1,6 +1,7 @@
 // Finishing a polygon set: its contours' points become grid vertices, its
 // consecutive distinct vertices edges with integer boxes, and the boxes are
 // indexed by a box tree split at the median of the longer side.
+#include <algorithm>
 #include <cmath>
 #include <new>
 #include <utility>
@@ -25,15 +26,56 @@ int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
   EdgeBox* box = e.boxes.take();
   if (!box) return -1;
-  box->xmin = box_coordinate(std::fmin(from->x, to->x), -1);
-  box->xmax = box_coordinate(std::fmax(from->x, to->x), 1);
-  box->ymin = box_coordinate(std::fmin(from->y, to->y), -1);
-  box->ymax = box_coordinate(std::fmax(from->y, to->y), 1);
+  const bool xUp = from->x < to->x, yUp = from->y < to->y;
+  box->xmin = box_coordinate(xUp ? from->x : to->x, -1);
+  box->xmax = box_coordinate(xUp ? to->x : from->x, 1);
+  box->ymin = box_coordinate(yUp ? from->y : to->y, -1);
+  box->ymax = box_coordinate(yUp ? to->y : from->y, 1);
   box->edge = edge;
   return 0;
 }
 
-int key_of(const EdgeBox& b, bool byX) { return byX ? b.xmin : b.ymin; }
+template <bool kByX>
+int key_of(const EdgeBox& b) {
+  return kByX ? b.xmin : b.ymin;
+}
+
+template <bool kByX>
+std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m) {
+  std::int64_t comparisons = 0;
+  // Hoare partitions around the key at m; both scans stop on keys equal to
+  // the pivot and swap them, so runs of equal keys split evenly instead of
+  // degrading into one-element steps.
+  while (hi - lo >= kLeafSpan) {
+    const int pivot = key_of<kByX>(boxes[m]);
+    std::int32_t i = lo, j = hi;
+    while (i <= j) {
+      while (++comparisons, key_of<kByX>(boxes[i]) < pivot) ++i;
+      while (++comparisons, key_of<kByX>(boxes[j]) > pivot) --j;
+      if (i <= j) {
+        std::swap(boxes[i], boxes[j]);
+        ++i;
+        --j;
+      }
+    }
+    if (m <= j) {
+      hi = j;
+    } else if (m >= i) {
+      lo = i;
+    } else {
+      return comparisons;  // m lies in a run equal to the pivot
+    }
+  }
+  for (std::int32_t p = lo; p <= m; ++p) {
+    std::int32_t best = p;
+    for (std::int32_t q = p + 1; q <= hi; ++q) {
+      ++comparisons;
+      if (key_of<kByX>(boxes[q]) < key_of<kByX>(boxes[best])) best = q;
+    }
+    if (best != p) std::swap(boxes[p], boxes[best]);
+  }
+  return comparisons;
+}
 
 // Builds the node over boxes[first..last] of the scratch copy; `base` is the
 // pool index of the scratch's first box, so node ranges are pool indexes.
@@ -46,13 +88,15 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std
   node->last = base + last;
   const EdgeBox& b0 = boxes[first];
   node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
+  std::int32_t xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
   for (std::int32_t i = first + 1; i <= last; ++i) {
     const EdgeBox& b = boxes[i];
-    if (b.xmin < node->xmin) node->xmin = b.xmin;
-    if (b.ymin < node->ymin) node->ymin = b.ymin;
-    if (b.xmax > node->xmax) node->xmax = b.xmax;
-    if (b.ymax > node->ymax) node->ymax = b.ymax;
+    xmin = std::min(xmin, b.xmin);
+    ymin = std::min(ymin, b.ymin);
+    xmax = std::max(xmax, b.xmax);
+    ymax = std::max(ymax, b.ymax);
   }
+  node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
   if (last - first <= kLeafSpan) return node;
   const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
@@ -86,39 +130,7 @@ int build_tree(BooleanEngine& e, PolygonSet& set) {
 }  // namespace
 
 std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
-  std::int64_t comparisons = 0;
-  // Hoare partitions around the key at m; both scans stop on keys equal to
-  // the pivot and swap them, so runs of equal keys split evenly instead of
-  // degrading into one-element steps.
-  while (hi - lo >= kLeafSpan) {
-    const int pivot = key_of(boxes[m], byX);
-    std::int32_t i = lo, j = hi;
-    while (i <= j) {
-      while (++comparisons, key_of(boxes[i], byX) < pivot) ++i;
-      while (++comparisons, key_of(boxes[j], byX) > pivot) --j;
-      if (i <= j) {
-        std::swap(boxes[i], boxes[j]);
-        ++i;
-        --j;
-      }
-    }
-    if (m <= j) {
-      hi = j;
-    } else if (m >= i) {
-      lo = i;
-    } else {
-      return comparisons;  // m lies in a run equal to the pivot
-    }
-  }
-  for (std::int32_t p = lo; p <= m; ++p) {
-    std::int32_t best = p;
-    for (std::int32_t q = p + 1; q <= hi; ++q) {
-      ++comparisons;
-      if (key_of(boxes[q], byX) < key_of(boxes[best], byX)) best = q;
-    }
-    if (best != p) std::swap(boxes[p], boxes[best]);
-  }
-  return comparisons;
+  return byX ? select_on_axis<true>(boxes, lo, hi, m) : select_on_axis<false>(boxes, lo, hi, m);
 }
 
 int finish_set(BooleanEngine& e, PolygonSet& set) {

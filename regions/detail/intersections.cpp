@@ -2,6 +2,7 @@
 // trees reaches every pair of edges (one of each operand) whose boxes overlap
 // strictly; each meeting point becomes a shared vertex and a split point on
 // both edges.
+#include <algorithm>
 #include <cmath>
 
 #include "regions/detail/engine.hpp"
@@ -39,10 +40,10 @@ inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
 
 bool extents_apart(const Edge& a, const Edge& b) {
   const double m = kPairRejectMargin;
-  return std::fmin(a.start->x, a.end->x) > std::fmax(b.start->x, b.end->x) + m ||
-         std::fmin(b.start->x, b.end->x) > std::fmax(a.start->x, a.end->x) + m ||
-         std::fmin(a.start->y, a.end->y) > std::fmax(b.start->y, b.end->y) + m ||
-         std::fmin(b.start->y, b.end->y) > std::fmax(a.start->y, a.end->y) + m;
+  return std::min(a.start->x, a.end->x) > std::max(b.start->x, b.end->x) + m ||
+         std::min(b.start->x, b.end->x) > std::max(a.start->x, a.end->x) + m ||
+         std::min(a.start->y, a.end->y) > std::max(b.start->y, b.end->y) + m ||
+         std::min(b.start->y, b.end->y) > std::max(a.start->y, a.end->y) + m;
 }
 
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
