@@ -1,7 +1,9 @@
 // Finishing a polygon set: its contours' points become grid vertices, its
 // consecutive distinct vertices edges with integer boxes, and the boxes are
 // indexed by a box tree split at the median of the longer side.
+#include <algorithm>
 #include <cmath>
+#include <new>
 #include <utility>
 
 #include "regions/detail/engine.hpp"
@@ -24,55 +26,32 @@ int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
   EdgeBox* box = e.boxes.take();
   if (!box) return -1;
-  box->xmin = box_coordinate(std::fmin(from->x, to->x), -1);
-  box->xmax = box_coordinate(std::fmax(from->x, to->x), 1);
-  box->ymin = box_coordinate(std::fmin(from->y, to->y), -1);
-  box->ymax = box_coordinate(std::fmax(from->y, to->y), 1);
+  const bool xUp = from->x < to->x, yUp = from->y < to->y;
+  box->xmin = box_coordinate(xUp ? from->x : to->x, -1);
+  box->xmax = box_coordinate(xUp ? to->x : from->x, 1);
+  box->ymin = box_coordinate(yUp ? from->y : to->y, -1);
+  box->ymax = box_coordinate(yUp ? to->y : from->y, 1);
   box->edge = edge;
   return 0;
 }
 
-int key_of(const EdgeBox& b, bool byX) { return byX ? b.xmin : b.ymin; }
-
-BoxTreeNode* build_node(BooleanEngine& e, std::int32_t first, std::int32_t last) {
-  BoxTreeNode* node = e.nodes.take();
-  if (!node) return nullptr;
-  *node = BoxTreeNode{};
-  node->first = first;
-  node->last = last;
-  const EdgeBox& b0 = e.boxes[first];
-  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
-  for (std::int32_t i = first + 1; i <= last; ++i) {
-    const EdgeBox& b = e.boxes[i];
-    if (b.xmin < node->xmin) node->xmin = b.xmin;
-    if (b.ymin < node->ymin) node->ymin = b.ymin;
-    if (b.xmax > node->xmax) node->xmax = b.xmax;
-    if (b.ymax > node->ymax) node->ymax = b.ymax;
-  }
-  if (last - first <= kLeafSpan) return node;
-  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
-  const std::int32_t m = first + (last - first) / 2;
-  select_median(e.boxes, first, last, m, byX);
-  node->low = build_node(e, first, m);
-  if (!node->low) return nullptr;
-  node->high = build_node(e, m + 1, last);
-  if (!node->high) return nullptr;
-  return node;
+template <bool kByX>
+int key_of(const EdgeBox& b) {
+  return kByX ? b.xmin : b.ymin;
 }
 
-}  // namespace
-
-std::int64_t select_median(BoxPool& boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
+template <bool kByX>
+std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m) {
   std::int64_t comparisons = 0;
   // Hoare partitions around the key at m; both scans stop on keys equal to
   // the pivot and swap them, so runs of equal keys split evenly instead of
   // degrading into one-element steps.
   while (hi - lo >= kLeafSpan) {
-    const int pivot = key_of(boxes[m], byX);
+    const int pivot = key_of<kByX>(boxes[m]);
     std::int32_t i = lo, j = hi;
     while (i <= j) {
-      while (++comparisons, key_of(boxes[i], byX) < pivot) ++i;
-      while (++comparisons, key_of(boxes[j], byX) > pivot) --j;
+      while (++comparisons, key_of<kByX>(boxes[i]) < pivot) ++i;
+      while (++comparisons, key_of<kByX>(boxes[j]) > pivot) --j;
       if (i <= j) {
         std::swap(boxes[i], boxes[j]);
         ++i;
@@ -91,11 +70,67 @@ std::int64_t select_median(BoxPool& boxes, std::int32_t lo, std::int32_t hi, std
     std::int32_t best = p;
     for (std::int32_t q = p + 1; q <= hi; ++q) {
       ++comparisons;
-      if (key_of(boxes[q], byX) < key_of(boxes[best], byX)) best = q;
+      if (key_of<kByX>(boxes[q]) < key_of<kByX>(boxes[best])) best = q;
     }
     if (best != p) std::swap(boxes[p], boxes[best]);
   }
   return comparisons;
+}
+
+// Builds the node over boxes[first..last] of the scratch copy; `base` is the
+// pool index of the scratch's first box, so node ranges are pool indexes.
+BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std::int32_t first,
+                        std::int32_t last) {
+  BoxTreeNode* node = e.nodes.take();
+  if (!node) return nullptr;
+  *node = BoxTreeNode{};
+  node->first = base + first;
+  node->last = base + last;
+  const EdgeBox& b0 = boxes[first];
+  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
+  std::int32_t xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
+  for (std::int32_t i = first + 1; i <= last; ++i) {
+    const EdgeBox& b = boxes[i];
+    xmin = std::min(xmin, b.xmin);
+    ymin = std::min(ymin, b.ymin);
+    xmax = std::max(xmax, b.xmax);
+    ymax = std::max(ymax, b.ymax);
+  }
+  node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
+  if (last - first <= kLeafSpan) return node;
+  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
+  const std::int32_t m = first + (last - first) / 2;
+  select_median(boxes, first, last, m, byX);
+  node->low = build_node(e, boxes, base, first, m);
+  if (!node->low) return nullptr;
+  node->high = build_node(e, boxes, base, m + 1, last);
+  if (!node->high) return nullptr;
+  return node;
+}
+
+// The tree is built on a contiguous copy of the set's boxes (the selection
+// moves them a lot), which is then written back in its new order.
+int build_tree(BooleanEngine& e, PolygonSet& set) {
+  const std::int32_t n = set.lastBox - set.firstBox + 1;
+  if (n > e.boxScratchCapacity) {
+    delete[] e.boxScratch;
+    e.boxScratch = nullptr;
+    e.boxScratchCapacity = 0;
+    if (!allocationAllowed()) return -1;
+    e.boxScratch = new (std::nothrow) EdgeBox[static_cast<std::size_t>(n)];
+    if (!e.boxScratch) return -1;
+    e.boxScratchCapacity = n;
+  }
+  for (std::int32_t i = 0; i < n; ++i) e.boxScratch[i] = e.boxes[set.firstBox + i];
+  set.root = build_node(e, e.boxScratch, set.firstBox, 0, n - 1);
+  for (std::int32_t i = 0; i < n; ++i) e.boxes[set.firstBox + i] = e.boxScratch[i];
+  return set.root ? 0 : -1;
+}
+
+}  // namespace
+
+std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
+  return byX ? select_on_axis<true>(boxes, lo, hi, m) : select_on_axis<false>(boxes, lo, hi, m);
 }
 
 int finish_set(BooleanEngine& e, PolygonSet& set) {
@@ -129,8 +164,7 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
   }
   set.lastBox = e.boxes.count() - 1;
   if (set.lastBox < set.firstBox) return -1;
-  set.root = build_node(e, set.firstBox, set.lastBox);
-  return set.root ? 0 : -1;
+  return build_tree(e, set);
 }
 
 }  // namespace zt::detail

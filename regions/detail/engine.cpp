@@ -30,6 +30,7 @@ BooleanEngine::~BooleanEngine() {
   }
   delete grid.vertices;
   delete[] grid.buckets;
+  delete[] boxScratch;
 }
 
 void reset_set(BooleanEngine& e, PolygonSet& set) {

@@ -102,6 +102,9 @@ struct BooleanEngine {
   BoxTreeNode queryBox;
   IntersectionProbe probe;
   VertexGrid grid;
+  // Contiguous copy of one set's boxes while its tree is built.
+  EdgeBox* boxScratch = nullptr;
+  std::int32_t boxScratchCapacity = 0;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
 
@@ -155,7 +158,7 @@ int finish_set(BooleanEngine& e, PolygonSet& set);
 std::int32_t box_coordinate(double v, std::int32_t pad);
 // Reorders boxes[lo..hi] so that position m holds the key of rank m; returns
 // the number of key comparisons made (for the linear-time checks).
-std::int64_t select_median(BoxPool& boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX);
+std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX);
 inline bool boxes_overlap(std::int32_t axmin, std::int32_t aymin, std::int32_t axmax, std::int32_t aymax,
                           std::int32_t bxmin, std::int32_t bymin, std::int32_t bxmax, std::int32_t bymax) {
   return axmin < bxmax && axmax > bxmin && aymin < bymax && aymax > bymin;

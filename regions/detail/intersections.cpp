@@ -2,6 +2,7 @@
 // trees reaches every pair of edges (one of each operand) whose boxes overlap
 // strictly; each meeting point becomes a shared vertex and a split point on
 // both edges.
+#include <algorithm>
 #include <cmath>
 
 #include "regions/detail/engine.hpp"
@@ -31,8 +32,24 @@ int insert_split(SplitPool& pool, Edge& edge, double t, Vertex* v, double eps) {
 
 namespace {
 
+// Edges whose exact extents are farther apart than this cannot meet: every
+// point the intersection routine returns lies within the tolerance of both
+// segments. The integer boxes are much coarser (a unit is 1/1000), so this
+// check spares most calls of the routine.
+inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
+
+bool extents_apart(const Edge& a, const Edge& b) {
+  const double m = kPairRejectMargin;
+  return std::min(a.start->x, a.end->x) > std::max(b.start->x, b.end->x) + m ||
+         std::min(b.start->x, b.end->x) > std::max(a.start->x, a.end->x) + m ||
+         std::min(a.start->y, a.end->y) > std::max(b.start->y, b.end->y) + m ||
+         std::min(b.start->y, b.end->y) > std::max(a.start->y, a.end->y) + m;
+}
+
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
+  pr.retryReversed = 0;
+  if (extents_apart(first, second)) return 0;
   pr.retryReversed = 0;
   pr.p0 = {first.start->x, first.start->y};
   pr.p1 = {first.end->x, first.end->y};

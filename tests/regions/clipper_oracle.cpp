@@ -27,7 +27,7 @@ namespace zt::test {
 namespace {
 
 #if defined(__SANITIZE_ADDRESS__)
-constexpr int kDefaultCases = 600;
+constexpr int kDefaultCases = 2000;
 #else
 constexpr int kDefaultCases = 5000;
 #endif
