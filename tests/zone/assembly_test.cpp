@@ -173,6 +173,7 @@ TEST_F(Assembly, FailuresEndTheAssembly) {
   if (!std::filesystem::exists("/dev/full")) return;
   reset_zone_builder();
   engine.offsetsOk = true;
+  std::filesystem::remove(path("temp2"));
   std::filesystem::create_symlink("/dev/full", path("temp2"));
   levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
   EXPECT_EQ(assemble(), -1);
