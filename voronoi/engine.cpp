@@ -8,6 +8,7 @@
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
 #include "voronoi/detail/point_insertion.hpp"
+#include "voronoi/detail/offset_state.hpp"
 
 namespace zt {
 
@@ -94,6 +95,7 @@ void VD_Reset() {
   g.markedSites.count = 0;
   g.checkedNodes.count = 0;
   g.offsetNewRequest = true;
+  ResetOffsetState();
   g.offsetCurves.count = 0;
   g.offsetElements.count = 0;
   g.medialAxisComputed = false;
@@ -126,6 +128,7 @@ void VD_Terminate() {
   g.offsetCurves.Free();
   g.offsetElements.Free();
   ReleaseInsertionScratch();
+  FreeOffsetState();
   g.initialised = false;
 }
 
