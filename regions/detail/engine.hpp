@@ -29,8 +29,12 @@ inline constexpr double kSeparatorThreshold = 99990.0;
 // Grid cell and box unit: 1/1000 of the normalised square.
 inline constexpr double kGridCell = 0.001;
 inline constexpr double kBoxUnitsPerSquare = 1000.0;
-inline constexpr std::int32_t kGridRowWidth = 1003;
-inline constexpr std::int32_t kMinBuckets = 997;
+// Cells of the vertex index proper: fine enough that densely sampled
+// contours put only a few points in one, and tiled onto the bucket table
+// kFineTile cells a side so that neighbouring cells share cache lines.
+inline constexpr double kFineCell = 0x1p-14;
+inline constexpr std::uint64_t kFineTileBits = 9;
+inline constexpr std::int32_t kMinFineBuckets = 1024;
 // Cell indexes and box bounds are clamped to this magnitude so that points far
 // outside the normalised square (read, but not counted by the bounding box)
 // still give well-defined integer keys.
@@ -51,12 +55,16 @@ using StarPool = ChunkPool<StarEntry, 10, 10>;
 using VertexPool = ChunkPool<Vertex>;
 using ContourPool = ChunkPool<InputContour>;
 
+// Vertices are found through a hash of fine cells, so a lookup costs about
+// the same however densely the contours are sampled. Which vertex a lookup
+// returns when several lie within the tolerance is ruled by the 1/1000
+// grid: the first grid cell, column by column and row by row, that holds
+// one, and within it the vertex created last.
 struct VertexGrid {
-  std::int32_t bucketCount = 0;
+  std::int32_t bucketMask = 0;  // bucket count - 1, a power of two
   VertexPool* vertices = nullptr;  // created at the first sizing
   Vertex** buckets = nullptr;
   Vertex* sharedHead = nullptr;
-  std::int32_t rowWidth = kGridRowWidth;
   double originX = 0.0, originY = 0.0;
   double cell = kGridCell;
   double eps = kEngineEpsilon;
@@ -146,11 +154,13 @@ void for_each_stored_point(const InputContour& c, F&& f) {
 // ---- vertex grid (vertex_grid.cpp)
 std::int32_t grid_bucket_count_for(std::int32_t pointCount);
 int size_grid(VertexGrid& g, std::int32_t pointCount);
+void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
-// Bucket of a cell, never outside [0, bucketCount) whatever the cell's sign.
+// Bucket of a fine cell, never outside the table whatever the cell's sign.
 std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column);
+// Cell of a coordinate, clamped to +-kIndexClamp.
 std::int64_t grid_cell_index(double v, double origin, double cell);
 
 // ---- edges and box trees (box_tree.cpp)

@@ -122,26 +122,6 @@ TEST(BooleanMendedFaults, PointOutsideTheSquareIndexesAValidBucket) {
   EXPECT_EQ(rg_boolean(a, b, "u", &r), 0);
   EXPECT_EQ(rg_boolean(b, a, "i", &r), 0);
 
-  detail::VertexGrid g;
-  ASSERT_EQ(detail::size_grid(g, 100), 0);
-  for (std::int64_t row : {std::int64_t{-1}, std::int64_t{-1073741824}, std::int64_t{1073741824}}) {
-    for (std::int64_t col : {std::int64_t{-5}, std::int64_t{0}, std::int64_t{1073741824}}) {
-      const std::int32_t k = detail::grid_bucket_of(g, row, col);
-      EXPECT_GE(k, 0);
-      EXPECT_LT(k, g.bucketCount);
-    }
-  }
-  EXPECT_EQ(detail::grid_cell_index(-1e300, 0, 0.001), -1073741824);
-  EXPECT_EQ(detail::grid_cell_index(1e300, 0, 0.001), 1073741824);
-  delete[] g.buckets;
-  delete g.vertices;
-}
-
-TEST(BooleanMendedFaults, BucketCountIsTheNextPrimeAboveATenthOfThePoints) {
-  EXPECT_EQ(detail::grid_bucket_count_for(0), 997);
-  EXPECT_EQ(detail::grid_bucket_count_for(9970), 997);
-  EXPECT_EQ(detail::grid_bucket_count_for(10000), 1009);
-  EXPECT_EQ(detail::grid_bucket_count_for(100000), 10007);
 }
 
 // Sorted, constant and two-valued keys: the selection must stay linear.
