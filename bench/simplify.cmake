@@ -1,0 +1,1 @@
+zt_bench(bench_simplify LIBS zone)

@@ -1,0 +1,126 @@
+// The status marker, the message file and the console echo, as the calling
+// suite reads them.
+#include "runtime/error_report.hpp"
+
+#include <unistd.h>
+
+#include <cctype>
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+
+#include "runtime_fixture.hpp"
+
+namespace zt {
+namespace {
+
+class ErrorReportTest : public testing::RuntimeTest {
+ protected:
+  void SetUp() override {
+    RuntimeTest::SetUp();
+    std::filesystem::create_directories(path("tmp"));
+    set_env("KVLTMPDIR", path("tmp"));
+    marker_ = "tmp/erreur.tmp." + std::to_string(::getpid());
+  }
+  std::int32_t message(const std::string& text) {
+    const auto length = static_cast<std::int32_t>(text.size());
+    return report_message(text.data(), length);
+  }
+  std::string marker_;
+};
+
+TEST_F(ErrorReportTest, MarkerLivesUntilNormalEnd) {
+  ASSERT_EQ(report_begin(nullptr), 0);
+  EXPECT_EQ(read_file(marker_), "");
+  EXPECT_EQ(report_end(), 0);
+  EXPECT_FALSE(exists(marker_));
+  EXPECT_EQ(report_end(), 0);  // already gone: no failure
+  write_file(marker_, "old text");
+  ASSERT_EQ(report_begin("start"), 0);  // truncates
+  EXPECT_EQ(read_file(marker_), "start");
+  const std::string status = "status text   ";
+  EXPECT_EQ(report_status(status.data(), static_cast<std::int32_t>(status.size())), 0);
+  EXPECT_EQ(read_file(marker_), "status text");
+}
+
+TEST_F(ErrorReportTest, StopOnErrorLeavesEmptyMarker) {
+  EXPECT_EXIT(
+      {
+        report_begin(nullptr);
+        message("Pas de Zones de Reprise");
+        std::exit(0);
+      },
+      ::testing::ExitedWithCode(0), "");
+  EXPECT_EQ(read_file(marker_.substr(0, marker_.rfind('.'))), std::nullopt);
+  // The child's marker carries the child's pid: exactly one marker, empty.
+  int markers = 0;
+  for (const auto& entry : std::filesystem::directory_iterator(path("tmp"))) {
+    const std::string name = entry.path().filename().string();
+    if (name.rfind("erreur.tmp.", 0) != 0) continue;
+    ++markers;
+    EXPECT_EQ(std::filesystem::file_size(entry.path()), 0u);
+  }
+  EXPECT_EQ(markers, 1);
+  EXPECT_EQ(read_file("tmp/kvlerror.prg"), "Pas de Zones de Reprise");
+}
+
+TEST_F(ErrorReportTest, MessagesGoToConsoleAndMessageFile) {
+  ::testing::internal::CaptureStdout();
+  EXPECT_EQ(message("A"), 0);
+  EXPECT_EQ(message("B   "), 0);
+  EXPECT_EQ(message("\tC\t "), 0);  // only spaces are trailing blanks
+  EXPECT_EQ(::testing::internal::GetCapturedStdout(), "A\nB\n\tC\t\n");
+  EXPECT_EQ(read_file("tmp/kvlerror.prg"), "AB\tC\t");
+}
+
+TEST_F(ErrorReportTest, BlankMessageCreatesMessageFileSilently) {
+  ::testing::internal::CaptureStdout();
+  EXPECT_EQ(message("     "), 0);
+  const std::int32_t zero = 0;
+  EXPECT_EQ(report_message(nullptr, zero), 0);
+  EXPECT_EQ(::testing::internal::GetCapturedStdout(), "");
+  EXPECT_EQ(read_file("tmp/kvlerror.prg"), "");
+  EXPECT_EQ(report_mark_empty(), 0);
+  EXPECT_EQ(read_file("tmp/errvide.tmp"), "");
+}
+
+// Regression: a status marker that cannot be created must be a reliable -1,
+// never a marker at the filesystem root or a silent success.
+TEST_F(ErrorReportTest, BeginFailsWhenMarkerCannotBeCreated) {
+  set_env("KVLTMPDIR", path("missing"));
+  EXPECT_EQ(report_begin(nullptr), -1);
+  EXPECT_EQ(message("x"), -1);
+  unset_env("KVLTMPDIR");  // and no workzone either
+  EXPECT_EQ(report_begin(nullptr), -1);
+  EXPECT_FALSE(fatals.empty());
+}
+
+TEST_F(ErrorReportTest, FatalReportAndExitStatus) {
+  EXPECT_EXIT(
+      {
+        const std::string text = "boom   ";
+        report_fatal(7, text.data(), static_cast<std::int32_t>(text.size()));
+      },
+      ::testing::ExitedWithCode(7), "");
+  const std::optional<std::string> file = read_file("tmp/kvlerror.prg");
+  ASSERT_TRUE(file.has_value());
+  // "dd-mm-yyyy hh:mm:ss", then the number, the message and the program.
+  const std::string stamp_shape = "00-00-0000 00:00:00";
+  ASSERT_GT(file->size(), stamp_shape.size());
+  for (std::size_t i = 0; i < stamp_shape.size(); ++i)
+    EXPECT_EQ(std::isdigit(static_cast<unsigned char>((*file)[i])) ? '0' : (*file)[i], stamp_shape[i]);
+  const std::string rest = file->substr(stamp_shape.size());
+  const std::string head = "\nError number 7: boom\n in program /";
+  EXPECT_EQ(rest.substr(0, head.size()), head);
+  EXPECT_EQ(rest.substr(rest.size() - 13), "runtime_tests");
+
+  std::filesystem::remove(path("tmp/kvlerror.prg"));
+  EXPECT_EXIT(report_fatal(0, "x", 1), ::testing::ExitedWithCode(255), "");
+  EXPECT_EXIT(report_fatal(-3, "x", 1), ::testing::ExitedWithCode(253), "");
+  // Regression: 256 used to end with the status 0 of a normal end.
+  EXPECT_EXIT(report_fatal(256, "x", 1), ::testing::ExitedWithCode(255), "");
+  EXPECT_NE(read_file("tmp/kvlerror.prg")->find("Error number -3: x"), std::string::npos);
+}
+
+}  // namespace
+}  // namespace zt

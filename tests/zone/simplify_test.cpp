@@ -1,0 +1,293 @@
+// Polyline simplification: a brute-force bound on random polylines, a
+// reference implementation of both passes, and the exact boundary cases.
+#include "zone/simplify.hpp"
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cmath>
+#include <random>
+#include <string>
+#include <vector>
+
+namespace {
+
+using zt::Array;
+using zt::Point2d;
+using zt::PolylineSimplifier;
+using zt::TaggedPoint;
+using zt::TaggedPointList;
+using zt::VectorSimplifier;
+
+// Slack for the triangle-inequality bound: sqrt and the projection round.
+constexpr double kBoundSlack = 1e-12;
+
+double dist2(Point2d a, Point2d b) { return (a.x - b.x) * (a.x - b.x) + (a.y - b.y) * (a.y - b.y); }
+
+double seg_dist2(Point2d p, Point2d a, Point2d b) {
+  const double dx = b.x - a.x, dy = b.y - a.y;
+  const double len2 = dx * dx + dy * dy;
+  double t = len2 > 0 ? ((p.x - a.x) * dx + (p.y - a.y) * dy) / len2 : 0.0;
+  if (t <= 0) return dist2(p, a);
+  if (t >= 1) return dist2(p, b);
+  return dist2(p, {a.x + t * dx, a.y + t * dy});
+}
+
+testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
+  bool same = got.size() == want.size();
+  for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
+  if (same) return testing::AssertionSuccess();
+  testing::AssertionResult r = testing::AssertionFailure();
+  r << "got";
+  for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
+  return r;
+}
+
+// Written independently of the product: recursion instead of a stack.
+void reference_dp(const std::vector<Point2d>& r, int i, int j, double tau, std::vector<bool>& keep) {
+  double best = -1;
+  int at = -1;
+  for (int k = i + 1; k < j; ++k) {
+    const double d2 = seg_dist2(r[k], r[i], r[j]);
+    if (d2 > best) best = d2, at = k;
+  }
+  if (at >= 0 && best > tau * tau) {
+    keep[at] = true;
+    reference_dp(r, i, at, tau, keep);
+    reference_dp(r, at, j, tau, keep);
+  }
+}
+
+std::vector<Point2d> reference(const std::vector<Point2d>& p, double rho, double tau) {
+  if (p.size() < 2) return p;
+  std::vector<Point2d> r{p[0]};
+  for (size_t i = 1; i + 1 < p.size(); ++i)
+    if (dist2(p[i], r.back()) > rho * rho) r.push_back(p[i]);
+  if (dist2(p.back(), r.back()) > rho * rho) r.push_back(p.back());
+  else r.back() = p.back();
+  std::vector<bool> keep(r.size(), false);
+  keep.front() = keep.back() = true;
+  if (r.size() >= 3) reference_dp(r, 0, static_cast<int>(r.size()) - 1, tau, keep);
+  std::vector<Point2d> out;
+  for (size_t k = 0; k < r.size(); ++k)
+    if (keep[k]) out.push_back(r[k]);
+  return out;
+}
+
+// Every dropped point lies within `bound` of the kept chain between the kept
+// points around it; kept points are an ordered subsequence ending in the last.
+void check_bound(const std::vector<Point2d>& in, const std::vector<Point2d>& kept, double bound) {
+  ASSERT_FALSE(kept.empty());
+  std::vector<int> index;
+  size_t cursor = 0;
+  for (const Point2d& k : kept) {
+    while (cursor < in.size() && (in[cursor].x != k.x || in[cursor].y != k.y)) ++cursor;
+    ASSERT_LT(cursor, in.size()) << "kept point is not an ordered input point";
+    index.push_back(static_cast<int>(cursor++));
+  }
+  ASSERT_EQ(index.back(), static_cast<int>(in.size()) - 1) << "last point not kept";
+  size_t next = 0;
+  for (int i = 0; i < static_cast<int>(in.size()); ++i) {
+    while (next < index.size() && index[next] < i) ++next;
+    if (next < index.size() && index[next] == i) continue;
+    const double d = next == 0 ? std::sqrt(dist2(in[i], kept[0]))
+                               : std::sqrt(seg_dist2(in[i], kept[next - 1], kept[next]));
+    ASSERT_LE(d, bound * (1 + kBoundSlack) + kBoundSlack) << "dropped point " << i;
+  }
+}
+
+std::vector<Point2d> random_polyline(std::mt19937_64& rng, double scale) {
+  std::uniform_int_distribution<int> len(1, 60);
+  std::uniform_real_distribution<double> u(-1.0, 1.0);
+  std::uniform_int_distribution<int> kind(0, 3);
+  std::vector<Point2d> p;
+  Point2d at{u(rng), u(rng)};
+  const int n = len(rng);
+  for (int i = 0; i < n; ++i) {
+    p.push_back(at);
+    switch (kind(rng)) {
+      case 0: at = {at.x + scale * 0.3 * u(rng), at.y + scale * 0.3 * u(rng)}; break;  // within rho
+      case 1: at = {at.x + scale * u(rng), at.y + scale * u(rng)}; break;              // near tol
+      case 2: at = {at.x + scale * 10 * u(rng), at.y}; break;                          // collinear
+      default: at = {at.x + scale * 20 * u(rng), at.y + scale * 20 * u(rng)};
+    }
+  }
+  return p;
+}
+
+TEST(SimplifyRandom, BothFormsStayWithinToleranceAndMatchReference) {
+  std::mt19937_64 rng(12345);
+  PolylineSimplifier ps;
+  VectorSimplifier vs;
+  Array<Point2d> result;
+  for (int round = 0; round < 3000; ++round) {
+    const double tol = round % 2 ? 0.005 : 0.1;
+    const std::vector<Point2d> in = random_polyline(rng, tol);
+    const int n = static_cast<int>(in.size());
+
+    ps.simplify(in.data(), n, tol, result, true);
+    std::vector<Point2d> a(result.begin(), result.end());
+    check_bound(in, a, tol);
+    const double rho = tol * zt::kRadialFactor;
+    ASSERT_TRUE(Same(a, reference(in, rho, tol - rho))) << "round " << round;
+
+    const double eps = round % 3 ? tol * 0.2 : zt::kPolylineRadialEps;
+    std::vector<Point2d> b = in;
+    b.resize(vs.simplify(b.data(), n, eps, tol));
+    check_bound(in, b, std::max(eps + tol, 2 * eps));
+    ASSERT_TRUE(Same(b, reference(in, eps, tol))) << "round " << round;
+  }
+}
+
+std::vector<Point2d> run_vector(std::vector<Point2d> p, double eps, double tol) {
+  VectorSimplifier vs;
+  p.resize(vs.simplify(p.data(), static_cast<int>(p.size()), eps, tol));
+  return p;
+}
+
+std::vector<Point2d> run_polyline(const std::vector<Point2d>& p, double tol) {
+  PolylineSimplifier ps;
+  Array<Point2d> out;
+  ps.simplify(p.data(), static_cast<int>(p.size()), tol, out, true);
+  return {out.begin(), out.end()};
+}
+
+
+TEST(SimplifyExact, PointAtToleranceDroppedJustBeyondKept) {
+  const double tol = 0.005;
+  const double beyond = std::nextafter(tol, 1.0);
+  std::vector<Point2d> at{{0, 0}, {1, tol}, {2, 0}}, past{{0, 0}, {1, beyond}, {2, 0}};
+  EXPECT_EQ(run_vector(at, 0, tol).size(), 2u);
+  EXPECT_EQ(run_vector(past, 0, tol).size(), 3u);
+  // PolylineSimplifier: the Douglas-Peucker part is what the radial part leaves.
+  const double tau = tol - tol * zt::kRadialFactor;
+  at[1].y = tau;
+  past[1].y = std::nextafter(tau, 1.0);
+  EXPECT_EQ(run_polyline(at, tol).size(), 2u);
+  EXPECT_EQ(run_polyline(past, tol).size(), 3u);
+  // Radial pass: a point exactly at rho from the last kept one is dropped.
+  const std::vector<Point2d> radial{{0, 0}, {0.5, 0}, {0.5, 3}};
+  EXPECT_TRUE(Same(run_vector(radial, 0.5, 0), std::vector<Point2d>{{0, 0}, {0.5, 3}}));
+}
+
+TEST(SimplifyExact, TwoAndOnePointPolylines) {
+  const std::vector<Point2d> two{{0, 0}, {0.003, 0}};
+  EXPECT_TRUE(Same(run_polyline(two, 0.01), std::vector<Point2d>{{0.003, 0}}));
+  EXPECT_TRUE(Same(run_vector(two, 0.005, 0.005), std::vector<Point2d>{{0.003, 0}}));
+  EXPECT_TRUE(Same(run_polyline(two, 0.001), two));
+  EXPECT_TRUE(Same(run_vector(two, 0.001, 0.001), two));
+  const std::vector<Point2d> one{{4, 5}};
+  EXPECT_TRUE(Same(run_polyline(one, 1), one));
+  EXPECT_TRUE(Same(run_vector(one, 1, 1), one));
+  VectorSimplifier vs;
+  EXPECT_EQ(vs.simplify(nullptr, 3, 1, 1), 0);
+  // The first point too gives way to the last when everything lies within rho.
+  EXPECT_TRUE(Same(run_vector({{0, 0}, {0.1, 0}, {0.2, 0}}, 0.5, 1), std::vector<Point2d>{{0.2, 0}}));
+}
+
+TEST(SimplifyExact, FirstOfEqualMaximaAndStartPointRepeats) {
+  const std::vector<Point2d> twin{{0, 0}, {1, 1}, {2, 1}, {3, 0}};
+  const std::vector<Point2d> first{{0, 0}, {1, 1}, {3, 0}};
+  EXPECT_TRUE(Same(run_vector(twin, 0, 0.95), first));
+  EXPECT_TRUE(Same(run_polyline(twin, 1.9), first));
+  // An offset curve's start point arrives first, second and last.
+  const std::vector<Point2d> curve{{0, 0}, {0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}};
+  EXPECT_TRUE(Same(run_polyline(curve, 0.001),
+                   std::vector<Point2d>{{0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}}));
+  std::vector<Point2d> line;
+  for (int i = 0; i <= 50; ++i) line.push_back({i * 0.25, i * 0.5});
+  EXPECT_TRUE(Same(run_polyline(line, 0.001), std::vector<Point2d>{{0, 0}, {12.5, 25}}));
+}
+
+TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
+  PolylineSimplifier ps;
+  Array<Point2d> out;
+  out.Add({-7, -7});
+  const std::vector<Point2d> line{{0, 0}, {1, 0}, {2, 0}, {3, 0}};
+  ps.simplify(line.data(), 4, 0.01, out, false);
+  EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()),
+                   std::vector<Point2d>{{-7, -7}, {0, 0}, {3, 0}}));
+  ps.simplify(line.data(), 0, 0.01, out, true);
+  EXPECT_EQ(out.count(), 0);
+
+  Array<Point2d>* list = ps.resultList(100);
+  EXPECT_TRUE(list->capacity() == 5000 && list->growBy() == 1000 && ps.resultList(9000) == list);
+  EXPECT_EQ(PolylineSimplifier().resultList(6000)->capacity(), 6010);
+}
+
+TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
+  PolylineSimplifier ps;
+  ps.setFlagAllocator([](std::int64_t) -> std::int32_t* { return nullptr; });
+  std::vector<Point2d> line{{0, 0}, {0, 0}, {1, 0}, {2, 0}, {3, 0}};
+  Array<Point2d> out;
+  ps.simplify(line.data(), 5, 0.01, out, true);
+  EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()), line));
+}
+
+// Fills `l` and returns it, so a case reads as one line.
+const TaggedPointList& list_of(TaggedPointList& l, const std::vector<TaggedPoint>& pts) {
+  l.Clear();
+  for (const TaggedPoint& p : pts) l.Add(p);
+  return l;
+}
+
+TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
+  const TaggedPoint sep = TaggedPoint::separator();
+  TaggedPointList in, out;
+  out.Add({5, 1, 1});
+  zt::simplify_polylines(list_of(in, {sep, sep, {7, 99995, 0}}), out, 0.005);
+  EXPECT_EQ(out.count(), 0);
+  zt::simplify_polylines(list_of(in, {sep, {3, 1, 1}, sep}), out, 0.005);
+  EXPECT_EQ(out.count(), 0);
+
+  // Two polylines, no leading separator, one trailing; a one-point polyline
+  // between them vanishes; a collinear point goes; every tag becomes 1.
+  zt::simplify_polylines(
+      list_of(in, {{9, 0, 0}, {9, 1, 0}, {9, 2, 0}, sep, {4, 8, 8}, sep, {2, 5, 5}, {2, 6, 6}, sep}), out,
+      0.005);
+  const std::vector<TaggedPoint> want{sep, {1, 0, 0}, {1, 2, 0}, sep, {1, 5, 5}, {1, 6, 6}};
+  ASSERT_EQ(out.count(), static_cast<int>(want.size()));
+  for (int k = 0; k < out.count(); ++k) {
+    EXPECT_EQ(out[k].tag, want[k].tag) << k;
+    EXPECT_EQ(out[k].x, want[k].x) << k;
+    EXPECT_EQ(out[k].y, want[k].y) << k;
+  }
+
+  // x exactly at the threshold starts no polyline but continues one.
+  zt::simplify_polylines(list_of(in, {{0, 99990, 0}, {0, 1, 1}, {0, 99990, 0}, {0, 1, 9}}), out, 0.005);
+  ASSERT_EQ(out.count(), 4);
+  EXPECT_EQ(out[2].x, 99990.0);
+  // Two points closer than the single-precision epsilon: the second remains.
+  zt::simplify_polylines(list_of(in, {{0, 1, 1}, {0, 1 + 1e-8, 1}}), out, 0.005);
+  ASSERT_EQ(out.count(), 2);
+  EXPECT_EQ(out[1].x, 1 + 1e-8);
+}
+
+}  // namespace
+
+// zonetool simplify's text form: blank lines only between polylines, shortest
+// numbers, bad input refused with status 2.
+TEST(ZonetoolSimplify, TextRoundTrip) {
+  const std::string tool = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool";
+  if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
+  auto run = [&](const std::string& args, const std::string& input, int& status) {
+    const std::string cmd = "printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null";
+    FILE* p = popen(cmd.c_str(), "r");
+    if (!p) return std::string("popen failed");
+    std::string out;
+    char buf[256];
+    for (size_t n; (n = fread(buf, 1, sizeof buf, p)) > 0;) out.append(buf, n);
+    status = WEXITSTATUS(pclose(p));
+    return out;
+  };
+  int status = -1;
+  EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),
+            "0 0\n2.5 0\n\n1 1\n");
+  EXPECT_EQ(status, 0);
+  run("--tolerance 0.01", "1 2 3\\n", status);
+  EXPECT_EQ(status, 2);
+  run("--tolerance -1", "", status);
+  EXPECT_EQ(status, 2);
+}
