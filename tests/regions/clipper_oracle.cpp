@@ -262,6 +262,21 @@ TEST(ClipperOracle, DegenerateOnIntegerGrid) {
   }
 }
 
+// Sixteen wedges of A meet at the origin, a corner of B: a star of more than
+// twenty entries, sorted by the quicksort rather than the selection pass.
+TEST(ClipperOracle, ManyContoursMeetingAtOneVertex) {
+  Region a, b;
+  for (int k = 0; k < 16; ++k) {
+    const double t0 = 2 * M_PI * k / 16, t1 = t0 + 2 * M_PI / 40;
+    a.push_back({{0, 0}, {snap20(10 * std::cos(t0)), snap20(10 * std::sin(t0))},
+                 {snap20(10 * std::cos(t1)), snap20(10 * std::sin(t1))}});
+  }
+  b.push_back(rect(0, 0, 5, 5));
+  check_case(a, b, "wedges");
+  b = {rect(-3, -3, 0, 0), rect(1, -4, 4, 4)};
+  check_case(a, b, "wedges and two squares");
+}
+
 // B is A moved by a small lattice step (or not at all): long collinear
 // overlaps, shared edges and vertices in the same direction.
 TEST(ClipperOracle, ShiftedCopiesOnIntegerGrid) {

@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <cstdio>
 #include <fstream>
@@ -27,7 +28,8 @@ std::string slurp(const std::string& path) {
 }
 
 ToolRun run(const std::string& args) {
-  const std::string err = ::testing::TempDir() + "zonetool_boolean_err.txt";
+  // One file per test process: ctest runs the tests side by side.
+  const std::string err = ::testing::TempDir() + "zonetool_boolean_err." + std::to_string(getpid());
   FILE* p = popen((kTool + " boolean " + args + " 2>" + err).c_str(), "r");
   ToolRun r{-1, "", ""};
   if (!p) return r;
