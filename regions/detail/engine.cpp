@@ -31,6 +31,7 @@ BooleanEngine::~BooleanEngine() {
   delete grid.vertices;
   delete[] grid.buckets;
   delete[] boxScratch;
+  delete[] splitScratch;
 }
 
 void reset_set(BooleanEngine& e, PolygonSet& set) {

@@ -90,6 +90,13 @@ struct IntersectionProbe {
   std::int32_t retryReversed = 0;
 };
 
+struct SplitCandidate {
+  double t = 0.0;
+  std::int32_t order = 0;  // place in the order the crossings were found
+  std::int32_t accepted = 0;
+  SplitPoint* split = nullptr;
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
@@ -113,6 +120,9 @@ struct BooleanEngine {
   // Contiguous copy of one set's boxes while its tree is built.
   EdgeBox* boxScratch = nullptr;
   std::int32_t boxScratchCapacity = 0;
+  // The crossings found on one edge while its split list is settled.
+  SplitCandidate* splitScratch = nullptr;
+  std::int32_t splitScratchCapacity = 0;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
 
@@ -176,8 +186,11 @@ inline bool boxes_overlap(std::int32_t axmin, std::int32_t aymin, std::int32_t a
 
 // ---- overlay (intersections.cpp, half_edges.cpp)
 int find_intersections(BooleanEngine& e);
-// Inserts (t, v) into the edge's split list unless an entry lies within eps in t.
-int insert_split(SplitPool& pool, Edge& edge, double t, Vertex* v, double eps);
+// Crossings are recorded on their edges as they are found, then each edge's
+// list is settled: taken in the order found, a crossing is kept unless one
+// kept before lies within eps in t; the kept ones sorted by ascending t.
+int record_split(SplitPool& pool, Edge& edge, double t, Vertex* v);
+int settle_splits(BooleanEngine& e, Edge& edge, double eps);
 int build_half_edges(BooleanEngine& e, PolygonSet& set);
 bool contour_has_splits(BooleanEngine& e, InputContour& c);
 

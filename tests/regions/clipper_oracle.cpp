@@ -253,6 +253,17 @@ TEST(ClipperOracle, ManyContoursMeetingAtOneVertex) {
   check_case(a, b, "wedges and two squares");
 }
 
+// One long edge crossed 3,000 times by a comb: every crossing lands on the
+// same split list.
+TEST(ClipperOracle, CombAcrossOneLongEdge) {
+  Region comb(1);
+  for (int k = 0; k < 3000; ++k) comb[0].push_back({snap20(0.5 + 999.0 * k / 3000), k % 2 ? 600.0 : 400.0});
+  comb[0].push_back({999.5, 300});
+  comb[0].push_back({0.5, 300});
+  std::reverse(comb[0].begin(), comb[0].end());  // counter-clockwise
+  check_case({rect(0, 500, 1000, 1000)}, comb, "comb");
+}
+
 // B is A moved by a small lattice step (or not at all): long collinear
 // overlaps, shared edges and vertices in the same direction.
 TEST(ClipperOracle, ShiftedCopiesOnIntegerGrid) {

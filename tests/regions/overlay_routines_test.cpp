@@ -5,6 +5,7 @@
 
 #include <cmath>
 #include <random>
+#include <vector>
 
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
@@ -86,19 +87,42 @@ TEST(RayCrossing, VerticesCountAsJustAboveTheRay) {
   EXPECT_EQ(ray_crossing(0, 0, 1, -1, 1, 1e-16, kEps), 1);
 }
 
-TEST(SplitList, SortedAndCrossingsCloserThanEpsKeepTheFirst) {
-  SplitPool pool;
-  Edge edge;
-  Vertex v[5];
-  const double ts[] = {0.5, 0.25, 0.75, 0.5 + 0.5 * kEps, 0.0};
-  for (int i = 0; i < 5; ++i) ASSERT_EQ(insert_split(pool, edge, ts[i], &v[i], kEps), 0);
-  const Vertex* expected[] = {&v[4], &v[1], &v[0], &v[2]};
-  int i = 0;
-  for (const SplitPoint* s = edge.splits; s; s = s->next, ++i) {
-    ASSERT_LT(i, 4);
-    EXPECT_EQ(s->vertex, expected[i]);
+// Settled split lists against the plain rule: each crossing, in the order
+// found, walks the sorted list from its head and stops before the first
+// entry more than eps beyond it; it is dropped if it met one within eps.
+// (A crossing exactly eps before a kept one goes in sorted order, where the
+// plain walk would pass that one first.)
+TEST(SplitList, SettledListsFollowTheInsertionRule) {
+  std::mt19937_64 rng(11);
+  std::uniform_real_distribution<double> u(0, 1), near(-2, 2);
+  std::uniform_int_distribution<int> count(1, 60);
+  BooleanEngine e;
+  static Vertex v[64];
+  for (int round = 0; round < 2000; ++round) {
+    Edge edge;
+    std::vector<std::pair<double, Vertex*>> model;  // the plain rule's list
+    const int n = count(rng);
+    double base = u(rng);
+    for (int i = 0; i < n; ++i) {
+      // Clusters of crossings a few eps apart, and scattered ones.
+      const double t = u(rng) < 0.7 ? base + near(rng) * kEps : (base = u(rng));
+      ASSERT_EQ(record_split(e.splits, edge, t, &v[i]), 0);
+      bool clash = false;
+      for (auto it = model.begin(); it != model.end() && !(it->first - kEps > t); ++it)
+        clash = clash || std::fabs(it->first - t) < kEps;
+      auto at = model.begin();
+      while (at != model.end() && at->first <= t) ++at;
+      if (!clash) model.insert(at, {t, &v[i]});
+    }
+    ASSERT_EQ(settle_splits(e, edge, kEps), 0);
+    std::size_t i = 0;
+    for (const SplitPoint* s = edge.splits; s; s = s->next, ++i) {
+      ASSERT_LT(i, model.size());
+      ASSERT_EQ(s->t, model[i].first);
+      ASSERT_EQ(s->vertex, model[i].second);
+    }
+    ASSERT_EQ(i, model.size());
   }
-  EXPECT_EQ(i, 4);
 }
 
 TEST(PseudoAngle, IncreasesCounterClockwiseFromZeroToEight) {
