@@ -3,7 +3,8 @@
 //   operands      bounding box, normalisation, snapping, reading contours
 //   vertex_grid   merging of points closer than the engine tolerance
 //   box_tree      edges, integer boxes and the median-split box trees
-//   intersections dual box-tree walk, split lists (with geometry.hpp)
+//   intersections dual box-tree walk (with geometry.hpp)
+//   split_lists   the crossings on each edge, settled into sorted lists
 //   half_edges    cut contours as twin half-edges with contour links
 //   stars         angular sweep at shared vertices, keep propagation, pairing
 //   whole_contours ray parity of contours that meet the other operand nowhere
@@ -24,14 +25,14 @@ inline constexpr double kSnapQuantum = 0x1p-48;
 // Engine tolerance: points closer than this (normalised, per coordinate)
 // are one vertex; also the closing-duplicate tolerance in input units.
 inline constexpr double kEngineEpsilon = 2 * kSnapQuantum;
-// Records at or above this coordinate are separators.
+// A record with x above this ends a contour; one at or above it never starts one.
 inline constexpr double kSeparatorThreshold = 99990.0;
 // Grid cell and box unit: 1/1000 of the normalised square.
 inline constexpr double kGridCell = 0.001;
 inline constexpr double kBoxUnitsPerSquare = 1000.0;
 // Cells of the vertex index proper: fine enough that densely sampled
-// contours put only a few points in one, and tiled onto the bucket table
-// kFineTile cells a side so that neighbouring cells share cache lines.
+// contours put only a few points in one, and laid onto the bucket table in
+// tiles of 2^kFineTileBits cells a side so that neighbours share cache lines.
 inline constexpr double kFineCell = 0x1p-14;
 inline constexpr std::uint64_t kFineTileBits = 9;
 inline constexpr std::int32_t kMinFineBuckets = 1024;
