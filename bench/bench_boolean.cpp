@@ -1,7 +1,8 @@
 // rg_boolean beside Clipper on the same inputs, in the same run:
 //   Wavy   two wavy 50,000-vertex circles that cross at a few points;
 //   Noisy  two noisy, nearly coincident 50,000-vertex circles that cross at
-//          tens of thousands of points.
+//          tens of thousands of points;
+//   Comb   a square whose one edge is crossed 20,000 times by a comb.
 // Intersection and union of each. Clipper gets the same points scaled by
 // 2^30 to integers; that conversion is done once, outside the timing.
 #include <benchmark/benchmark.h>
@@ -47,6 +48,17 @@ const Pair& noisy() {
       circle(0, 0, [](int, double, std::mt19937_64& g) { return 1 + 1e-4 * std::normal_distribution<>()(g); }, 3),
       circle(1e-5, 0, [](int, double, std::mt19937_64& g) { return 1 + 1e-4 * std::normal_distribution<>()(g); },
              4)};
+  return p;
+}
+
+const Pair& comb() {
+  static const Pair p = [] {
+    Pair c;
+    c.a = {{1, 0, 500}, {1, 1000, 500}, {1, 1000, 1000}, {1, 0, 1000}};
+    c.b = {{2, 0.5, 300}, {2, 999.5, 300}};
+    for (int k = 19999; k >= 0; --k) c.b.emplace_back(2, 0.5 + 999.0 * k / 20000, k % 2 ? 600.0 : 400.0);
+    return c;
+  }();
   return p;
 }
 
@@ -98,6 +110,9 @@ void BM_Noisy_Intersection_Clipper(benchmark::State& s) { run_clipper(s, noisy()
 void BM_Noisy_Union_Ours(benchmark::State& s) { run_ours(s, noisy(), "u"); }
 void BM_Noisy_Union_Clipper(benchmark::State& s) { run_clipper(s, noisy(), ClipperLib::ctUnion); }
 
+void BM_Comb_Intersection_Ours(benchmark::State& s) { run_ours(s, comb(), "i"); }
+void BM_Comb_Intersection_Clipper(benchmark::State& s) { run_clipper(s, comb(), ClipperLib::ctIntersection); }
+
 BENCHMARK(BM_Wavy_Intersection_Ours)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Wavy_Intersection_Clipper)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Wavy_Union_Ours)->Unit(benchmark::kMillisecond);
@@ -106,6 +121,8 @@ BENCHMARK(BM_Noisy_Intersection_Ours)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Noisy_Intersection_Clipper)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Noisy_Union_Ours)->Unit(benchmark::kMillisecond);
 BENCHMARK(BM_Noisy_Union_Clipper)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Comb_Intersection_Ours)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_Comb_Intersection_Clipper)->Unit(benchmark::kMillisecond);
 
 }  // namespace
 

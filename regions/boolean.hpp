@@ -9,11 +9,15 @@
 // most 1e15 in magnitude.
 //
 // Output: the result contours, each followed by one separator (tag
-// -100000000, x = y = 99999). Union and intersection give counter-clockwise
-// outer boundaries; the difference keeps the orientation of the subtrahend's
-// pieces, so its outer boundaries come out clockwise. Every point carries the
-// tag of the input edge it lies on; where the tag changes, the point is
-// written once with each tag. Points closer than 1e-7 with one tag are merged.
+// -100000000, x = y = 99999): first the contours that meet the other operand
+// nowhere and are kept whole (A's, then B's), then the contours chained from
+// cut pieces. Union and intersection give counter-clockwise outer boundaries
+// and clockwise holes. A difference contour runs in the direction of the
+// piece its chain starts from: clockwise when that is a piece of B (the two
+// overlapping squares), counter-clockwise when it is one of A; contours kept
+// whole keep their input orientation. Every point carries the tag of the
+// input edge it lies on; where the tag changes, the point is written once
+// with each tag. Consecutive points closer than 1e-7 with one tag are merged.
 //
 // Returns 0, or -1 on failure: a null result, an unknown operation, an operand
 // without any edge, bad coordinates, exhausted storage, or an inconsistent

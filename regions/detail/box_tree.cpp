@@ -11,11 +11,13 @@
 namespace zt::detail {
 
 std::int32_t box_coordinate(double v, std::int32_t pad) {
-  double f = std::floor(kBoxUnitsPerSquare * v);
-  if (std::isnan(f)) f = 0.0;
+  double f = kBoxUnitsPerSquare * v;
+  if (!(f > -kIndexClamp)) f = std::isnan(f) ? 0.0 : -kIndexClamp;
   if (f > kIndexClamp) f = kIndexClamp;
-  if (f < -kIndexClamp) f = -kIndexClamp;
-  return static_cast<std::int32_t>(f) + pad;
+  // floor by truncation, one step down for negative non-integers
+  std::int32_t i = static_cast<std::int32_t>(f);
+  if (i > f) --i;
+  return i + pad;
 }
 
 namespace {

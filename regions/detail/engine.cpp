@@ -31,6 +31,7 @@ BooleanEngine::~BooleanEngine() {
   delete grid.vertices;
   delete[] grid.buckets;
   delete[] boxScratch;
+  delete[] splitScratch;
 }
 
 void reset_set(BooleanEngine& e, PolygonSet& set) {
@@ -78,9 +79,7 @@ BooleanEngine* prepare_thread_engine() {
   e.halves.reset();
   e.splits.reset();
   e.stars.reset();
-  if (e.grid.vertices) e.grid.vertices->reset();
-  for (std::int32_t i = 0; i < e.grid.bucketCount; ++i) e.grid.buckets[i] = nullptr;
-  e.grid.sharedHead = nullptr;
+  clear_grid(e.grid);
   return &e;
 }
 

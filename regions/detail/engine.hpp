@@ -3,7 +3,8 @@
 //   operands      bounding box, normalisation, snapping, reading contours
 //   vertex_grid   merging of points closer than the engine tolerance
 //   box_tree      edges, integer boxes and the median-split box trees
-//   intersections dual box-tree walk, split lists (with geometry.hpp)
+//   intersections dual box-tree walk (with geometry.hpp)
+//   split_lists   the crossings on each edge, settled into sorted lists
 //   half_edges    cut contours as twin half-edges with contour links
 //   stars         angular sweep at shared vertices, keep propagation, pairing
 //   whole_contours ray parity of contours that meet the other operand nowhere
@@ -24,13 +25,17 @@ inline constexpr double kSnapQuantum = 0x1p-48;
 // Engine tolerance: points closer than this (normalised, per coordinate)
 // are one vertex; also the closing-duplicate tolerance in input units.
 inline constexpr double kEngineEpsilon = 2 * kSnapQuantum;
-// Records at or above this coordinate are separators.
+// A record with x above this ends a contour; one at or above it never starts one.
 inline constexpr double kSeparatorThreshold = 99990.0;
 // Grid cell and box unit: 1/1000 of the normalised square.
 inline constexpr double kGridCell = 0.001;
 inline constexpr double kBoxUnitsPerSquare = 1000.0;
-inline constexpr std::int32_t kGridRowWidth = 1003;
-inline constexpr std::int32_t kMinBuckets = 997;
+// Cells of the vertex index proper: fine enough that densely sampled
+// contours put only a few points in one, and laid onto the bucket table in
+// tiles of 2^kFineTileBits cells a side so that neighbours share cache lines.
+inline constexpr double kFineCell = 0x1p-14;
+inline constexpr std::uint64_t kFineTileBits = 9;
+inline constexpr std::int32_t kMinFineBuckets = 1024;
 // Cell indexes and box bounds are clamped to this magnitude so that points far
 // outside the normalised square (read, but not counted by the bounding box)
 // still give well-defined integer keys.
@@ -51,12 +56,16 @@ using StarPool = ChunkPool<StarEntry, 10, 10>;
 using VertexPool = ChunkPool<Vertex>;
 using ContourPool = ChunkPool<InputContour>;
 
+// Vertices are found through a hash of fine cells, so a lookup costs about
+// the same however densely the contours are sampled. Which vertex a lookup
+// returns when several lie within the tolerance is ruled by the 1/1000
+// grid: the first grid cell, column by column and row by row, that holds
+// one, and within it the vertex created last.
 struct VertexGrid {
-  std::int32_t bucketCount = 0;
+  std::int32_t bucketMask = 0;  // bucket count - 1, a power of two
   VertexPool* vertices = nullptr;  // created at the first sizing
   Vertex** buckets = nullptr;
   Vertex* sharedHead = nullptr;
-  std::int32_t rowWidth = kGridRowWidth;
   double originX = 0.0, originY = 0.0;
   double cell = kGridCell;
   double eps = kEngineEpsilon;
@@ -82,6 +91,13 @@ struct IntersectionProbe {
   std::int32_t retryReversed = 0;
 };
 
+struct SplitCandidate {
+  double t = 0.0;
+  std::int32_t order = 0;  // place in the order the crossings were found
+  std::int32_t accepted = 0;
+  SplitPoint* split = nullptr;
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
@@ -105,6 +121,9 @@ struct BooleanEngine {
   // Contiguous copy of one set's boxes while its tree is built.
   EdgeBox* boxScratch = nullptr;
   std::int32_t boxScratchCapacity = 0;
+  // The crossings found on one edge while its split list is settled.
+  SplitCandidate* splitScratch = nullptr;
+  std::int32_t splitScratchCapacity = 0;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
 
@@ -146,11 +165,13 @@ void for_each_stored_point(const InputContour& c, F&& f) {
 // ---- vertex grid (vertex_grid.cpp)
 std::int32_t grid_bucket_count_for(std::int32_t pointCount);
 int size_grid(VertexGrid& g, std::int32_t pointCount);
+void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
-// Bucket of a cell, never outside [0, bucketCount) whatever the cell's sign.
+// Bucket of a fine cell, never outside the table whatever the cell's sign.
 std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column);
+// Cell of a coordinate, clamped to +-kIndexClamp.
 std::int64_t grid_cell_index(double v, double origin, double cell);
 
 // ---- edges and box trees (box_tree.cpp)
@@ -166,8 +187,11 @@ inline bool boxes_overlap(std::int32_t axmin, std::int32_t aymin, std::int32_t a
 
 // ---- overlay (intersections.cpp, half_edges.cpp)
 int find_intersections(BooleanEngine& e);
-// Inserts (t, v) into the edge's split list unless an entry lies within eps in t.
-int insert_split(SplitPool& pool, Edge& edge, double t, Vertex* v, double eps);
+// Crossings are recorded on their edges as they are found, then each edge's
+// list is settled: taken in the order found, a crossing is kept unless one
+// kept before lies within eps in t; the kept ones sorted by ascending t.
+int record_split(SplitPool& pool, Edge& edge, double t, Vertex* v);
+int settle_splits(BooleanEngine& e, Edge& edge, double eps);
 int build_half_edges(BooleanEngine& e, PolygonSet& set);
 bool contour_has_splits(BooleanEngine& e, InputContour& c);
 

@@ -1,7 +1,7 @@
 // Finding the meeting points of the two operands: a dual walk of their box
 // trees reaches every pair of edges (one of each operand) whose boxes overlap
 // strictly; each meeting point becomes a shared vertex and a split point on
-// both edges.
+// both edges (split_lists.cpp).
 #include <algorithm>
 #include <cmath>
 
@@ -9,26 +9,6 @@
 #include "regions/detail/geometry.hpp"
 
 namespace zt::detail {
-
-int insert_split(SplitPool& pool, Edge& edge, double t, Vertex* v, double eps) {
-  SplitPoint* prev = nullptr;
-  SplitPoint* cur = edge.splits;
-  while (cur) {
-    if (std::fabs(cur->t - t) < eps) return 0;  // an earlier split already stands here
-    if (cur->t - eps > t) break;
-    prev = cur;
-    cur = cur->next;
-  }
-  SplitPoint* sp = pool.take();
-  if (!sp) return -1;
-  *sp = SplitPoint{t, v, cur};
-  if (prev) {
-    prev->next = sp;
-  } else {
-    edge.splits = sp;
-  }
-  return 0;
-}
 
 namespace {
 
@@ -69,8 +49,8 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
     if (!v) return -1;
     const double tA = ((R.x - pr.p0.x) * uAx + (R.y - pr.p0.y) * uAy) / pr.dirA.length;
     const double tB = ((R.x - pr.q0.x) * uBx + (R.y - pr.q0.y) * uBy) / pr.dirB.length;
-    if (insert_split(*pr.splits, first, tA, v, pr.eps) != 0) return -1;
-    if (insert_split(*pr.splits, second, tB, v, pr.eps) != 0) return -1;
+    if (record_split(*pr.splits, first, tA, v) != 0) return -1;
+    if (record_split(*pr.splits, second, tB, v) != 0) return -1;
   }
   return 0;
 }
@@ -106,7 +86,8 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
 int find_intersections(BooleanEngine& e) {
   e.probe.mode = 1;
   if (!e.a.root || !e.b.root) return -1;
-  const int rc = walk(e, e.a.root, e.b.root);
+  int rc = walk(e, e.a.root, e.b.root);
+  for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
   e.halves.reset();
   e.stars.reset();
   return rc;

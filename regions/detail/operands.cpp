@@ -46,9 +46,14 @@ void set_normalisation(BooleanEngine& e, const BoundingBox& box) {
 }
 
 double snap_coordinate(double v) {
-  double whole = 0.0;
-  const double frac = std::modf(v, &whole);
-  return whole + std::floor(frac / kSnapQuantum) * kSnapQuantum;
+  // Integer and fractional parts, both with the sign of v (inputs are at
+  // most kMaxInputMagnitude, so the conversions are exact); the quantum is a
+  // power of two, so the scaled fraction is exact too.
+  const double whole = static_cast<double>(static_cast<std::int64_t>(v));
+  const double steps = (v - whole) * (1.0 / kSnapQuantum);
+  std::int64_t k = static_cast<std::int64_t>(steps);
+  if (static_cast<double>(k) > steps) --k;  // floor
+  return whole + static_cast<double>(k) * kSnapQuantum;
 }
 
 bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p) {

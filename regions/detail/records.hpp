@@ -22,6 +22,7 @@ struct Vertex {
   std::int32_t owner = 0;  // 1, 2, or kSharedOwner
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
+  std::int32_t serial = 0;  // creation order within the operation
   Vertex* nextInBucket = nullptr;
   Vertex* nextShared = nullptr;
   HalfEdge* firstOut = nullptr;

@@ -54,8 +54,14 @@ void sort_entries(StarPool& pool, std::int32_t lo, std::int32_t hi) {
       if (i >= j) break;
       std::swap(pool[i], pool[j]);
     }
-    sort_entries(pool, lo, j);
-    lo = j + 1;
+    // Recurse into the smaller side so the depth stays logarithmic.
+    if (j - lo < hi - j) {
+      sort_entries(pool, lo, j);
+      lo = j + 1;
+    } else {
+      sort_entries(pool, j + 1, hi);
+      hi = j;
+    }
   }
   for (std::int32_t p = lo; p < hi; ++p) {
     std::int32_t best = p;
