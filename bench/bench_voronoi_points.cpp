@@ -1,0 +1,118 @@
+// The diagram of points beside Boost.Polygon's Voronoi diagram on the same
+// integer input in the same run: 1e5 and 1e6 uniform points, 1e5 clustered
+// points. Each case also reports the peak memory of one construction
+// (growth of the resident set's high-water mark, in a child process).
+#include <benchmark/benchmark.h>
+#include <sys/wait.h>
+#include <malloc.h>
+#include <unistd.h>
+
+#include <boost/polygon/voronoi.hpp>
+#include <cstdio>
+#include <fstream>
+#include <map>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "voronoi/engine.hpp"
+
+namespace {
+
+using BPoint = boost::polygon::point_data<int>;
+
+std::vector<BPoint> Uniform(int n) {
+  std::mt19937 rng(1);
+  std::uniform_int_distribution<int> u(0, (1 << 24) - 1);
+  std::vector<BPoint> pts(n);
+  for (auto& p : pts) p = BPoint(u(rng), u(rng));
+  return pts;
+}
+
+std::vector<BPoint> Clustered(int n) {
+  std::mt19937 rng(2);
+  std::uniform_int_distribution<int> u(0, (1 << 24) - 1);
+  std::normal_distribution<double> spread(0.0, 3000.0);
+  std::vector<BPoint> centres(20);
+  for (auto& c : centres) c = BPoint(u(rng), u(rng));
+  std::vector<BPoint> pts(n);
+  for (int i = 0; i < n; ++i)
+    pts[i] = BPoint(centres[i % 20].x() + int(spread(rng)), centres[i % 20].y() + int(spread(rng)));
+  return pts;
+}
+
+const std::vector<BPoint>& Input(int kind, int n) {
+  static std::map<std::pair<int, int>, std::vector<BPoint>> cache;
+  auto& v = cache[{kind, n}];
+  if (v.empty()) v = kind == 0 ? Uniform(n) : Clustered(n);
+  return v;
+}
+
+void RunOurs(const std::vector<BPoint>& pts) {
+  zt::VD_Initialize();
+  zt::VD_Reset();
+  for (const auto& p : pts) zt::API_AddPoint(p.x(), p.y(), 0);
+  if (!zt::VD_ComputeDiagram(false, 1, true, false, 0, 0, 0.0, 0.0, true)) std::abort();
+}
+
+void RunBoost(const std::vector<BPoint>& pts) {
+  boost::polygon::voronoi_diagram<double> vd;
+  boost::polygon::construct_voronoi(pts.begin(), pts.end(), &vd);
+  benchmark::DoNotOptimize(vd.num_vertices());
+}
+
+long StatusKb(const char* field) {
+  std::ifstream f("/proc/self/status");
+  std::string line;
+  const std::string key = std::string(field) + ":";
+  while (std::getline(f, line))
+    if (line.rfind(key, 0) == 0) return std::stol(line.substr(key.size()));
+  return 0;
+}
+
+// Peak resident growth (MB) of one run, in a fresh child process.
+double PeakMb(void (*run)(const std::vector<BPoint>&), const std::vector<BPoint>& pts) {
+  int fds[2];
+  if (pipe(fds) != 0) return -1;
+  const pid_t pid = fork();
+  if (pid == 0) {
+    close(fds[0]);
+    zt::VD_Terminate();  // start from an engine without memory
+    malloc_trim(0);
+    std::ofstream("/proc/self/clear_refs") << "5";  // restart the peak from here
+    const long before = StatusKb("VmRSS");
+    run(pts);
+    const double mb = (StatusKb("VmHWM") - before) / 1024.0;
+    if (write(fds[1], &mb, sizeof mb) != sizeof mb) _exit(1);
+    _exit(0);
+  }
+  close(fds[1]);
+  double mb = -1;
+  if (read(fds[0], &mb, sizeof mb) != sizeof mb) mb = -1;
+  close(fds[0]);
+  int status = 0;
+  waitpid(pid, &status, 0);
+  return mb;
+}
+
+void BM_Ours(benchmark::State& state) {
+  const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  state.counters["peak_MB"] = PeakMb(RunOurs, pts);
+  for (auto _ : state) RunOurs(pts);
+  state.counters["restarts"] = zt::VD_GetRestartCount();
+}
+
+void BM_Boost(benchmark::State& state) {
+  const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  state.counters["peak_MB"] = PeakMb(RunBoost, pts);
+  for (auto _ : state) RunBoost(pts);
+}
+
+// Arguments: (0 uniform | 1 clustered, number of points).
+#define CASES ->Args({0, 100000})->Args({0, 1000000})->Args({1, 100000})->Unit(benchmark::kMillisecond)
+BENCHMARK(BM_Ours) CASES;
+BENCHMARK(BM_Boost) CASES;
+
+}  // namespace
+
+BENCHMARK_MAIN();

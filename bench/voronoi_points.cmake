@@ -1,0 +1,1 @@
+zt_bench(bench_voronoi_points LIBS voronoi NEEDS BOOST)

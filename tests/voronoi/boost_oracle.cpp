@@ -1,0 +1,166 @@
+// Oracle: the diagram of integer point sets against Boost.Polygon's Voronoi
+// diagram. Every Boost vertex whose circle holds no corner point (so that it
+// is a vertex of our diagram too) must match one of our nodes within 1e-9 of
+// the extent, and every node of ours between three caller points must match
+// a Boost vertex (nodes of cocircular groups may coincide).
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <boost/polygon/voronoi.hpp>
+#include <cmath>
+#include <random>
+#include <vector>
+
+#include "vd_test_util.hpp"
+
+namespace zt {
+namespace {
+
+using namespace vdtest;
+using BPoint = boost::polygon::point_data<int>;
+
+struct XY {
+  double x, y;
+};
+
+// Whether some point of `b` (sorted by x) lies within tol of p.
+bool Near(const std::vector<XY>& b, XY p, double tol) {
+  auto it = std::lower_bound(b.begin(), b.end(), p.x - tol, [](const XY& q, double v) { return q.x < v; });
+  for (; it != b.end() && it->x <= p.x + tol; ++it)
+    if (std::fabs(it->y - p.y) <= tol) return true;
+  return false;
+}
+
+struct Outcome {
+  int boostChecked = 0, oursChecked = 0;
+  std::string error;
+};
+
+Outcome Compare(const std::vector<BPoint>& input) {
+  Outcome out;
+  std::vector<Pt> pts;
+  for (const BPoint& p : input) pts.push_back({double(p.x()), double(p.y())});
+  Store(pts);
+  if (!ComputePoints()) {
+    out.error = "not computed";
+    return out;
+  }
+  if (std::string e = FinalCheck(pts.size() < 3000); !e.empty()) {
+    out.error = "checker: " + e;
+    return out;
+  }
+  double minX = 1e300, maxX = -1e300, minY = 1e300, maxY = -1e300;
+  for (const Pt& p : pts) {
+    minX = std::min(minX, p.x), maxX = std::max(maxX, p.x);
+    minY = std::min(minY, p.y), maxY = std::max(maxY, p.y);
+  }
+  const double tol = 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
+
+  // Corner points in user coordinates.
+  std::vector<XY> corners;
+  const vd::Engine& g = vd::Vd();
+  for (std::int32_t i : {0, 1, g.points.count - 2, g.points.count - 1})
+    corners.push_back({vd::ToUserX(g.points[i].x), vd::ToUserY(g.points[i].y)});
+  double cx0 = 1e300, cx1 = -1e300, cy0 = 1e300, cy1 = -1e300;
+  for (const XY& c : corners) cx0 = std::min(cx0, c.x), cx1 = std::max(cx1, c.x), cy0 = std::min(cy0, c.y), cy1 = std::max(cy1, c.y);
+
+  // Our nodes whose sites are all caller points.
+  std::vector<char> real(VD_GetNodeCount(), 1);
+  for (std::int32_t e = 0; e < VD_GetEdgeCount(); ++e) {
+    const VD_EdgeInfo info = VD_GetEdge(e);
+    if (!info.live) continue;
+    const bool corner = info.ltype != 2 || info.rtype != 2 || VD_GetPointTag(info.lft) < 0 || VD_GetPointTag(info.rgt) < 0;
+    if (corner) real[info.n1] = real[info.n2] = 0;
+  }
+  std::vector<XY> ours, oursAll;
+  for (std::int32_t n = 4; n < VD_GetNodeCount(); ++n) {
+    const VD_NodeInfo info = VD_GetNode(n);
+    if (!info.live) continue;
+    oursAll.push_back({info.x, info.y});
+    if (real[n]) ours.push_back({info.x, info.y});
+  }
+  std::sort(oursAll.begin(), oursAll.end(), [](XY a, XY b) { return a.x < b.x; });
+
+  boost::polygon::voronoi_diagram<double> bd;
+  boost::polygon::construct_voronoi(input.begin(), input.end(), &bd);
+  std::vector<XY> theirs;
+  for (const auto& v : bd.vertices()) {
+    const XY p{v.x(), v.y()};
+    theirs.push_back(p);
+    if (p.x < cx0 || p.x > cx1 || p.y < cy0 || p.y > cy1) continue;
+    // The circle of the vertex: through the site of one of its cells.
+    const auto* cell = v.incident_edge()->cell();
+    const BPoint& s = input[cell->source_index()];
+    const double r = std::hypot(p.x - s.x(), p.y - s.y());
+    bool holdsCorner = false;
+    for (const XY& c : corners) holdsCorner |= std::hypot(p.x - c.x, p.y - c.y) < r;
+    if (holdsCorner) continue;
+    ++out.boostChecked;
+    if (!Near(oursAll, p, tol)) {
+      out.error = "boost vertex (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") has no node";
+      return out;
+    }
+  }
+  std::sort(theirs.begin(), theirs.end(), [](XY a, XY b) { return a.x < b.x; });
+  for (const XY& p : ours) {
+    ++out.oursChecked;
+    if (!Near(theirs, p, tol)) {
+      out.error = "node (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") is no boost vertex";
+      return out;
+    }
+  }
+  return out;
+}
+
+TEST(BoostOracle, RandomIntegerPoints) {
+  std::mt19937 rng(42);
+  int checked = 0;
+  for (int round = 0; round < 60; ++round) {
+    const int n = 3 + round * 25;
+    const int range = round % 3 == 0 ? 30 : 100000;  // small ranges: duplicates and cocircular points
+    std::uniform_int_distribution<int> u(-range, range);
+    std::vector<BPoint> pts;
+    for (int i = 0; i < n; ++i) pts.emplace_back(u(rng), u(rng));
+    const Outcome o = Compare(pts);
+    ASSERT_EQ(o.error, "") << "round " << round;
+    checked += o.boostChecked;
+  }
+  EXPECT_GT(checked, 10000);
+}
+
+TEST(BoostOracle, IntegerLatticeIsCocircularEverywhere) {
+  std::vector<BPoint> pts;
+  for (int i = 0; i < 40; ++i)
+    for (int j = 0; j < 30; ++j) pts.emplace_back(7 * i, 7 * j);
+  const Outcome o = Compare(pts);
+  EXPECT_EQ(o.error, "");
+  EXPECT_GT(o.boostChecked, 1000);
+}
+
+TEST(BoostOracle, ClusteredIntegerPoints) {
+  std::mt19937 rng(5);
+  std::normal_distribution<double> spread(0.0, 40.0);
+  std::uniform_int_distribution<int> centre(-1000000, 1000000);
+  std::vector<BPoint> pts;
+  std::vector<BPoint> centres;
+  for (int c = 0; c < 6; ++c) centres.emplace_back(centre(rng), centre(rng));
+  for (int i = 0; i < 9000; ++i) {
+    const BPoint& c = centres[i % 6];
+    pts.emplace_back(c.x() + int(std::lround(spread(rng))), c.y() + int(std::lround(spread(rng))));
+  }
+  const Outcome o = Compare(pts);
+  EXPECT_EQ(o.error, "");
+  EXPECT_TRUE(vd::Vd().usedQuadtree);
+  EXPECT_GT(o.oursChecked, 5000);
+}
+
+TEST(BoostOracle, CollinearIntegerPoints) {
+  std::vector<BPoint> pts;
+  for (int i = 0; i < 500; ++i) pts.emplace_back(3 * ((i * 37) % 500), 5 * ((i * 37) % 500) - 11);
+  pts.emplace_back(0, 1);  // one point off the line gives vertices between real points
+  const Outcome o = Compare(pts);
+  EXPECT_EQ(o.error, "");
+}
+
+}  // namespace
+}  // namespace zt

@@ -1,0 +1,247 @@
+// Node constructions against brute force: three sites tangent to a known
+// circle (points on it, segments touching it), an edge of two of them cut
+// around the circle's centre, and the third as the new site. The computed
+// node must be the centre, with the radius as clearance, by true distances.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <random>
+
+#include "voronoi/detail/node_check.hpp"
+#include "voronoi/detail/node_constructions.hpp"
+
+namespace zt::vd::geo {
+namespace {
+
+// Oracle distance to a closed segment, written apart from the product's.
+double seg_dist(Point2d q, Point2d a, Point2d b) {
+  const double dx = b.x - a.x, dy = b.y - a.y;
+  double t = ((q.x - a.x) * dx + (q.y - a.y) * dy) / (dx * dx + dy * dy);
+  t = t < 0 ? 0 : (t > 1 ? 1 : t);
+  return std::hypot(q.x - a.x - t * dx, q.y - a.y - t * dy);
+}
+double site_dist(const SiteRef& s, Point2d q) {
+  return s.kind == kKindPnt ? std::hypot(q.x - s.pnt.p.x, q.y - s.pnt.p.y) : seg_dist(q, s.seg.p1, s.seg.p2);
+}
+// A segment site claims only the points whose foot lies on it.
+double claim_dist(const SiteRef& s, Point2d q) {
+  if (s.kind == kKindPnt) return site_dist(s, q);
+  const Point2d a = s.seg.p1, b = s.seg.p2;
+  const double dx = b.x - a.x, dy = b.y - a.y;
+  const double t = ((q.x - a.x) * dx + (q.y - a.y) * dy) / (dx * dx + dy * dy);
+  return t < -1e-12 || t > 1 + 1e-12 ? HUGE_VAL : site_dist(s, q);
+}
+
+enum class Shape { PointOn, Tangent, TangentFromPoint, CornerPair };
+
+struct Builder {
+  std::mt19937_64 rng;
+  Point2d x;
+  double r = 0;
+  std::int32_t next_point = 2, next_seg = 0;
+
+  double uni(double a, double b) { return std::uniform_real_distribution<double>(a, b)(rng); }
+  Point2d on_circle(double th) const { return {x.x + r * std::cos(th), x.y + r * std::sin(th)}; }
+  Point2d tangent(double th) const { return {-std::sin(th), std::cos(th)}; }
+
+  PointSite point(double th) { return {next_point++, on_circle(th)}; }
+  SegSite segment(PointSite a, PointSite b) {
+    if (rng() & 1) std::swap(a, b);
+    return SegSite::make(next_seg++, a.index, a.p, b.index, b.p);
+  }
+  // Touches the circle at th inside its extent.
+  SegSite tangent_seg(double th) {
+    const Point2d t = on_circle(th), d = tangent(th);
+    const double l1 = uni(0.1, 0.5) * r + 0.01, l2 = uni(0.1, 0.5) * r + 0.01;
+    return segment({next_point++, sub(t, mul(d, l1))}, {next_point++, add(t, mul(d, l2))});
+  }
+  // Touches the circle at p, which is one of its end points.
+  SegSite tangent_from(const PointSite& p, double th) {
+    const double l = (uni(0.3, 1.0) * r + 0.01) * ((rng() & 1) ? 1.0 : -1.0);
+    return segment(p, {next_point++, add(p.p, mul(tangent(th), l))});
+  }
+};
+
+// A point of the bisector of a and b near the centre, about h away from it.
+bool bisector_point(const SiteRef& a, const SiteRef& b, Point2d x, double h, Point2d& out) {
+  const auto g = [&](Point2d q) { return site_dist(a, q) - site_dist(b, q); };
+  // Between a segment and its own end point the bisector is the normal there.
+  for (const auto& [s, p] : {std::pair{&a, &b}, std::pair{&b, &a}}) {
+    if (s->kind == kKindSeg && p->kind == kKindPnt && s->seg.has_end(p->pnt.index)) {
+      const Point2d u = sub(x, p->pnt.p);
+      out = add(x, mul(u, h / std::sqrt(norm2(u))));
+      return true;
+    }
+  }
+  const double eps = 1e-7;
+  Point2d grad{(g({x.x + eps, x.y}) - g({x.x - eps, x.y})) / (2 * eps),
+               (g({x.x, x.y + eps}) - g({x.x, x.y - eps})) / (2 * eps)};
+  grad = mul(grad, 1.0 / std::sqrt(norm2(grad)));
+  const Point2d y0 = add(x, mul(Point2d{-grad.y, grad.x}, h));
+  double lo = -std::fabs(h), hi = std::fabs(h);
+  double glo = g(add(y0, mul(grad, lo)));
+  if ((glo > 0) == (g(add(y0, mul(grad, hi))) > 0)) return false;
+  for (int i = 0; i < 200; ++i) {
+    const double mid = 0.5 * (lo + hi);
+    const double gm = g(add(y0, mul(grad, mid)));
+    if ((gm > 0) == (glo > 0)) {
+      lo = mid;
+      glo = gm;
+    } else {
+      hi = mid;
+    }
+  }
+  out = add(y0, mul(grad, 0.5 * (lo + hi)));
+  return true;
+}
+
+struct Case {
+  const char* name;
+  int kind;  // which configuration below
+};
+
+// Builds sites a, b (the edge) and fresh (the new site) for configuration k.
+void make_sites(Builder& B, int k, SiteRef& a, SiteRef& b, SiteRef& fresh) {
+  const double base = B.uni(0, 2 * M_PI);
+  const double th[3] = {base, base + B.uni(0.8, 2.0), base + B.uni(0.8, 2.0) + 2.2};
+  switch (k) {
+    case 0: {  // two points, new segment touching elsewhere
+      a = SiteRef::point(B.point(th[0]));
+      b = SiteRef::point(B.point(th[1]));
+      fresh = SiteRef::segment(B.tangent_seg(th[2]));
+      break;
+    }
+    case 1: {  // two points, new segment starting at one of them
+      const PointSite p = B.point(th[0]);
+      a = SiteRef::point(p);
+      b = SiteRef::point(B.point(th[1]));
+      fresh = SiteRef::segment(B.tangent_from(p, th[0]));
+      break;
+    }
+    case 2: {  // point and segment, new segment elsewhere
+      a = SiteRef::point(B.point(th[0]));
+      b = SiteRef::segment(B.tangent_seg(th[1]));
+      fresh = SiteRef::segment(B.tangent_seg(th[2]));
+      break;
+    }
+    case 3: {  // point and segment, new segment starting at the point
+      const PointSite p = B.point(th[0]);
+      a = SiteRef::point(p);
+      b = SiteRef::segment(B.tangent_seg(th[1]));
+      fresh = SiteRef::segment(B.tangent_from(p, th[0]));
+      break;
+    }
+    case 4: {  // segment and its own end point, new segment elsewhere
+      const PointSite p = B.point(th[0]);
+      a = SiteRef::point(p);
+      b = SiteRef::segment(B.tangent_from(p, th[0]));
+      fresh = SiteRef::segment(B.tangent_seg(th[1]));
+      break;
+    }
+    case 5: {  // three segments
+      a = SiteRef::segment(B.tangent_seg(th[0]));
+      b = SiteRef::segment(B.tangent_seg(th[1]));
+      fresh = SiteRef::segment(B.tangent_seg(th[2]));
+      break;
+    }
+    case 6: {  // a corner of two segments, new segment elsewhere
+      const double t1 = th[0], t2 = th[0] + B.uni(0.6, 2.4);
+      const double mid = 0.5 * (t1 + t2), half = 0.5 * (t2 - t1);
+      const PointSite v{B.next_point++, add(B.x, mul(Point2d{std::cos(mid), std::sin(mid)}, B.r / std::cos(half)))};
+      const auto leg = [&](double t) {
+        const Point2d tp = B.on_circle(t);
+        const Point2d far = add(v.p, mul(sub(tp, v.p), 1.0 + B.uni(0.2, 1.0)));
+        return B.segment(v, {B.next_point++, far});
+      };
+      a = SiteRef::segment(leg(t1));
+      b = SiteRef::segment(leg(t2));
+      fresh = SiteRef::segment(B.tangent_seg(t2 + B.uni(1.0, 2 * M_PI - (t2 - t1) - 1.0)));
+      break;
+    }
+    case 7: {  // new point against a point and a segment
+      a = SiteRef::point(B.point(th[0]));
+      b = SiteRef::segment(B.tangent_seg(th[1]));
+      fresh = SiteRef::point(B.point(th[2]));
+      break;
+    }
+    default: {  // new point against two segments
+      a = SiteRef::segment(B.tangent_seg(th[0]));
+      b = SiteRef::segment(B.tangent_seg(th[1]));
+      fresh = SiteRef::point(B.point(th[2]));
+      break;
+    }
+  }
+}
+
+class NodeRandom : public ::testing::TestWithParam<Case> {};
+
+TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
+  const int kind = GetParam().kind;
+  Builder B{std::mt19937_64(1234 + kind), {}, 0};
+  int used = 0;
+  for (int trial = 0; trial < 3000; ++trial) {
+    B.x = {B.uni(0.25, 0.75), B.uni(0.25, 0.75)};
+    // Radii over five decades, so tiny configurations pass through the
+    // coefficient scaling of the solver.
+    B.r = 0.2 * std::pow(10.0, -B.uni(0, 5));
+    SiteRef a, b, fresh;
+    make_sites(B, kind, a, b, fresh);
+    const double h1 = B.r * B.uni(1e-3, 0.25), h2 = -B.r * B.uni(1e-3, 0.25);
+    Point2d y1, y2;
+    if (!bisector_point(a, b, B.x, h1, y1) || !bisector_point(a, b, B.x, h2, y2)) continue;
+    // A segment's region is the strip over it: an edge of it ends inside.
+    bool inside = true;
+    for (Point2d y : {y1, y2}) inside = inside && std::isfinite(claim_dist(a, y) + claim_dist(b, y));
+    if (!inside) continue;
+    const double f1 = claim_dist(fresh, y1) - site_dist(a, y1);
+    const double f2 = claim_dist(fresh, y2) - site_dist(a, y2);
+    if (!((f1 > 0 && f2 < 0) || (f1 < 0 && f2 > 0))) continue;
+    EdgeFrame e;
+    const bool swap_ends = B.rng() & 1;
+    e.n1 = {swap_ends ? y2 : y1, 0, false};
+    e.n2 = {swap_ends ? y1 : y2, 0, false};
+    e.n1.r = site_dist(a, e.n1.p);
+    e.n2.r = site_dist(a, e.n2.p);
+    const double fn1 = swap_ends ? f2 : f1;
+    (fn1 < 0 ? e.n1 : e.n2).deleted = true;
+    // Left and right as seen from n1 towards n2.
+    const Point2d ta = a.kind == kKindPnt ? a.pnt.p : mul(add(a.seg.p1, a.seg.p2), 0.5);
+    const bool a_left = cross(sub(e.n2.p, e.n1.p), sub(ta, e.n1.p)) > 0;
+    e.left = a_left ? a : b;
+    e.right = a_left ? b : a;
+
+    NodeMemory memory;
+    SuspectPair suspect;
+    NodeResult out;
+    const bool ok = compute_node(e, fresh, memory, suspect, out);
+    ++used;
+    const double tol = 1e-9;
+    ASSERT_TRUE(ok) << "trial " << trial;
+    ASSERT_FALSE(out.copied) << "trial " << trial << " r " << B.r;
+    EXPECT_EQ(out.on_point, -1);
+    ASSERT_NEAR(out.n.x, B.x.x, tol) << "trial " << trial << " r " << B.r;
+    ASSERT_NEAR(out.n.y, B.x.y, tol) << "trial " << trial << " r " << B.r;
+    ASSERT_NEAR(out.r, B.r, tol) << "trial " << trial;
+    const double da = site_dist(a, out.n), db = site_dist(b, out.n), df = site_dist(fresh, out.n);
+    ASSERT_NEAR(da, db, tol);
+    ASSERT_NEAR(da, df, tol);
+    // The bisection that stands in for a failed closed form finds it too.
+    NodeResult searched;
+    ASSERT_TRUE(bisect_on_edge(e, fresh, searched)) << "trial " << trial;
+    ASSERT_NEAR(searched.n.x, B.x.x, tol) << "trial " << trial;
+    ASSERT_NEAR(searched.n.y, B.x.y, tol) << "trial " << trial;
+    ASSERT_NEAR(searched.r, B.r, tol) << "trial " << trial;
+  }
+  EXPECT_GT(used, 1500);
+}
+
+INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom,
+                         ::testing::Values(Case{"PointsNewSegment", 0}, Case{"PointsNewSegmentFromPoint", 1},
+                                           Case{"PointSegmentNewSegment", 2}, Case{"PointSegmentNewFromPoint", 3},
+                                           Case{"SegmentOwnEndNewSegment", 4}, Case{"ThreeSegments", 5},
+                                           Case{"CornerNewSegment", 6}, Case{"PointSegmentNewPoint", 7},
+                                           Case{"SegmentsNewPoint", 8}),
+                         [](const auto& info) { return std::string(info.param.name); });
+
+}  // namespace
+}  // namespace zt::vd::geo

@@ -1,0 +1,226 @@
+// ComputeVD (see compute_vd.hpp): start of a call, restarts, preparation of
+// the input, and the phases, each resumable at its cursor.
+#include "voronoi/detail/compute_vd.hpp"
+
+#include <cmath>
+
+#include "voronoi/detail/bisector_split.hpp"
+#include "voronoi/detail/engine_state.hpp"
+#include "voronoi/detail/fatal.hpp"
+#include "voronoi/detail/initial_diagram.hpp"
+#include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/point_insertion.hpp"
+#include "voronoi/detail/preprocess.hpp"
+#include "voronoi/detail/segment_phase.hpp"
+
+namespace zt::vd {
+
+namespace {
+
+void EmptyInsertionLists() {
+  Engine& g = Vd();
+  g.insertionOrder.count = 0;
+  g.orderRemaining = 0;
+  g.markedSites.count = 0;
+  g.checkedNodes.count = 0;
+}
+
+void BuildOrder(std::int32_t first, std::int32_t end) {
+  Engine& g = Vd();
+  g.insertionOrder.count = 0;
+  g.insertionOrder.Reserve(std::max<std::int64_t>(end - first, 1));
+  for (std::int32_t i = first; i < end; ++i) g.insertionOrder.data[g.insertionOrder.count++] = i;
+  g.orderRemaining = g.insertionOrder.count;
+}
+
+// Draws the next entry: a uniformly drawn position (the generator gives 32
+// bits a draw, so every position of any order can be drawn), replaced by
+// the last remaining entry.
+std::int32_t DrawNext() {
+  Engine& g = Vd();
+  const std::uint32_t r = static_cast<std::uint32_t>(g.random());
+  const std::int32_t at = static_cast<std::int32_t>(r % static_cast<std::uint32_t>(g.orderRemaining));
+  const std::int32_t v = g.insertionOrder[at];
+  g.insertionOrder[at] = g.insertionOrder[--g.orderRemaining];
+  return v;
+}
+
+void SquareRootRadii() {
+  Engine& g = Vd();
+  if (!g.nodeRadiiSquared) return;
+  for (std::int32_t n = 0; n < g.nodes.count; ++n) g.nodes[n].r = std::sqrt(std::fmax(g.nodes[n].r, 0.0));
+  g.nodeRadiiSquared = false;
+}
+
+// Returns false when the call must return (restart pending).
+bool PointPhase() {
+  Engine& g = Vd();
+  if (g.pointsDone) return true;
+  const std::int32_t end = g.points.count - 2;
+  if (g.pointsFirstPass) {
+    g.pointsFirstPass = false;
+    BuildInitialDiagram();
+    BuildOrder(3, end);
+  }
+  while (g.orderRemaining > 0) {
+    const std::int32_t p = DrawNext();
+    InsertPoint(p);
+    if (g.restartPending) return false;
+    if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, p);
+  }
+  ReleaseNearestSearch();
+  ReleaseCrossReference();
+  if (g.segments.count > 0 || g.arcs.count > 0) {
+    SquareRootRadii();
+    SplitPointBisectors();
+  }
+  g.pointsDone = true;
+  return true;
+}
+
+bool SegmentPhase() {
+  Engine& g = Vd();
+  if (g.segmentsDone) return true;
+  if (g.segmentsFirstPass) {
+    g.segmentsFirstPass = false;
+    BuildOrder(0, g.segments.count);
+  }
+  while (g.orderRemaining > 0) {
+    const std::int32_t s = DrawNext();
+    InsertSegment(s);
+    if (g.restartPending) return false;
+    // Segments reach the test hook as -1 - index.
+    if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, -1 - s);
+  }
+  g.segmentsDone = true;
+  return true;
+}
+
+}  // namespace
+
+void ClearDiagram() {
+  Engine& g = Vd();
+  g.nodes.count = 0;
+  g.edges.count = 0;
+  g.freeNodes.count = 0;
+  g.freeEdges.count = 0;
+  g.degree2.count = 0;
+  g.nodeRadiiSquared = true;
+  g.bisectorsSplit = false;
+  g.upToDate = false;
+  EmptyInsertionLists();
+  for (std::int32_t i = 0; i < g.points.count; ++i) {
+    PointRecord& p = g.points[i];
+    p.vd = kNone;
+    p.node = kNone;
+    p.marked = 0;
+    p.hasNode = 0;
+  }
+  for (std::int32_t i = 0; i < g.segments.count; ++i) {
+    g.segments[i].vd = kNone;
+    g.segments[i].flag = 0;
+  }
+  for (std::int32_t i = 0; i < g.arcs.count; ++i) g.arcs[i].vd = kNone;
+}
+
+void ComputeVD(const ComputeArgs& args, bool& finished) {
+  Engine& g = Vd();
+  finished = false;
+  // 1. Nothing stored.
+  if (g.points.count == 0) {
+    g.computing = false;
+    finished = true;
+    return;
+  }
+  bool restarting = false;
+  if (g.restartPending) {
+    // 2. Restart: count it, empty the diagram, clean whatever `clean` says.
+    if (++g.restartCount > kMaxRestarts) VdFatal("ComputeVD() - aborting computation -- too many restarts!");
+    ClearDiagram();
+    restarting = true;
+  } else if (!args.newInput) {
+    // 3. Resume a computation under way.
+    if (!g.computing) {
+      finished = true;
+      return;
+    }
+  } else {
+    g.duplicatePoints = g.removedSegments = g.removedArcs = 0;
+    g.restartCount = 0;
+    g.frameSet = false;
+    g.random.seed(0);
+    g.recoveryMode = false;
+    g.usedQuadtree = false;
+    g.inputSorted = false;
+    ClearDiagram();
+  }
+  const bool resume = !restarting && !args.newInput;
+  if (!resume) {
+    // 4.
+    g.computing = true;
+    g.restartPending = false;
+    g.errorFlag = false;
+    g.dataModified = false;
+    g.suspect.set = false;
+    g.pointsFirstPass = g.segmentsFirstPass = g.arcsFirstPass = true;
+    g.pointsDone = false;
+    g.segmentsDone = g.segments.count == 0 || args.pointsOnly;
+    g.arcsDone = g.arcs.count == 0 || args.pointsOnly;
+    // 5. Frame: bounding box and scaling of a new computation.
+    if (!g.frameSet) {
+      ComputeBoundingBox();
+      if (g.scalingOption) ApplyScaling();
+    }
+    // 6. Only points wanted: forget the rest.
+    if (args.pointsOnly) {
+      g.segments.count = 0;
+      g.arcs.count = 0;
+      g.isolatedPoints = true;
+    }
+    // 7. Cleaning.
+    const bool firstCall = !g.dummiesAdded;
+    if (firstCall) AddDummySlots();
+    if (restarting || args.clean) CleanInput(args.clean);
+    // 8. Segment line data.
+    if (g.segments.count > 0) ComputeSegmentLineData();
+    // 9. Corners.
+    if (!g.frameSet) PlaceCornerDummies(args.boundFactor);
+    // 10-11.
+    if (g.restartPending) return;
+    BuildNearestSearch(g.points.count, g.minX, g.minY, g.maxX, g.maxY);
+  }
+
+  // 12-13. Phases.
+  if (!PointPhase()) return;
+  if (!SegmentPhase()) return;
+  // 14.
+  if (!g.arcsDone && g.arcs.count > 0)
+    VdFatal("Compute() - insertion of circular arcs into VD not yet supported!");
+  g.arcsDone = true;
+  // 15.
+  if (g.segments.count > 0) SplitAtSegmentEndPoints();
+  // 16.
+  if (g.segments.count == 0 && g.arcs.count == 0) {
+    g.isolatedPoints = true;
+  } else {
+    g.isolatedPoints = false;
+    for (std::int32_t i = 2; i < g.points.count - 2; ++i) {
+      if (!g.points[i].deleted && !g.points[i].hasNode) {
+        g.isolatedPoints = true;
+        break;
+      }
+    }
+  }
+  // 17. Arc links of approximated arcs.
+  if ((args.pointsOnly || !args.keepArcLinks) && g.arcsApproximated > 0) {
+    for (std::int32_t i = 0; i < g.points.count; ++i) g.points[i].arc = kNone;
+    for (std::int32_t i = 0; i < g.segments.count; ++i) g.segments[i].arc = kNone;
+    g.arcsApproximated = 0;
+  }
+  // 18-19.
+  g.upToDate = true;
+  g.computing = false;
+  finished = true;
+}
+
+}  // namespace zt::vd

@@ -1,0 +1,35 @@
+// Nearest-point search over the points inserted so far: a uniform grid of
+// buckets, replaced by a point quadtree when a sample of the input shows it
+// too clustered for a grid.
+//
+// Promise: FindAndInsert returns the inserted point nearest to the query
+// (exact squared distance in double precision, ties to the first found); a
+// query within kCoincidentDist2 of an inserted point is not inserted.
+#pragma once
+
+#include <cstdint>
+
+namespace zt::vd {
+
+// Squared distance at or below which two points are the same point.
+inline constexpr double kCoincidentDist2 = 1e-22;
+
+struct SearchStats {
+  bool quadtree = false;  // the structure switched to the point quadtree
+  std::int32_t gridColumns = 0;
+  std::int32_t gridRows = 0;
+};
+
+// Builds the structure over the bounding box of the engine's points for
+// `totalPoints` points (dummies included). Replaces any previous one.
+void BuildNearestSearch(std::int32_t totalPoints, double minX, double minY, double maxX,
+                        double maxY);
+// Enters point p (an index of the engine's point array) without a query.
+void InsertNearest(std::int32_t p);
+// The nearest inserted point to p and its squared distance; p is entered
+// unless it coincides with the result. -1 when nothing is inserted yet.
+std::int32_t FindAndInsertNearest(std::int32_t p, double& dist2);
+void ReleaseNearestSearch();
+SearchStats NearestSearchStats();
+
+}  // namespace zt::vd

@@ -1,0 +1,88 @@
+// Root selection chains C1-C4 (see root_selection.hpp).
+#include "voronoi/detail/root_selection.hpp"
+
+#include <algorithm>
+#include <cmath>
+
+namespace zt::vd::geo {
+namespace {
+
+bool is_own_end(const SiteRef& seg, const SiteRef& pnt) {
+  return seg.kind == kKindSeg && pnt.kind == kKindPnt && seg.seg.has_end(pnt.pnt.index);
+}
+
+// Compares two criterion values; returns -1 when the first is better, 1 when
+// the second is, 0 on an exact tie.
+int compare(double a, double b) { return a < b ? -1 : (b < a ? 1 : 0); }
+
+}  // namespace
+
+double edge_position(const EdgeFrame& e, const EdgeEnd& x, Point2d c) {
+  const SiteRef& l = e.left;
+  const SiteRef& r = e.right;
+  if (l.kind == kKindPnt && r.kind == kKindPnt) {
+    const bool lower = l.pnt.index <= r.pnt.index;
+    const Point2d p = lower ? l.pnt.p : r.pnt.p;
+    const Point2d q = lower ? r.pnt.p : l.pnt.p;
+    const double len = distance(p, q);
+    if (len == 0.0) return 0.0;  // coincident sites: no direction to measure
+    return cross(sub(q, p), sub(x.p, c)) / len;
+  }
+  if (is_own_end(l, r) || is_own_end(r, l)) {
+    const SiteRef& s = l.kind == kKindSeg ? l : r;
+    const SiteRef& p = l.kind == kKindSeg ? r : l;
+    // A node of clearance 0 sits on the end point itself.
+    const Point2d xp = x.r == 0.0 ? p.pnt.p : x.p;
+    const Point2d dir{s.seg.b, -s.seg.a};
+    return cross(dir, sub(xp, c));
+  }
+  const SegSite* s = nullptr;
+  if (l.kind == kKindSeg && r.kind == kKindSeg) {
+    s = l.seg.index <= r.seg.index ? &l.seg : &r.seg;
+  } else if (l.kind == kKindSeg) {
+    s = &l.seg;
+  } else if (r.kind == kKindSeg) {
+    s = &r.seg;
+  }
+  if (!s) return 0.0;  // arcs and outer edges: no measure, every point counts as inside
+  return s->lambda(x.p) - s->lambda(c);
+}
+
+double extent_on_edge(const EdgeFrame& e, Point2d c) {
+  const double p1 = edge_position(e, e.n1, c);
+  const double p2 = edge_position(e, e.n2, c);
+  if (p1 == 0.0 || p2 == 0.0 || (p1 < 0.0) != (p2 < 0.0)) return 0.0;
+  return std::min(std::fabs(p1), std::fabs(p2));
+}
+
+double left_clearance(const EdgeFrame& e, Point2d c) {
+  switch (e.left.kind) {
+    case kKindPnt:
+      return distance(c, e.left.pnt.p);
+    case kKindSeg:
+      return std::fabs(e.left.seg.D(c));
+    default:
+      return std::min(e.n1.r, e.n2.r);
+  }
+}
+
+double radius_band(const EdgeFrame& e, Point2d c) {
+  const double r1 = std::min(e.n1.r, e.n2.r);
+  const double r2 = std::max(e.n1.r, e.n2.r);
+  const double d = left_clearance(e, c);
+  if (d < r1) return r1 - d;
+  if (d <= r2) return 0.0;
+  return d - r2;
+}
+
+bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain& chain) {
+  if (int v = compare(extent_on_edge(e, n1), extent_on_edge(e, n2))) return v < 0;
+  for (int i = 0; i < chain.count; ++i) {
+    if (int v = compare(chain.c2[i]->beyond(n1), chain.c2[i]->beyond(n2))) return v < 0;
+  }
+  if (int v = compare(radius_band(e, n1), radius_band(e, n2))) return v < 0;
+  const Point2d g = e.gone().p;
+  return !(norm2(sub(n2, g)) < norm2(sub(n1, g)));
+}
+
+}  // namespace zt::vd::geo

@@ -1,0 +1,59 @@
+// Raw storage of the engine's record arrays.
+//
+// ReallocateArray never returns on failure: it reports and ends the process
+// (see fatal.hpp). RecordArray<T> is an index-addressed array of plain
+// records with an explicit count, capacity and growth step; growing it may
+// move the records, so the engine keeps indices, never pointers, across any
+// operation that can append.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <type_traits>
+
+namespace zt::vd {
+
+// ptr null: count*size zeroed bytes; else resized to count*size bytes (new
+// bytes not cleared). Sizes are computed in 64 bits.
+void* ReallocateArray(void* ptr, std::int64_t count, std::int64_t size);
+void FreeArray(void*& ptr);
+
+template <typename T>
+struct RecordArray {
+  static_assert(std::is_trivially_copyable_v<T>);
+
+  T* data = nullptr;
+  std::int32_t count = 0;
+  std::int32_t capacity = 0;
+
+  T& operator[](std::int32_t i) { return data[i]; }
+  const T& operator[](std::int32_t i) const { return data[i]; }
+
+  // 0 <= i < count and count <= capacity.
+  bool Valid(std::int32_t i) const { return i >= 0 && i < count && count <= capacity; }
+
+  void Reserve(std::int64_t n) {
+    if (n <= capacity) return;
+    if (n > INT32_MAX) n = INT32_MAX;  // ReallocateArray reports what cannot be had
+    data = static_cast<T*>(ReallocateArray(data, n, sizeof(T)));
+    capacity = static_cast<std::int32_t>(n);
+  }
+  // Makes room for one more record, growing by `step` records.
+  void EnsureOneMore(std::int32_t step) {
+    if (count >= capacity) Reserve(std::int64_t{capacity} + step);
+  }
+  std::int32_t Append(const T& value, std::int32_t step) {
+    EnsureOneMore(step);
+    data[count] = value;
+    return count++;
+  }
+  void Free() {
+    void* p = data;
+    FreeArray(p);
+    data = nullptr;
+    count = 0;
+    capacity = 0;
+  }
+};
+
+}  // namespace zt::vd
