@@ -89,15 +89,5 @@ TEST(Facade, AddingSitesAfterAComputationMakesItStaleAndTheNextOneSound) {
   EXPECT_EQ(a, b);
 }
 
-TEST(Facade, SegmentPhaseIsNotAvailableYet) {
-  EXPECT_EXIT(
-      {
-        Store({{0, 0}, {1, 0}, {0, 1}});
-        API_AddSegment(2, 3, 0);
-        VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true);
-      },
-      testing::ExitedWithCode(2), "error in Compute\\(\\) - insertion of line segments into VD not yet supported!");
-}
-
 }  // namespace
 }  // namespace zt
