@@ -3,11 +3,11 @@
 
 #include <array>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <string>
 #include <vector>
 
+#include "driver/detail/result_guard.hpp"
 #include "driver/level_tables.hpp"
 #include "driver/logical_units.hpp"
 #include "driver/message_text.hpp"
@@ -49,21 +49,6 @@ class Name {
  private:
   std::array<char, kNameWidth> buffer_;
 };
-
-// The expanded path of a result file being written, while it is incomplete.
-// Any end of the process in that time (a record fault, a fatal report of the
-// engines) removes it, so the suite never finds a half-written result.
-std::string g_pendingResult;
-
-void discard_pending_result() {
-  if (!g_pendingResult.empty()) std::remove(g_pendingResult.c_str());
-}
-
-void guard_result(const std::string& path) {
-  static const bool registered = std::atexit(discard_pending_result) == 0;
-  (void)registered;
-  g_pendingResult = path;
-}
 
 // Shows a message on the console and in the message file; the run stops.
 RunEnd stop_with(const char* message) {
@@ -150,10 +135,10 @@ RunEnd restzones_main() {
   const std::int32_t resultUnit = free_unit();
   const Name resultName(kResultFile);
   open_unformatted(resultUnit, resultName.data(), resultName.length(), kOpenCreate, ierr);
-  guard_result(unit_path(resultUnit));
+  detail::guard_result(unit_path(resultUnit));
   wf_fin_czone(g_points, resultUnit, ierr, write_contour);
   close_unit(resultUnit);
-  g_pendingResult.clear();
+  detail::release_result();
 
   if (ierr != 0) {
     report_message(kMsgFinFailed, static_cast<std::int32_t>(std::strlen(kMsgFinFailed)));
