@@ -7,6 +7,7 @@
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/point_insertion.hpp"
 #include "voronoi/detail/offset_state.hpp"
 
 namespace zt {
@@ -126,6 +127,7 @@ void VD_Terminate() {
   g.stack.Free();
   g.offsetCurves.Free();
   g.offsetElements.Free();
+  ReleaseInsertionScratch();
   FreeOffsetState();
   g.initialised = false;
 }
