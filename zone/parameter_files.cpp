@@ -36,7 +36,10 @@ std::int32_t read_merge_radius(const char* path, float& radius) {
     const int got = std::fscanf(f, "%f %f", &first[p], &second[p]);
     read[p] = got >= 1;
   }
+  // A name that opens but cannot be read (a directory) is unreadable.
+  const bool unreadable = std::ferror(f) != 0;
   std::fclose(f);
+  if (unreadable) return -1;
   if (read[3] && usable(first[3])) radius = first[3];
   if (read[2] && usable(first[2])) {
     const float s = std::fmin(first[2], kMaxGridStep);

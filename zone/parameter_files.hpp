@@ -26,7 +26,7 @@ void read_offset_distance(const char* path, double& offsetDistance);
 
 // Reads the four pairs and updates `radius`: the fourth pair's first number
 // replaces it; then, when s was read, radius = max(radius, 2 x min(s, 0.5)).
-// -1 when the file cannot be opened (radius unchanged), else 0.
+// -1 when the file cannot be opened or read (radius unchanged), else 0.
 std::int32_t read_merge_radius(const char* path, float& radius);
 
 }  // namespace zt
