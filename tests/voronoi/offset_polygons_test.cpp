@@ -4,6 +4,8 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <fstream>
+#include <iterator>
 #include <numbers>
 #include <random>
 
@@ -182,6 +184,39 @@ TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
       ASSERT_EQ(CheckSide(cs, curves, side == 1), "") << trial;
     }
   }
+}
+
+}  // namespace
+}  // namespace zt
+
+namespace zt {
+namespace {
+
+// A request that asks for a file writes the whole store there.
+TEST(PolygonOffsets, RequestedFileHoldsTheStore) {
+  VD_Initialize();
+  VD_Reset();
+  const std::int32_t a = API_AddPoint(0, 0, -1), b = API_AddPoint(1, 0, -1), c = API_AddPoint(1, 1, -1),
+                     d = API_AddPoint(0, 1, -1);
+  API_AddSegment(a, b, 0), API_AddSegment(b, c, 0), API_AddSegment(c, d, 0), API_AddSegment(d, a, 0);
+  ASSERT_TRUE(VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true));
+  const std::string text = testing::TempDir() + "zt_offsets.txt";
+  ASSERT_TRUE(API_ComputeOff(false, text.c_str(), true, false, 0.1, 0.0, false, true, false));
+  std::ifstream in(text);
+  std::string line;
+  std::getline(in, line);
+  EXPECT_EQ(line, "curve 0.10000000000000001");
+  int elements = 0;
+  while (std::getline(in, line)) ++elements;
+  EXPECT_EQ(elements, 4);
+  const std::string dxf = testing::TempDir() + "zt_offsets.dxf";
+  ASSERT_TRUE(API_ComputeOff(false, dxf.c_str(), true, true, 0.1, 0.0, false, false, true));
+  std::ifstream din(dxf);
+  const std::string all((std::istreambuf_iterator<char>(din)), std::istreambuf_iterator<char>());
+  EXPECT_NE(all.find("ARC"), std::string::npos);
+  EXPECT_NE(all.find("EOF"), std::string::npos);
+  // A file that cannot be written fails the request.
+  EXPECT_FALSE(API_ComputeOff(false, "/nonexistent/dir/x.txt", true, false, 0.1, 0.0, false, true, false));
 }
 
 }  // namespace
