@@ -186,6 +186,26 @@ TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
   }
 }
 
+// Loose points inside a pocket: their circles (both sides) and the curves
+// where circles meet the walls' offsets, against brute force.
+TEST(PolygonOffsets, PocketWithLoosePointsAgainstBruteForce) {
+  std::mt19937 rng(5);
+  for (int trial = 0; trial < 30; ++trial) {
+    const std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 12 + trial, false)};
+    auto in = StoreContours(cs);
+    std::uniform_real_distribution<double> u(-40, 40);
+    for (int k = 0; k < 1 + trial % 6; ++k) {
+      const vdtest::Site2 p{u(rng), u(rng)};
+      API_AddPoint(p.x, p.y, 100 + k);
+      in.points.push_back(p);
+    }
+    ASSERT_TRUE(Compute()) << trial;
+    const double t = 2.0 + trial % 7 * 1.5;
+    ASSERT_TRUE(VD_ComputeOffsets(1 + trial % 3, t, 0.0)) << trial;
+    ASSERT_EQ(vdtest::CheckAtDistance(in, vdtest::ReadStore(), t, 1e-9 * Extent(in)), "") << "trial " << trial;
+  }
+}
+
 }  // namespace
 }  // namespace zt
 

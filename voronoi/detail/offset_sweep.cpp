@@ -66,11 +66,11 @@ bool ComputeOffsets(bool, const char* outputFile, bool write, bool dxfFormat, do
     o.distance = t * g.scale;
     o.step = d * g.scale;
     o.failed = false;
+    o.written = false;
     if (o.distance >= g.maxOffset || o.distance <= kOffsetZero) {
       o.finished = true;
     } else {
       o.finished = false;
-      o.written = false;
       const bool both = !left && !right;
       InitializeEdgeData(left, right);
       if (o.step <= kOffsetZero) o.step = g.maxOffset;
