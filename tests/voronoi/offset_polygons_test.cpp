@@ -142,6 +142,26 @@ TEST(PolygonOffsets, NeckBetweenACornerAndAWallIsNotCutThrough) {
   EXPECT_EQ(CheckSide(neck, curves, true), "");
 }
 
+// Necks at random places and depths, with distances below, near and above
+// half the neck's width.
+TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
+  std::mt19937 rng(17);
+  std::uniform_real_distribution<double> ux(-5, 10), uy(0.3, 3.6), ut(0.2, 2.2), uw(0.3, 3);
+  for (int trial = 0; trial < 60; ++trial) {
+    const double x = ux(rng), y = uy(rng), w = uw(rng), t = ut(rng);
+    const std::vector<Contour> neck{{{-10, 0}, {14, 0}, {14, 4}, {x + w, 4}, {x, y}, {x - w, 4}, {-10, 4}}};
+    const auto in = StoreContours(neck);
+    ASSERT_TRUE(Compute());
+    ASSERT_TRUE(VD_ComputeOffsets(1, t, 0.0));
+    const auto curves = vdtest::ReadStore();
+    if (t < 2.0) {
+      ASSERT_FALSE(curves.empty()) << trial;
+    }
+    ASSERT_EQ(vdtest::CheckAtDistance(in, curves, t, 1e-9 * Extent(in)), "") << "trial " << trial;
+    ASSERT_EQ(CheckSide(neck, curves, true), "") << trial;
+  }
+}
+
 // A star-shaped polygon around (cx, cy) with n vertices, counter-clockwise
 // unless `clockwise`.
 Contour Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
