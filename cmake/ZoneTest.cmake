@@ -45,6 +45,12 @@ function(zt_add_test_suite name)
   endforeach()
   target_compile_definitions(${name} PRIVATE ZT_TEST_DATA_DIR="${CMAKE_CURRENT_SOURCE_DIR}/data"
                                              ZT_BINARY_DIR="${PROJECT_BINARY_DIR}")
+  # Tests may run the built programs as subprocesses: build those first.
+  foreach(prog zonetool restzones)
+    if(TARGET ${prog})
+      add_dependencies(${name} ${prog})
+    endif()
+  endforeach()
   include(GoogleTest)
   gtest_discover_tests(${name} DISCOVERY_TIMEOUT 60 PROPERTIES TIMEOUT 600)
 endfunction()

@@ -10,6 +10,7 @@
 #include <map>
 #include <memory>
 
+#include "driver/detail/unit_cleanup.hpp"
 #include "driver/record_stream.hpp"
 
 namespace zt {
@@ -187,6 +188,12 @@ bool write_text_line(const std::int32_t& unit, const std::string& line) {
   if (u == nullptr || u->kind != Unit::Kind::kText) return false;
   return std::fputs(line.c_str(), u->text) != EOF && std::fputc('\n', u->text) != EOF &&
          std::fflush(u->text) == 0;
+}
+
+void detail::abandon_record_outputs() {
+  for (auto& [number, u] : units()) {
+    if (u->kind == Unit::Kind::kRecordOut) u->out.abandon();
+  }
 }
 
 }  // namespace zt

@@ -5,6 +5,8 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "driver/detail/unit_cleanup.hpp"
+
 namespace zt {
 
 std::int32_t record_fault_exit_status(RecordFault fault) {
@@ -43,6 +45,7 @@ std::string record_fault_message(const RecordFaultInfo& info) {
 }
 
 void record_stop(const RecordFaultInfo& info) {
+  detail::abandon_record_outputs();
   std::fflush(stdout);
   const std::string m = record_fault_message(info);
   std::fprintf(stderr, "%s\n", m.c_str());

@@ -4,7 +4,7 @@
 // by the caller: the program ends at once with one English line on standard
 // error naming the file and the record number, and an exit status that tells
 // the kind of fault. The status marker of the run is left in place, so the
-// calling suite sees the run as failed.
+// calling suite sees the run as failed, and no half-written record file stays.
 #pragma once
 
 #include <cstdint>
@@ -41,8 +41,9 @@ struct RecordFaultInfo {
 // The line printed on standard error (without its line end).
 std::string record_fault_message(const RecordFaultInfo& info);
 
-// Prints the message on standard error and ends the process with the fault's
-// exit status.
+// Removes the record files still being written on units (they would be
+// incomplete), prints the message on standard error and ends the process with
+// the fault's exit status.
 [[noreturn]] void record_stop(const RecordFaultInfo& info);
 
 }  // namespace zt

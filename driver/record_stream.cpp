@@ -5,6 +5,7 @@
 #include <cassert>
 #include <cerrno>
 #include <cstring>
+#include <sys/stat.h>
 
 namespace zt {
 
@@ -170,6 +171,9 @@ bool RecordWriter::create(const std::string& path) {
   errno = 0;
   file_ = std::fopen(path.c_str(), "wb");
   if (file_ == nullptr) return fail(0, errno);
+  struct stat st {};
+  regular_ = ::fstat(::fileno(file_), &st) == 0 && S_ISREG(st.st_mode);
+  incomplete_ = true;
   if (std::fputc(kRecordFileMarker, file_) == EOF) return fail(0, errno);
   return true;
 }
@@ -203,7 +207,15 @@ bool RecordWriter::close() {
     fault_ = {write_fault_kind(errno), path_, records_, system_text(errno)};
     return false;
   }
+  incomplete_ = false;
   return true;
+}
+
+void RecordWriter::abandon() {
+  if (file_ != nullptr) std::fclose(file_);
+  file_ = nullptr;
+  if (incomplete_ && regular_) std::remove(path_.c_str());
+  incomplete_ = false;
 }
 
 }  // namespace zt

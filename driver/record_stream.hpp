@@ -88,6 +88,10 @@ class RecordWriter {
   bool write(std::span<const std::uint8_t> data);
   // Writes the end marker and closes; false with fault() set.
   bool close();
+  // Gives up a file that was not closed successfully: it is closed and, when
+  // it is a regular file, removed, so that no incomplete record file is left
+  // that a reader could take for a result.
+  void abandon();
 
   std::int64_t records_written() const { return records_; }
   const std::string& path() const { return path_; }
@@ -99,6 +103,8 @@ class RecordWriter {
   std::FILE* file_ = nullptr;
   std::string path_;
   std::int64_t records_ = 0;
+  bool regular_ = false;     // a regular file (never remove a device)
+  bool incomplete_ = false;  // created and not closed successfully
   RecordFaultInfo fault_;
 };
 

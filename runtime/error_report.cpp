@@ -103,7 +103,9 @@ void report_fatal(const std::int32_t& number, const char* buffer, const std::int
   text += "\n in program " + program;
   show_message(text);
   std::fflush(nullptr);
-  std::exit(number != 0 ? number : -1);
+  // Only the low byte of an exit status reaches the suite: a number that is a
+  // multiple of 256 would read as success, so it ends like 0 does.
+  std::exit((number & 0xFF) != 0 ? number : -1);
 }
 
 std::int32_t report_end() {

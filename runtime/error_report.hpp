@@ -3,7 +3,8 @@
 // removes it; every user message is echoed on the console and appended to
 // "$TMP/kvlerror.prg".
 //
-// (Interface fixed in the project skeleton; implemented in error_report.cpp.)
+// Every -1 is reliable: a marker or message file whose name cannot be fully
+// expanded, opened or written is a failure, never a file elsewhere.
 #pragma once
 
 #include <cstdint>

@@ -8,7 +8,9 @@
 // -32 (buffer too small), -43 (some variable undefined, result usable),
 // -44 (invalid argument). Expansion errors are never fatal by themselves.
 //
-// (Interface fixed in the project skeleton; implemented in path_expansion.cpp.)
+// Implemented in path_expansion.cpp (buffers, diagnostics), detail/expander.cpp
+// (the expansion proper), environment.cpp (variables, configuration) and
+// temp_directory.cpp; the diagnostics' routing is in diagnostics.hpp.
 #pragma once
 
 #include <cstdint>
@@ -48,13 +50,16 @@ std::int32_t expand_to_string(const std::string& name, std::string& out);
 const char* get_variable(const char* name);
 const char* get_path_variable(const char* name);
 
-// The temporary directory (created when missing), or nullptr on an expansion error.
+// The temporary directory: KVLTMPDIR when set and not empty (taken as is),
+// else the workzone's directory under KVLTMP, created when missing; nullptr
+// when it cannot be had (after a fatal diagnostic when a variable is missing).
 const char* temp_directory();
 
 // Loads the configuration table from the environ.cfg files (first need only).
 void load_environment();
 
-// Replaceable diagnostics; each setter returns the previous handler.
+// Replaceable diagnostics; each setter returns the previous handler; a null
+// handler restores the default.
 using DiagnosticHandler = void (*)(const char* text);
 DiagnosticHandler set_fatal_handler(DiagnosticHandler h);
 DiagnosticHandler set_warning_handler(DiagnosticHandler h);

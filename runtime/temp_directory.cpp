@@ -29,13 +29,21 @@ using File = std::unique_ptr<std::FILE, FileCloser>;
 std::string g_temp_dir;     // empty until the first use
 std::string g_forced_dir;   // KVLTMPDIR's value, as last handed out
 
-// Expands a name of the number files; an undefined variable counts as failure
-// here, since the result would name a file at the filesystem root.
-std::optional<std::string> expand_strict(const char* name) {
+// A variable that names a base directory: an empty value would put the
+// workzone's files at the filesystem root, so it counts as undefined.
+bool has_value(const char* variable) {
+  const char* value = get_variable(variable);
+  return value != nullptr && *value != '\0';
+}
+
+// Expands "$<variable>/<rest>"; an undefined variable counts as failure here,
+// since the result would name a file at the filesystem root.
+std::optional<std::string> expand_strict(const char* variable, const char* rest) {
+  const std::string name = std::string("$") + variable + "/" + rest;
   std::string out;
   const std::int32_t status = expand_to_string(name, out);
-  if (status != kExpandOk) {
-    diagnose_trace(format_text("%s expansion error : %d", name, status));
+  if (status != kExpandOk || !has_value(variable)) {
+    diagnose_trace(format_text("%s expansion error : %d", name.c_str(), status));
     return std::nullopt;
   }
   return out;
@@ -58,9 +66,9 @@ std::optional<std::string> read_own_number(const std::string& file) {
 // Takes the next number of the suite-wide counter, locked against the other
 // processes of the suite doing the same.
 std::optional<std::string> allocate_number(const std::string& own_file) {
-  std::optional<std::string> counter = expand_strict("$KVLCONF/workzone.num");
+  std::optional<std::string> counter = expand_strict("KVLCONF", "workzone.num");
   if (!counter) {
-    counter = expand_strict("$KVLHOME/client/kvlconf/workzone.num");
+    counter = expand_strict("KVLHOME", "client/kvlconf/workzone.num");
     if (!counter) {
       diagnose_fatal("KVLHOME is not defined\n");
       return std::nullopt;
@@ -100,7 +108,7 @@ std::optional<std::string> allocate_number(const std::string& own_file) {
 }
 
 std::optional<std::string> workzone_directory() {
-  const std::optional<std::string> own_file = expand_strict("$KVLZONE/workzone.num");
+  const std::optional<std::string> own_file = expand_strict("KVLZONE", "workzone.num");
   if (!own_file) {
     diagnose_fatal("KVLZONE is not defined\n");
     return std::nullopt;
@@ -113,7 +121,7 @@ std::optional<std::string> workzone_directory() {
   std::string buffer(kTempDirCapacity, '\0');
   dir.copy(buffer.data(), dir.size());
   const std::int32_t status = expand_path(buffer.data(), kTempDirCapacity);
-  if (status == kExpandUndefined) {
+  if (status == kExpandUndefined || !has_value("KVLTMP")) {
     diagnose_fatal("KVLTMP is not defined\n");
     return std::nullopt;
   }

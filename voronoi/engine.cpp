@@ -8,6 +8,7 @@
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
 #include "voronoi/detail/offset_state.hpp"
+#include "voronoi/detail/point_insertion.hpp"
 
 namespace zt {
 
@@ -127,6 +128,7 @@ void VD_Terminate() {
   g.offsetCurves.Free();
   g.offsetElements.Free();
   FreeOffsetState();
+  ReleaseInsertionScratch();
   g.initialised = false;
 }
 

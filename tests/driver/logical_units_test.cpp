@@ -37,30 +37,6 @@ TEST(LogicalUnits, FreeUnitStartsAtThreeAndSkipsAttached) {
   EXPECT_EQ(free_unit(), 3);
 }
 
-// 12-, 16- and 18-byte records (and longer ones) give the same three floats;
-// the rest of each record is skipped.
-TEST(LogicalUnits, ReadsXyzOfAnyRecordSize) {
-  test::ScratchDir dir;
-  Bytes longer = test::point(7, 8, 9);
-  longer.resize(300, 0xee);
-  test::write_bytes(dir.file("m.bin"),
-                    test::record_file({test::point(1, 2, 3, 12), test::point(4, 5, 6, 16), longer,
-                                       test::point(-1, -2, -3, 18)}));
-  const std::int32_t u = free_unit();
-  attach_record_input(u, dir.file("m.bin"));
-  float x = 0, y = 0, z = 0;
-  std::vector<float> got;
-  EXPECT_EQ(record_position(u), 1);
-  while (read_record_xyz(u, x, y, z)) got.insert(got.end(), {x, y, z});
-  EXPECT_EQ(got, (std::vector<float>{1, 2, 3, 4, 5, 6, 7, 8, 9, -1, -2, -3}));
-  EXPECT_EQ(record_position(u), 5);
-  EXPECT_FALSE(read_record_xyz(u, x, y, z));
-  rewind_unit(u);
-  ASSERT_TRUE(read_record_xyz(u, x, y, z));
-  EXPECT_EQ(x, 1.0f);
-  close_unit(u);
-}
-
 TEST(WriteContour, ClosedSquareBytes) {
   test::ScratchDir dir;
   const Point2f square[] = {{0, 0}, {1, 0}, {1, 1}, {0, 1}, {0, 0}};
@@ -80,24 +56,24 @@ TEST(WriteContour, ClosedSquareBytes) {
   EXPECT_EQ(f, test::record_file(records));
 }
 
+// Ends 0.002 apart: refused; 0.0009 apart: written. No points: refused,
+// never a read before the array.
 TEST(WriteContour, RefusesOpenAndEmptyContours) {
   test::ScratchDir dir;
-  const Point2f open[] = {{0, 0}, {1, 0}, {1, 1}, {0, 1}, {0.002f, 0}};
-  const Point2f barely[] = {{0, 0}, {1, 0}, {1, 1}, {0, 1}, {0.0009f, 0}};
-  const std::int32_t u = free_unit();
-  attach_record_output(u, dir.file("o.bin"));
+  Point2f ring[] = {{0, 0}, {1, 0}, {1, 1}, {0, 1}, {0.002f, 0}};
   std::int32_t ierr = 0;
-  write_contour(5, open, 1.0f, u, ierr);
+  attach_record_output(3, dir.file("o.bin"));
+  write_contour(5, ring, 1.0f, 3, ierr);
   EXPECT_EQ(ierr, -1);
-  // No points at all: refused, never a read before the array.
-  write_contour(0, open, 1.0f, u, ierr);
+  write_contour(0, ring, 1.0f, 3, ierr);
   EXPECT_EQ(ierr, -1);
-  close_unit(u);
+  ring[4].x = 0.0009f;
+  close_unit(3);
   EXPECT_EQ(test::read_bytes(dir.file("o.bin")), (Bytes{0x4b, 0x82}));
-  attach_record_output(u, dir.file("c.bin"));
-  write_contour(5, barely, 1.0f, u, ierr);
+  attach_record_output(3, dir.file("c.bin"));
+  write_contour(5, ring, 1.0f, 3, ierr);
   EXPECT_EQ(ierr, 0);
-  close_unit(u);
+  close_unit(3);
   EXPECT_EQ(test::read_bytes(dir.file("c.bin")).size(), 122u);
 }
 
@@ -132,33 +108,35 @@ TEST_F(RecordStops, NonFiniteCoordinate) {
   EXPECT_EXIT(read_all(q), ::testing::ExitedWithCode(16), "inf.bin\", record 1:");
 }
 
-TEST_F(RecordStops, FileLayoutFaults) {
-  const std::string k = dir.file("notk.bin");
-  test::write_bytes(k, Bytes{'X', 0x82});
-  EXPECT_EXIT(read_all(k), ::testing::ExitedWithCode(13), "notk.bin\", record 0: not a record file");
-  const std::string t = dir.file("trunc.bin");
-  Bytes f = test::record_file({test::point(1, 2, 3), test::point(1, 2, 3)});
-  f.pop_back();
-  test::write_bytes(t, f);
-  EXPECT_EXIT(read_all(t), ::testing::ExitedWithCode(14), "trunc.bin\", record 3: damaged record file");
+TEST_F(RecordStops, OpeningFaults) {
   EXPECT_EXIT(read_all(dir.file("missing.bin")), ::testing::ExitedWithCode(10),
               "missing.bin\", record 0: cannot read the file");
-}
-
-TEST_F(RecordStops, WritingFaults) {
   EXPECT_EXIT(attach_record_output(3, dir.file("no/dir/out.bin")), ::testing::ExitedWithCode(11),
               "out.bin\", record 0: cannot write the file");
-  auto fill_full_device = [] {
-    attach_record_output(3, "/dev/full");
-    const Point2f sq[] = {{0, 0}, {1, 0}, {0, 0}};
-    std::int32_t ierr = 0;
-    for (int i = 0; i < 2000; ++i) write_contour(3, sq, 1.0f, 3, ierr);
-    close_unit(3);
-  };
-  EXPECT_EXIT(fill_full_device(), ::testing::ExitedWithCode(12), "\"/dev/full\", record [0-9]+: disk full");
   // A unit used for what it was not opened for is no silent success.
   EXPECT_EXIT(write_point_record(9, 0, 0, 0, kPointCode, kPointFlag), ::testing::ExitedWithCode(11),
               "unit 9");
+}
+
+// Regression: a run that stops on a fault leaves no half-written record file
+// (it would have no end marker, or worse, look complete); a finished one stays.
+TEST_F(RecordStops, RegressionIncompleteOutputIsRemoved) {
+  const std::string in = dir.file("short.bin");
+  test::write_bytes(in, test::record_file({Bytes(4, 0)}));
+  const std::string done = dir.file("done.bin");
+  const std::string out = dir.file("stock2.bin");
+  auto stop_while_writing = [&] {
+    attach_record_output(4, done);
+    close_unit(4);
+    attach_record_output(5, out);
+    const Point2f sq[] = {{0, 0}, {1, 0}, {0, 0}};
+    std::int32_t ierr = 0;
+    write_contour(3, sq, 1.0f, 5, ierr);
+    read_all(in);
+  };
+  EXPECT_EXIT(stop_while_writing(), ::testing::ExitedWithCode(15), "short.bin\", record 1");
+  EXPECT_FALSE(std::filesystem::exists(out));
+  EXPECT_EQ(test::read_bytes(done), (Bytes{0x4b, 0x82}));
 }
 
 }  // namespace

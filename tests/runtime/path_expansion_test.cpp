@@ -3,6 +3,7 @@
 #include "runtime/path_expansion.hpp"
 
 #include <cstring>
+#include <random>
 #include <string>
 
 #include "runtime/environment.hpp"
@@ -27,27 +28,28 @@ Expanded expand(const std::string& input, std::int32_t capacity = 512) {
 
 class ExpansionTest : public RuntimeTest {};
 
-TEST_F(ExpansionTest, DoubledSigilsAreLiterals) {
-  EXPECT_EQ(expand("$$HOME").text, "$HOME");
-  EXPECT_EQ(expand("??").text, "?");
-  EXPECT_EQ(expand("a$$$$b??c").text, "a$$b?c");
-}
-
-TEST_F(ExpansionTest, EveryReferenceForm) {
+TEST_F(ExpansionTest, FormsLiteralsAndNormalisation) {
   set_env("A", "va");
   set_env("PPATH", "vp");
-  for (const char* form : {"$A", "${A}", "$(A)"}) {
-    const Expanded e = expand(std::string("<") + form + ">");
-    EXPECT_EQ(e.status, kExpandOk) << form;
-    EXPECT_EQ(e.text, "<va>") << form;
-  }
-  for (const char* form : {"?P", "?{P}", "?(P)"}) EXPECT_EQ(expand(form).text, "vp") << form;
-  // A bare name is the longest run of letters, digits and "_".
   set_env("A_1", "long");
-  EXPECT_EQ(expand("$A_1.x").text, "long.x");
-  // The bracketed name runs to the first matching closer, other brackets included.
-  set_env("B", "vb");
-  EXPECT_EQ(expand("$(B)}").text, "vb}");
+  set_env("D", "/d/");
+  const struct {
+    const char* input;
+    const char* text;
+  } cases[] = {
+      {"<$A>", "<va>"}, {"<${A}>", "<va>"}, {"<$(A)>", "<va>"},
+      {"?P", "vp"}, {"?{P}", "vp"}, {"?(P)", "vp"},
+      {"$A_1.x", "long.x"},  // a bare name: the longest run of letters, digits, "_"
+      {"$(A)}", "va}"},      // a bracketed name ends at the first matching closer
+      {"$$HOME", "$HOME"}, {"??", "?"}, {"a$$$$b??c", "a$$b?c"},
+      {"a//b/c", "a/b/c"}, {"a\\\\b\\c", "a/b/c"}, {"//\\x/\\/y", "/x/y"}, {"$D/f", "/d/f"},
+  };
+  for (const auto& c : cases) {
+    const Expanded e = expand(c.input);
+    EXPECT_EQ(e.status, kExpandOk) << c.input;
+    EXPECT_EQ(e.text, c.text) << c.input;
+  }
+  EXPECT_TRUE(warnings.empty());
 }
 
 TEST_F(ExpansionTest, UnclosedBracketIsSyntaxErrorAndBufferUnchanged) {
@@ -71,14 +73,6 @@ TEST_F(ExpansionTest, UndefinedVariableVanishesWithStatus43) {
   EXPECT_EQ(expand("?Q").text, "none");
   set_env("KVLNULL", "$-$");  // only the first "$" is the name
   EXPECT_EQ(expand("${A}").text, "A-$");
-}
-
-TEST_F(ExpansionTest, SeparatorRunsBecomeOneSlash) {
-  EXPECT_EQ(expand("a//b/c").text, "a/b/c");
-  EXPECT_EQ(expand("a\\\\b\\c").text, "a/b/c");
-  EXPECT_EQ(expand("//\\x/\\/y").text, "/x/y");
-  set_env("D", "/d/");
-  EXPECT_EQ(expand("$D/f").text, "/d/f");
 }
 
 TEST_F(ExpansionTest, CapacityBoundary) {
@@ -249,6 +243,58 @@ TEST_F(ExpansionTest, DeleteFileByExpandableName) {
   delete_file("$D/a,b", 6, status);
   EXPECT_EQ(status, kExpandOk);
   EXPECT_FALSE(exists("a,b"));
+}
+
+// Random texts over the expansion's alphabet: only the documented statuses,
+// the buffer untouched on error, and a result that is a normalised path.
+TEST_F(ExpansionTest, RandomTextsKeepTheInvariants) {
+  set_env("A", "a/");
+  set_env("B", "$A\\$A");
+  set_env("CPATH", "?{B}");
+  const std::string alphabet = "$?{}()/\\ABCxy_";
+  std::mt19937 random(12345);
+  for (int round = 0; round < 3000; ++round) {
+    std::string input;
+    const int length = static_cast<int>(random() % 12);
+    for (int i = 0; i < length; ++i) input.push_back(alphabet[random() % alphabet.size()]);
+    const std::int32_t capacity = 1 + static_cast<std::int32_t>(random() % 24);
+    if (input.size() + 1 > static_cast<std::size_t>(capacity)) continue;
+    const Expanded e = expand(input, capacity);
+    switch (e.status) {
+      case kExpandOk:
+      case kExpandUndefined:
+        EXPECT_LT(e.text.size(), static_cast<std::size_t>(capacity)) << input;
+        EXPECT_EQ(e.text.find('\\'), std::string::npos) << input;
+        EXPECT_EQ(e.text.find("//"), std::string::npos) << input;
+        break;
+      case kExpandSyntax:
+      case kExpandTooSmall:
+        EXPECT_EQ(e.text, input);
+        break;
+      default:
+        ADD_FAILURE() << input << " gave " << e.status;
+    }
+  }
+}
+
+TEST_F(ExpansionTest, SmallBufferHuntingAids) {
+  set_env("KVL_EXPAND_MIN_BUFFER_SIZE", "-512");
+  set_env("KVL_EXPAND_LOGFILE_NAME", path("expand.log"));
+  expand("a", 512);  // in place: 512 is below 513
+  char out[600];
+  std::int32_t status;
+  expand_name("b", 1, out, 600, status);  // large enough: not logged
+  const std::string log = read_file("expand.log").value_or("");
+  EXPECT_EQ(log.rfind(" expanding 'a'", 0), 0u) << log;
+  EXPECT_NE(log.find("MinBufferSize="), std::string::npos);
+  EXPECT_EQ(log.find("'b'"), std::string::npos);
+  set_env("KVL_EXPAND_WATCH", "watched");
+  EXPECT_DEATH(expand("watched/name", 16), "");
+  unset_env("KVL_EXPAND_MIN_BUFFER_SIZE");
+  set_env("KVL_BUFFER_TOO_SMALL_OPTION", "crash");
+  EXPECT_DEATH(expand_name("toolong", 7, out, 4, status), "");
+  expand_name("fits", 4, out, 5, status);
+  EXPECT_EQ(status, kExpandOk);
 }
 
 }  // namespace

@@ -36,6 +36,10 @@ TEST_F(TempDirectoryTest, KvltmpdirIsTakenAsIs) {
   EXPECT_EQ(status, kExpandOk);
   EXPECT_TRUE(fatals.empty());          // KVLZONE is unset: it was never needed
   EXPECT_FALSE(exists("forced"));       // and nothing is created
+  // An empty KVLTMPDIR would put $TMP at the filesystem root: it counts as unset.
+  set_env("KVLTMPDIR", "");
+  EXPECT_EQ(temp_directory(), nullptr);
+  EXPECT_EQ(fatals.at(0), "KVLZONE is not defined\n");
 }
 
 TEST_F(TempDirectoryTest, NewWorkzoneTakesNextCounterNumber) {
@@ -97,8 +101,13 @@ TEST_F(TempDirectoryTest, UndefinedWorkzoneVariablesAreErrors) {
   EXPECT_NE(status, kExpandUndefined);
 
   fatals.clear();
+  set_env("KVLZONE", "");  // empty is no better than undefined
+  EXPECT_EQ(temp_directory(), nullptr);
+  EXPECT_EQ(fatals.at(0), "KVLZONE is not defined\n");
+
+  fatals.clear();
   new_workzone("0\n");
-  unset_env("KVLTMP");
+  set_env("KVLTMP", "");
   EXPECT_EQ(temp_directory(), nullptr);
   ASSERT_EQ(fatals.size(), 1u);
   EXPECT_EQ(fatals[0], "KVLTMP is not defined\n");

@@ -42,7 +42,10 @@ TEST(PointDiagram, ClusteredPointsTakeTheQuadtree) {
   const std::vector<Pt> pts = ClusteredPoints(6400, 7);
   Store(pts);
   CheckingObserver obs;
-  obs.every = 3;  // 2133 checks
+  // Every insertion up to 2000 (the search leaves the grid after 1536
+  // sampled points), then every 50th.
+  obs.allUpTo = 2000;
+  obs.every = 50;
   obs.Attach();
   ASSERT_TRUE(ComputePoints());
   EXPECT_TRUE(vd::Vd().usedQuadtree);
@@ -173,6 +176,46 @@ TEST(PointDiagram, CornerPointsReturnToTheirSlotsAfterARepairAppendedAPoint) {
   EXPECT_EQ(g.points[g.points.count - 2].x, c2x);
   EXPECT_EQ(g.points[g.points.count - 1].y, c3y);
   EXPECT_EQ(FinalCheck(), "");
+}
+
+}  // namespace
+}  // namespace zt
+
+namespace zt {
+namespace {
+
+using namespace vdtest;
+
+TEST(PointDiagram, CornerPointsFixTheMaximalOffset) {
+  Store({{0, 0}, {1, 0}, {1, 1}, {0, 1}});
+  ASSERT_TRUE(ComputePoints());  // points only: bound factor 1 becomes 5
+  const vd::Engine& g = vd::Vd();
+  const double w = 5.01;
+  EXPECT_DOUBLE_EQ(g.maxOffset, 0.49 * std::sqrt(2 * w * w));
+  EXPECT_EQ(g.points[0].x, -w);
+  EXPECT_EQ(g.points[0].y, -w);
+  EXPECT_EQ(g.points[g.points.count - 1].x, 1 + w);
+  EXPECT_EQ(g.points[g.points.count - 2].y, -w);
+  // A wide box: the height margin is raised to half the width margin.
+  Store({{0, 0}, {1, 0.1}});
+  ASSERT_TRUE(VD_ComputeDiagram(false, 2, true, false, 0, 0, 0.0, 0.0, true));
+  EXPECT_DOUBLE_EQ(g.points[1].y - 0.1, 2.01 / 2);
+}
+
+TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
+  // Every pair closer than the merge distance costs one restart.
+  std::vector<Pt> pts{{0, 0}, {1, 1}};
+  for (int i = 0; i < 600; ++i) {
+    const double x = (i + 0.5) / 601.0, y = std::fmod(i * 0.618, 1.0);
+    pts.push_back({x, y});
+    pts.push_back({x + 1e-13, y});
+  }
+  EXPECT_EXIT(
+      {
+        Store(pts);
+        ComputePoints();
+      },
+      testing::ExitedWithCode(2), "\nerror in ComputeVD\\(\\) - aborting computation -- too many restarts!");
 }
 
 }  // namespace

@@ -74,12 +74,14 @@ inline bool ComputePoints() { return VD_ComputeDiagram(false, 1, true, false, 0,
 struct CheckingObserver {
   std::string firstError;
   std::int32_t insertions = 0;
-  std::int32_t every = 1;
+  std::int32_t every = 1;        // check after every `every`-th insertion ...
+  std::int32_t allUpTo = 0;      // ... but after each of the first `allUpTo`
 
   static void Hook(void* self, std::int32_t) {
     auto* o = static_cast<CheckingObserver*>(self);
     ++o->insertions;
-    if (!o->firstError.empty() || o->insertions % o->every != 0) return;
+    if (!o->firstError.empty()) return;
+    if (o->insertions > o->allUpTo && o->insertions % o->every != 0) return;
     o->firstError = vd::CheckDiagram();
     if (!o->firstError.empty()) o->firstError = "after insertion " + std::to_string(o->insertions) + ": " + o->firstError;
   }

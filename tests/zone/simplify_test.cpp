@@ -3,10 +3,13 @@
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cmath>
 #include <random>
+#include <string>
 #include <vector>
 
 namespace {
@@ -32,7 +35,15 @@ double seg_dist2(Point2d p, Point2d a, Point2d b) {
   return dist2(p, {a.x + t * dx, a.y + t * dy});
 }
 
-double seg_dist(Point2d p, Point2d a, Point2d b) { return std::sqrt(seg_dist2(p, a, b)); }
+testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
+  bool same = got.size() == want.size();
+  for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
+  if (same) return testing::AssertionSuccess();
+  testing::AssertionResult r = testing::AssertionFailure();
+  r << "got";
+  for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
+  return r;
+}
 
 // Written independently of the product: recursion instead of a stack.
 void reference_dp(const std::vector<Point2d>& r, int i, int j, double tau, std::vector<bool>& keep) {
@@ -82,7 +93,7 @@ void check_bound(const std::vector<Point2d>& in, const std::vector<Point2d>& kep
     while (next < index.size() && index[next] < i) ++next;
     if (next < index.size() && index[next] == i) continue;
     const double d = next == 0 ? std::sqrt(dist2(in[i], kept[0]))
-                               : seg_dist(in[i], kept[next - 1], kept[next]);
+                               : std::sqrt(seg_dist2(in[i], kept[next - 1], kept[next]));
     ASSERT_LE(d, bound * (1 + kBoundSlack) + kBoundSlack) << "dropped point " << i;
   }
 }
@@ -119,17 +130,14 @@ TEST(SimplifyRandom, BothFormsStayWithinToleranceAndMatchReference) {
     ps.simplify(in.data(), n, tol, result, true);
     std::vector<Point2d> a(result.begin(), result.end());
     check_bound(in, a, tol);
-    const std::vector<Point2d> ra = reference(in, tol * zt::kRadialFactor, tol - tol * zt::kRadialFactor);
-    ASSERT_EQ(a.size(), ra.size()) << "round " << round;
-    for (size_t k = 0; k < a.size(); ++k) ASSERT_TRUE(a[k].x == ra[k].x && a[k].y == ra[k].y);
+    const double rho = tol * zt::kRadialFactor;
+    ASSERT_TRUE(Same(a, reference(in, rho, tol - rho))) << "round " << round;
 
     const double eps = round % 3 ? tol * 0.2 : zt::kPolylineRadialEps;
     std::vector<Point2d> b = in;
     b.resize(vs.simplify(b.data(), n, eps, tol));
     check_bound(in, b, std::max(eps + tol, 2 * eps));
-    const std::vector<Point2d> rb = reference(in, eps, tol);
-    ASSERT_EQ(b.size(), rb.size()) << "round " << round;
-    for (size_t k = 0; k < b.size(); ++k) ASSERT_TRUE(b[k].x == rb[k].x && b[k].y == rb[k].y);
+    ASSERT_TRUE(Same(b, reference(in, eps, tol))) << "round " << round;
   }
 }
 
@@ -146,15 +154,6 @@ std::vector<Point2d> run_polyline(const std::vector<Point2d>& p, double tol) {
   return {out.begin(), out.end()};
 }
 
-testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
-  bool same = got.size() == want.size();
-  for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
-  if (same) return testing::AssertionSuccess();
-  testing::AssertionResult r = testing::AssertionFailure();
-  r << "got";
-  for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
-  return r;
-}
 
 TEST(SimplifyExact, PointAtToleranceDroppedJustBeyondKept) {
   const double tol = 0.005;
@@ -214,12 +213,8 @@ TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   EXPECT_EQ(out.count(), 0);
 
   Array<Point2d>* list = ps.resultList(100);
-  ASSERT_NE(list, nullptr);
-  EXPECT_EQ(list->capacity(), 5000);
-  EXPECT_EQ(list->growBy(), 1000);
-  EXPECT_EQ(ps.resultList(9000), list);
-  PolylineSimplifier big;
-  EXPECT_EQ(big.resultList(6000)->capacity(), 6010);
+  EXPECT_TRUE(list->capacity() == 5000 && list->growBy() == 1000 && ps.resultList(9000) == list);
+  EXPECT_EQ(PolylineSimplifier().resultList(6000)->capacity(), 6010);
 }
 
 TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
@@ -271,3 +266,28 @@ TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
 }
 
 }  // namespace
+
+// zonetool simplify's text form: blank lines only between polylines, shortest
+// numbers, bad input refused with status 2.
+TEST(ZonetoolSimplify, TextRoundTrip) {
+  const std::string tool = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool";
+  if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
+  auto run = [&](const std::string& args, const std::string& input, int& status) {
+    const std::string cmd = "printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null";
+    FILE* p = popen(cmd.c_str(), "r");
+    if (!p) return std::string("popen failed");
+    std::string out;
+    char buf[256];
+    for (size_t n; (n = fread(buf, 1, sizeof buf, p)) > 0;) out.append(buf, n);
+    status = WEXITSTATUS(pclose(p));
+    return out;
+  };
+  int status = -1;
+  EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),
+            "0 0\n2.5 0\n\n1 1\n");
+  EXPECT_EQ(status, 0);
+  run("--tolerance 0.01", "1 2 3\\n", status);
+  EXPECT_EQ(status, 2);
+  run("--tolerance -1", "", status);
+  EXPECT_EQ(status, 2);
+}

@@ -35,19 +35,24 @@ int zonetool::cmd_make(int argc, char** argv) {
   }
 
   zt::RecordWriter writer;
-  if (!writer.create(argv[0])) zt::record_stop(writer.fault());
+  auto stop = [&writer] {
+    const zt::RecordFaultInfo info = writer.fault();
+    writer.abandon();
+    zt::record_stop(info);
+  };
+  if (!writer.create(argv[0])) stop();
   const zt::PointRecord separator =
       zt::encode_point_record(zt::kSeparatorValue, zt::kSeparatorValue, zt::kSeparatorValue,
                               zt::kSeparatorCode, zt::kPointFlag);
   for (const TextPolyline& contour : contours) {
-    if (!writer.write(separator)) zt::record_stop(writer.fault());
+    if (!writer.write(separator)) stop();
     for (const TextPoint& p : contour) {
       const zt::PointRecord r =
           zt::encode_point_record(static_cast<float>(p[0]), static_cast<float>(p[1]),
                                   static_cast<float>(p[2]), zt::kPointCode, zt::kPointFlag);
-      if (!writer.write(r)) zt::record_stop(writer.fault());
+      if (!writer.write(r)) stop();
     }
   }
-  if (!writer.close()) zt::record_stop(writer.fault());
+  if (!writer.close()) stop();
   return 0;
 }

@@ -42,25 +42,22 @@ bool Circumcentre(std::int32_t i, std::int32_t j, std::int32_t k, double& x, dou
   }
   // Intersect the two bisectors that are furthest from parallel: those of
   // the two sides meeting at the vertex whose angle has the largest sine.
-  int best = 0;
-  double bestSine = -1.0;
+  // Twice the triangle's area is the same cross product at every vertex, so
+  // that vertex is the one whose two sides have the smallest product of
+  // lengths: the vertex opposite the longest side.
+  double side2[3];
   for (int m = 0; m < 3; ++m) {
-    const PointRecord& a = *p[m];
-    const PointRecord& b = *p[(m + 1) % 3];
-    const PointRecord& c = *p[(m + 2) % 3];
-    const double ux = b.x - a.x, uy = b.y - a.y, vx = c.x - a.x, vy = c.y - a.y;
-    const double sine = std::fabs(ux * vy - uy * vx) / std::sqrt((ux * ux + uy * uy) * (vx * vx + vy * vy));
-    if (sine > bestSine) {
-      bestSine = sine;
-      best = m;
-    }
+    const PointRecord& a = *p[(m + 1) % 3];
+    const PointRecord& b = *p[(m + 2) % 3];
+    side2[m] = (b.x - a.x) * (b.x - a.x) + (b.y - a.y) * (b.y - a.y);  // opposite vertex m
   }
+  const int best = side2[0] >= side2[1] ? (side2[0] >= side2[2] ? 0 : 2) : (side2[1] >= side2[2] ? 1 : 2);
   const PointRecord& a = *p[best];
   const PointRecord& b = *p[(best + 1) % 3];
   const PointRecord& c = *p[(best + 2) % 3];
   const double ux = b.x - a.x, uy = b.y - a.y, vx = c.x - a.x, vy = c.y - a.y;
   const double d = 2.0 * (ux * vy - uy * vx);
-  if (d == 0.0 || !(bestSine > 0.0)) return false;  // collinear: no finite centre
+  if (d == 0.0) return false;  // collinear: no finite centre
   const double u2 = ux * ux + uy * uy, v2 = vx * vx + vy * vy;
   const double ox = (vy * u2 - uy * v2) / d;
   const double oy = (ux * v2 - vx * u2) / d;

@@ -2,9 +2,11 @@
 // the input, and the phases, each resumable at its cursor.
 #include "voronoi/detail/compute_vd.hpp"
 
+#include <cassert>
 #include <cmath>
 
 #include "voronoi/detail/bisector_split.hpp"
+#include "voronoi/detail/checker.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/fatal.hpp"
 #include "voronoi/detail/initial_diagram.hpp"
@@ -217,7 +219,10 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
     for (std::int32_t i = 0; i < g.segments.count; ++i) g.segments[i].arc = kNone;
     g.arcsApproximated = 0;
   }
-  // 18-19.
+  // 18-19. Debug builds check the diagram's topology before declaring it up
+  // to date (not after a forced fallback, whose diagram is only as good as
+  // the fallback could make it).
+  assert(g.recoveryMode || CheckDiagram(CheckOptions{false, false, true}).empty());
   g.upToDate = true;
   g.computing = false;
   finished = true;

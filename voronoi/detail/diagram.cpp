@@ -145,17 +145,4 @@ void SetVDPtr(std::int32_t kind, std::int32_t site, std::int32_t edge) {
   }
 }
 
-std::int32_t RegionExitNode(std::int32_t e, std::int32_t site, std::int32_t kind) {
-  const EdgeRecord& r = Vd().edges[e];
-  if (r.lft == site && r.ltype == kind) return r.n2;
-  if (r.rgt == site && r.rtype == kind) return r.n1;
-  return kNone;
-}
-
-std::int32_t NextRegionEdge(std::int32_t e, std::int32_t site, std::int32_t kind) {
-  const std::int32_t n = RegionExitNode(e, site, kind);
-  if (n < 0) return kNone;
-  return CwAt(Vd().edges[e], n);
-}
-
 }  // namespace zt::vd

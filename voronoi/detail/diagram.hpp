@@ -48,11 +48,19 @@ inline std::int32_t LeftKindFrom(const EdgeRecord& e, std::int32_t n) { return e
 inline std::int32_t RightSiteFrom(const EdgeRecord& e, std::int32_t n) { return e.n1 == n ? e.rgt : e.lft; }
 inline std::int32_t RightKindFrom(const EdgeRecord& e, std::int32_t n) { return e.n1 == n ? e.rtype : e.ltype; }
 
-// Next edge of the boundary of the region of (site, kind), walking with the
-// region on the left (counter-clockwise), after edge e; -1 when e does not
+// The node at which a walk around the region of (site, kind), with the
+// region on the left (counter-clockwise), leaves edge e; -1 when e does not
 // bound that region.
-std::int32_t NextRegionEdge(std::int32_t e, std::int32_t site, std::int32_t kind);
-// The node at which that walk leaves edge e.
-std::int32_t RegionExitNode(std::int32_t e, std::int32_t site, std::int32_t kind);
+inline std::int32_t RegionExitNode(std::int32_t e, std::int32_t site, std::int32_t kind) {
+  const EdgeRecord& r = Vd().edges[e];
+  if (r.lft == site && r.ltype == kind) return r.n2;
+  if (r.rgt == site && r.rtype == kind) return r.n1;
+  return kNone;
+}
+// The next edge of that walk after e; -1 when e does not bound the region.
+inline std::int32_t NextRegionEdge(std::int32_t e, std::int32_t site, std::int32_t kind) {
+  const std::int32_t n = RegionExitNode(e, site, kind);
+  return n < 0 ? kNone : CwAt(Vd().edges[e], n);
+}
 
 }  // namespace zt::vd

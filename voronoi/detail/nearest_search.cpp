@@ -39,7 +39,10 @@ struct Entry {
   std::int32_t next;
 };
 
+// A quadtree node carries its point's coordinates for the same reason.
 struct QuadNode {
+  double x;
+  double y;
   std::int32_t point;
   std::int32_t child[4];
 };
@@ -236,11 +239,11 @@ void NearestPointSearch::SwitchToQuadtree() {
 void NearestPointSearch::QuadInsert(std::int32_t p) {
   const PointRecord& pt = Vd().points[p];
   const std::int32_t fresh = static_cast<std::int32_t>(quad_.size());
-  quad_.push_back(QuadNode{p, {-1, -1, -1, -1}});
+  quad_.push_back(QuadNode{pt.x, pt.y, p, {-1, -1, -1, -1}});
   if (fresh == 0) return;
   std::int32_t n = 0;
   for (;;) {
-    const PointRecord& at = Vd().points[quad_[n].point];
+    const QuadNode& at = quad_[n];
     const int quadrant = (pt.x >= at.x ? 1 : 0) + (pt.y >= at.y ? 2 : 0);
     if (quad_[n].child[quadrant] < 0) {
       quad_[n].child[quadrant] = fresh;
@@ -254,6 +257,21 @@ std::int32_t NearestPointSearch::QuadNearest(double x, double y, double& bestD2)
   bestD2 = std::numeric_limits<double>::infinity();
   if (quad_.empty()) return -1;
   std::int32_t best = -1;
+  const auto visit = [&](const QuadNode& qn) {
+    const double dx = qn.x - x, dy = qn.y - y;
+    const double d2 = dx * dx + dy * dy;
+    if (d2 < bestD2) {
+      bestD2 = d2;
+      best = qn.point;
+    }
+  };
+  // The path the query would be inserted along gives a close first bound,
+  // so the best-first search below opens few subtrees.
+  for (std::int32_t n = 0; n >= 0;) {
+    const QuadNode& qn = quad_[n];
+    visit(qn);
+    n = qn.child[(x >= qn.x ? 1 : 0) + (y >= qn.y ? 2 : 0)];
+  }
   const double inf = std::numeric_limits<double>::infinity();
   heap_.clear();
   heap_.push_back(Candidate{0.0, 0, Box{-inf, -inf, inf, inf}});
@@ -264,19 +282,13 @@ std::int32_t NearestPointSearch::QuadNearest(double x, double y, double& bestD2)
     heap_.pop_back();
     if (c.d2 >= bestD2) break;
     const QuadNode& qn = quad_[c.node];
-    const PointRecord& at = Vd().points[qn.point];
-    const double dx = at.x - x, dy = at.y - y;
-    const double d2 = dx * dx + dy * dy;
-    if (d2 < bestD2) {
-      bestD2 = d2;
-      best = qn.point;
-    }
+    visit(qn);
     for (int q = 0; q < 4; ++q) {
       const std::int32_t ch = qn.child[q];
       if (ch < 0) continue;
       Box b = c.box;
-      if (q & 1) b.x0 = at.x; else b.x1 = at.x;
-      if (q & 2) b.y0 = at.y; else b.y1 = at.y;
+      if (q & 1) b.x0 = qn.x; else b.x1 = qn.x;
+      if (q & 2) b.y0 = qn.y; else b.y1 = qn.y;
       const double cd2 = Dist2ToBox(x, y, b);
       if (cd2 < bestD2) {
         heap_.push_back(Candidate{cd2, ch, b});

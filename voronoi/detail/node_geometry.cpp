@@ -5,7 +5,12 @@
 
 namespace zt::vd::geo {
 
-double distance(Point2d u, Point2d v) { return std::hypot(u.x - v.x, u.y - v.y); }
+// Internal coordinates are at most about 1e154 (the far nodes), whose squares
+// stay finite: no need for the slower overflow-safe hypot.
+double distance(Point2d u, Point2d v) {
+  const double dx = u.x - v.x, dy = u.y - v.y;
+  return std::sqrt(dx * dx + dy * dy);
+}
 
 SegSite SegSite::make(std::int32_t index, std::int32_t i1, Point2d p1, std::int32_t i2, Point2d p2) {
   SegSite s;

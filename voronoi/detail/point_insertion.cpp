@@ -46,13 +46,11 @@ void ClearMarks() {
 
 // The seed: among the nodes of q's region whose circle contains p, the one
 // with the largest r^2/d^2 (compared by cross-multiplication); -1 if none.
-std::int32_t FindSeed(std::int32_t q, std::int32_t p, std::int32_t& fallback) {
+std::int32_t FindSeed(std::int32_t q, std::int32_t p) {
   Engine& g = Vd();
   const PointRecord& pt = g.points[p];
   std::int32_t best = -1;
   double bestR2 = 0.0, bestD2 = 1.0;
-  double bestMargin = -HUGE_VAL;
-  fallback = -1;
   const std::int32_t start = g.points[q].vd;
   std::int32_t e = start;
   for (std::int32_t steps = 0; e >= 0 && steps <= g.edges.count; ++steps) {
@@ -65,10 +63,29 @@ std::int32_t FindSeed(std::int32_t q, std::int32_t p, std::int32_t& fallback) {
       bestR2 = node.r;
       bestD2 = d2;
     }
-    const double margin = std::sqrt(node.r) - std::sqrt(d2);
+    e = NextRegionEdge(e, q, PNT);
+    if (e == start) break;
+  }
+  return best;
+}
+
+// The fallback seed when no node conflicts: the node of q's region with the
+// largest r - d.
+std::int32_t FallbackSeed(std::int32_t q, std::int32_t p) {
+  Engine& g = Vd();
+  const PointRecord& pt = g.points[p];
+  std::int32_t best = -1;
+  double bestMargin = -HUGE_VAL;
+  const std::int32_t start = g.points[q].vd;
+  std::int32_t e = start;
+  for (std::int32_t steps = 0; e >= 0 && steps <= g.edges.count; ++steps) {
+    const std::int32_t n = RegionExitNode(e, q, PNT);
+    if (n < 0) break;
+    const NodeRecord& node = g.nodes[n];
+    const double margin = std::sqrt(node.r) - std::sqrt(Dist2(node, pt));
     if (margin > bestMargin) {
       bestMargin = margin;
-      fallback = n;
+      best = n;
     }
     e = NextRegionEdge(e, q, PNT);
     if (e == start) break;
@@ -151,6 +168,13 @@ RecordArray<Cut> gCuts;
 
 }  // namespace
 
+void ReleaseInsertionScratch() {
+  gLeaving.Free();
+  gTreeEdges.Free();
+  gCuts.Free();
+  gFrames.Free();
+}
+
 void InsertPoint(std::int32_t p) {
   Engine& g = Vd();
   PointRecord& pt = g.points[p];
@@ -174,12 +198,11 @@ void InsertPoint(std::int32_t p) {
     return;
   }
 
-  std::int32_t fallback = -1;
-  std::int32_t seed = FindSeed(q, p, fallback);
+  std::int32_t seed = FindSeed(q, p);
   if (seed < 0) {
     g.errorFlag = true;
     if (RepairInput(p, PNT, true)) return;
-    seed = fallback;
+    seed = FallbackSeed(q, p);
     g.recoveryMode = true;
     if (seed < 0) return;  // q has no region: nothing sound to insert into
   }

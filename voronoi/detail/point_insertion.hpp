@@ -18,4 +18,7 @@ namespace zt::vd {
 // or with a restart pending after an input repair.
 void InsertPoint(std::int32_t p);
 
+// Frees the scratch lists of the insertions (they are otherwise reused).
+void ReleaseInsertionScratch();
+
 }  // namespace zt::vd

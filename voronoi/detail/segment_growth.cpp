@@ -7,12 +7,20 @@
 #include "voronoi/detail/node_on_edge.hpp"
 #include "voronoi/detail/root_selection.hpp"
 #include "voronoi/detail/segment_insertion.hpp"
+#include "voronoi/detail/segment_repair.hpp"
 
 namespace zt::vd {
 namespace {
 
-void RecordPoint(std::int32_t site, std::int32_t kind) {
+RecordArray<std::int32_t> gSegmentsBeside;  // segment sites beside the tree
+
+void RecordSite(std::int32_t site, std::int32_t kind) {
   Engine& g = Vd();
+  if (kind == SEG && site >= 0 && !g.segments[site].flag) {
+    g.segments[site].flag = 1;
+    gSegmentsBeside.Append(site, kScratchGrowth);
+    return;
+  }
   if (kind != PNT || site < 0) return;
   PointRecord& p = g.points[site];
   if (p.marked || p.hasNode) return;
@@ -33,8 +41,8 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
     std::int32_t e = e0;
     do {
       const EdgeRecord er = g.edges[e];
-      RecordPoint(er.lft, er.ltype);
-      RecordPoint(er.rgt, er.rtype);
+      RecordSite(er.lft, er.ltype);
+      RecordSite(er.rgt, er.rtype);
       const std::int32_t w = OtherNode(er, n);
       const NodeRecord& wn = g.nodes[w];
       if (wn.status == UNCHECKED) {
@@ -126,6 +134,8 @@ void ResetInsertionMarks() {
     if (n.status == VISITED || n.status == CHECKED) n.status = UNCHECKED;
   }
   g.checkedNodes.count = 0;
+  for (std::int32_t i = 0; i < gSegmentsBeside.count; ++i) g.segments[gSegmentsBeside[i]].flag = 0;
+  gSegmentsBeside.count = 0;
 }
 
 Point2d ProtectDirection(const SegmentInsertion& si, std::int32_t p) {
@@ -233,6 +243,15 @@ bool GrowDeletedTree(SegmentInsertion& si) {
     GrowOnce(si, kLadderTop);
     g.errorFlag = true;
     g.recoveryMode = true;
+  }
+  // A segment already in the diagram that crosses this one (or repeats it)
+  // borders the tree wherever the two meet: such input is repaired here,
+  // before it can produce a diagram that only looks sound.
+  for (std::int32_t i = 0; i < gSegmentsBeside.count; ++i) {
+    if (RepairSegmentSegment(si.s, gSegmentsBeside[i])) {
+      ResetInsertionMarks();
+      return false;
+    }
   }
   // Every recorded point keeps part of its region.
   for (std::int32_t i = 0; i < g.markedSites.count; ++i) {

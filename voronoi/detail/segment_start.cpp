@@ -36,6 +36,20 @@ Candidate SearchRegion(const SegmentInsertion& si, std::int32_t p, std::int32_t 
       if (best.node < 0 || v < best.value) best = {n, v};
       const bool shared = (er.lft == other && er.ltype == PNT) || (er.rgt == other && er.rtype == PNT);
       if (shared && (bestShared.node < 0 || v < bestShared.value)) bestShared = {n, v};
+    } else if (n >= 0 && g.nodes[n].site == p) {
+      // A node on p itself: where segments meet at p with no angle wider
+      // than a half turn, p's region shrinks to such nodes, and the new
+      // segment starts in a neighbouring region; its nodes count too.
+      const std::int32_t f0 = g.nodes[n].edge;
+      std::int32_t f = f0;
+      do {
+        const std::int32_t w = OtherNode(g.edges[f], n);
+        if (!IsFarNode(w) && g.nodes[w].site < 0) {
+          const double v = ConflictValue(si, w, tol);
+          if (best.node < 0 || v < best.value) best = {w, v};
+        }
+        f = CcwAt(g.edges[f], n);
+      } while (f != f0);
     }
     e = NextRegionEdge(e, p, PNT);
   } while (e >= 0 && e != e0 && ++guard < g.edges.count + 4);

@@ -99,6 +99,20 @@ std::int32_t CutPoint(const SegmentInsertion& si, const EdgeRecord& er) {
 // Breaks the cycle in gCycle. False when the insertion must return.
 bool BreakCycle(const SegmentInsertion& si) {
   Engine& g = Vd();
+  // A cycle through the node on one of the segment's end points encloses
+  // that point's region, which has shrunk to the point (its segments leave
+  // it no angle wider than a half turn on that side): the node stays, and
+  // the region keeps its degenerate shape at the point.
+  for (std::int32_t i = 0; i < gCycle.count; ++i) {
+    const EdgeRecord& er = g.edges[gCycle[i]];
+    for (const std::int32_t n : {er.n1, er.n2}) {
+      const std::int32_t site = g.nodes[n].site;
+      if (n != si.start && n != si.end && (site == si.i1 || site == si.i2)) {
+        g.nodes[n].status = CHECKED;
+        return true;
+      }
+    }
+  }
   for (double tol = kProtectTol; tol <= kLadderTop; tol = NextTolerance(tol)) {
     for (std::int32_t i = 0; i < gCycle.count; ++i) {
       const std::int32_t e = gCycle[i];

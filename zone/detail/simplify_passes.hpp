@@ -16,18 +16,23 @@ inline double squared_distance(const Point2d& a, const Point2d& b) {
   return dx * dx + dy * dy;
 }
 
-// Squared distance of p to the segment a-b; a zero-length segment falls into
-// the first branch (s = 0), so there is no division by zero.
-inline double squared_segment_distance(const Point2d& p, const Point2d& a, const Point2d& b) {
-  const double dx = b.x - a.x;
-  const double dy = b.y - a.y;
-  const double s = (p.x - a.x) * dx + (p.y - a.y) * dy;
-  if (s <= 0.0) return squared_distance(p, a);
-  const double len2 = dx * dx + dy * dy;
-  if (s >= len2) return squared_distance(p, b);
-  const double t = s / len2;
-  return squared_distance(p, Point2d{a.x + t * dx, a.y + t * dy});
-}
+// Squared distances to the segment a-b, its terms formed once per range. A
+// zero-length segment falls into the first branch (s = 0), so there is no
+// division by zero.
+struct Segment {
+  Point2d a, b;
+  double dx, dy, len2;
+  Segment(const Point2d& from, const Point2d& to)
+      : a(from), b(to), dx(to.x - from.x), dy(to.y - from.y), len2(dx * dx + dy * dy) {}
+
+  double squared_distance_to(const Point2d& p) const {
+    const double s = (p.x - a.x) * dx + (p.y - a.y) * dy;
+    if (s <= 0.0) return squared_distance(p, a);
+    if (s >= len2) return squared_distance(p, b);
+    const double t = s / len2;
+    return squared_distance(p, Point2d{a.x + t * dx, a.y + t * dy});
+  }
+};
 
 // Radial pass over points[0..n), n >= 2. `append` adds a point to the run,
 // `last` returns the run's last point and `replaceLast` overwrites it. A point
@@ -63,10 +68,11 @@ void douglas_peucker(const Point2d* run, std::int32_t m, double tau2, Mark mark,
   while (!stack.empty()) {
     const auto [i, j] = stack.back();
     stack.pop_back();
+    const Segment chord(run[i], run[j]);
     double largest = -1.0;
     std::int32_t farthest = -1;
     for (std::int32_t k = i + 1; k < j; ++k) {
-      const double d2 = squared_segment_distance(run[k], run[i], run[j]);
+      const double d2 = chord.squared_distance_to(run[k]);
       if (d2 > largest) {
         largest = d2;
         farthest = k;

@@ -1,0 +1,134 @@
+// The diagram of polygons beside Boost.Polygon's segment Voronoi diagram on
+// the same integer input in the same run: star-shaped simple polygons of
+// 2e4 and 1e5 segments, and a pocket with 20 islands. Each case reports the
+// peak memory of one construction (growth of the resident set's high-water
+// mark, in a child process) and our restarts.
+#include <benchmark/benchmark.h>
+#include <malloc.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <boost/polygon/segment_data.hpp>
+#include <boost/polygon/voronoi.hpp>
+#include <cmath>
+#include <fstream>
+#include <map>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "voronoi/engine.hpp"
+
+namespace {
+
+using BPoint = boost::polygon::point_data<int>;
+using BSegment = boost::polygon::segment_data<int>;
+using Polygon = std::vector<BPoint>;
+
+// Jittered even angles keep every gap below half a turn: simple polygons.
+Polygon Star(int n, std::mt19937& rng, double cx, double cy, double rmin, double rmax, bool reverse) {
+  std::uniform_real_distribution<double> ua(0.0, 0.8), ur(rmin, rmax);
+  Polygon p;
+  for (int i = 0; i < n; ++i) {
+    const double a = 2 * M_PI * (i + ua(rng)) / n, r = ur(rng);
+    const BPoint q(int(std::lround(cx + r * std::cos(a))), int(std::lround(cy + r * std::sin(a))));
+    if (p.empty() || !(q == p.back())) p.push_back(q);
+  }
+  if (reverse) std::reverse(p.begin(), p.end());
+  return p;
+}
+
+std::vector<Polygon> Make(int kind, int n) {
+  std::mt19937 rng(kind * 7 + n);
+  if (kind == 0) return {Star(n, rng, 0, 0, 4e6, 8e6, false)};
+  // Pocket: an outer star and 20 islands (4 x 5) of n/40 vertices each.
+  std::vector<Polygon> polys{Star(n / 2, rng, 0, 0, 7.5e6, 8e6, false)};
+  for (int i = 0; i < 4; ++i)
+    for (int j = 0; j < 5; ++j)
+      polys.push_back(Star(n / 40, rng, -3.6e6 + 2.4e6 * i, -4e6 + 2e6 * j, 4e5, 8e5, true));
+  return polys;
+}
+
+const std::vector<Polygon>& Input(int kind, int n) {
+  static std::map<std::pair<int, int>, std::vector<Polygon>> cache;
+  auto& v = cache[{kind, n}];
+  if (v.empty()) v = Make(kind, n);
+  return v;
+}
+
+void RunOurs(const std::vector<Polygon>& polys) {
+  zt::VD_Initialize();
+  zt::VD_Reset();
+  std::vector<std::int32_t> idx;
+  for (const Polygon& p : polys) {
+    idx.clear();
+    for (const BPoint& q : p) idx.push_back(zt::API_AddPoint(q.x(), q.y(), 0));
+    for (std::size_t i = 0; i < idx.size(); ++i) zt::API_AddSegment(idx[i], idx[(i + 1) % idx.size()], 0);
+  }
+  if (!zt::VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true)) std::abort();
+}
+
+void RunBoost(const std::vector<Polygon>& polys) {
+  std::vector<BSegment> segs;
+  for (const Polygon& p : polys)
+    for (std::size_t i = 0; i < p.size(); ++i) segs.emplace_back(p[i], p[(i + 1) % p.size()]);
+  boost::polygon::voronoi_diagram<double> vd;
+  boost::polygon::construct_voronoi(segs.begin(), segs.end(), &vd);
+  benchmark::DoNotOptimize(vd.num_vertices());
+}
+
+long StatusKb(const char* field) {
+  std::ifstream f("/proc/self/status");
+  std::string line;
+  const std::string key = std::string(field) + ":";
+  while (std::getline(f, line))
+    if (line.rfind(key, 0) == 0) return std::stol(line.substr(key.size()));
+  return 0;
+}
+
+double PeakMb(void (*run)(const std::vector<Polygon>&), const std::vector<Polygon>& polys) {
+  int fds[2];
+  if (pipe(fds) != 0) return -1;
+  const pid_t pid = fork();
+  if (pid == 0) {
+    close(fds[0]);
+    zt::VD_Terminate();
+    malloc_trim(0);
+    std::ofstream("/proc/self/clear_refs") << "5";
+    const long before = StatusKb("VmRSS");
+    run(polys);
+    const double mb = (StatusKb("VmHWM") - before) / 1024.0;
+    if (write(fds[1], &mb, sizeof mb) != sizeof mb) _exit(1);
+    _exit(0);
+  }
+  close(fds[1]);
+  double mb = -1;
+  if (read(fds[0], &mb, sizeof mb) != sizeof mb) mb = -1;
+  close(fds[0]);
+  int status = 0;
+  waitpid(pid, &status, 0);
+  return mb;
+}
+
+void BM_Ours(benchmark::State& state) {
+  const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  state.counters["peak_MB"] = PeakMb(RunOurs, polys);
+  for (auto _ : state) RunOurs(polys);
+  state.counters["restarts"] = zt::VD_GetRestartCount();
+  state.counters["recovery"] = zt::VD_InRecoveryMode();
+}
+
+void BM_Boost(benchmark::State& state) {
+  const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  state.counters["peak_MB"] = PeakMb(RunBoost, polys);
+  for (auto _ : state) RunBoost(polys);
+}
+
+// Arguments: (0 star | 1 pocket with 20 islands, number of segments).
+#define CASES ->Args({0, 20000})->Args({0, 100000})->Args({1, 20000})->Unit(benchmark::kMillisecond)
+BENCHMARK(BM_Ours) CASES;
+BENCHMARK(BM_Boost) CASES;
+
+}  // namespace
+
+BENCHMARK_MAIN();

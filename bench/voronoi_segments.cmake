@@ -1,0 +1,1 @@
+zt_bench(bench_voronoi_segments LIBS voronoi NEEDS BOOST)
