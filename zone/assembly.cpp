@@ -1,6 +1,7 @@
 // assemble_zones and merge_level_zones.
 #include "zone/assembly.hpp"
 
+#include <cassert>
 #include <cstring>
 
 #include "regions/boolean.hpp"
@@ -35,6 +36,7 @@ void append_all(const TaggedPointList& from, TaggedPointList& to) {
 // Writes the level output and records its range; -1 when a write failed.
 std::int32_t record_level(ZoneBuilderState& state, ScratchFile& zones,
                           const std::vector<Point2f>& output, std::int32_t& written, float z) {
+  assert(state.resultCount < state.levelCount && "one result range per real level at most");
   const std::int32_t before = written;
   const std::int32_t r =
       write_points(zones, output.data(), static_cast<std::int32_t>(output.size()), written);

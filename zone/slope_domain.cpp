@@ -3,6 +3,7 @@
 #include "zone/slope_domain.hpp"
 
 #include <algorithm>
+#include <cassert>
 #include <cmath>
 #include <limits>
 
@@ -106,6 +107,7 @@ void SlopeDomain::initOutput(std::int32_t curves) {
 }
 
 void SlopeDomain::initCurve(double, double startX, double startY, std::int32_t) {
+  assert(curveStart == -1 && "curves do not nest");
   curveStart = out_->count();
   out_->Add({0, startX, startY});
 }

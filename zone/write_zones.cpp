@@ -1,4 +1,5 @@
 // write_zones: the final zones, top level first, as closed contours.
+#include <cassert>
 #include <vector>
 
 #include "zone/assembly.hpp"
@@ -15,6 +16,7 @@ std::vector<std::pair<std::int32_t, std::int32_t>> split_runs(const Point2f* poi
     if (i == n) return runs;
     const std::int32_t begin = i++;
     while (i < n && points[i].x <= kWriteSeparatorX) ++i;
+    assert(i - begin >= 1 && points[begin].x < kWriteSeparatorX);
     runs.emplace_back(begin, i);
   }
 }
