@@ -223,5 +223,38 @@ TEST(TracedOffsets, BrokenDiagramEndsTheRequestWithFailure) {
   EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
 }
 
+// Every crossed edge but the first turns back onto itself: the walk comes
+// back to an edge it has already crossed at this distance.
+TEST(TracedOffsets, WalkBackOntoACrossedEdgeEndsTheRequestWithFailure) {
+  const auto pts = vdtest::UniformPoints(40, 5, 10.0);
+  vdtest::Store(pts);
+  ASSERT_TRUE(vdtest::ComputePoints());
+  ASSERT_TRUE(VD_ComputeOffsets(3, 1.5, 0.0));
+  const std::int32_t before = GetNumOffsetCurves();
+  vd::Engine& g = vd::Vd();
+  const double t = 1.5 * g.scale;
+  bool first = true;
+  for (std::int32_t e = 4; e < g.edges.count; ++e) {
+    auto& r = g.edges[e];
+    const double r1 = g.nodes[r.n1].r, r2 = g.nodes[r.n2].r;
+    if (r.deleted || !(std::fmin(r1, r2) <= t && t < std::fmax(r1, r2))) continue;
+    if (first) {
+      first = false;  // the edge the sweep starts from
+      continue;
+    }
+    r.s_ccw = r.e_ccw = e;
+  }
+  EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
+  // The failed curve leaves nothing behind; the circles of the request stay.
+  std::int32_t kind, site, tag;
+  double x, y, offset;
+  std::int32_t f, l;
+  for (std::int32_t i = before; i < GetNumOffsetCurves(); ++i) {
+    ASSERT_TRUE(GetOffsetCurve(i, offset, f, l));
+    EXPECT_TRUE(GetOffsetElement(l, kind, site, x, y, tag));
+  }
+  EXPECT_FALSE(GetOffsetElement(vd::Vd().offsetElements.count, kind, site, x, y, tag));
+}
+
 }  // namespace
 }  // namespace zt
