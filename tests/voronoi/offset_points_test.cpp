@@ -60,6 +60,16 @@ TEST(OffsetRequest, NonFiniteOrNegativeDistancesAreRefused) {
   EXPECT_EQ(GetNumOffsetCurves(), 0);
 }
 
+// A step of 1e-10 on a problem of size 1 would mean billions of distances.
+TEST(OffsetRequest, StepTooSmallForTheFamilyIsRefused) {
+  vdtest::Store({{0, 0}, {1, 0}, {0, 1}});
+  ASSERT_TRUE(vdtest::ComputePoints());
+  EXPECT_FALSE(VD_ComputeOffsets(3, 0.1, 1e-10));
+  EXPECT_EQ(GetNumOffsetCurves(), 0);
+  EXPECT_TRUE(VD_ComputeOffsets(3, 0.1, 0.01));
+  EXPECT_GT(GetNumOffsetCurves(), 0);
+}
+
 TEST(OffsetRequest, ZeroDistanceSelectsTheAutomaticOffsets) {
   vdtest::Store({{0, 0}, {10, 0}});
   ASSERT_TRUE(vdtest::ComputePoints());
