@@ -18,7 +18,9 @@ struct ToolRun {
 };
 
 ToolRun Offset(const std::string& text, const std::string& args) {
-  const std::string file = testing::TempDir() + "zt_offset_input.txt";
+  // ctest runs the cases as parallel processes: one input file each.
+  const std::string file = testing::TempDir() + "zt_offset_" +
+                           testing::UnitTest::GetInstance()->current_test_info()->name() + ".txt";
   std::ofstream(file) << text;
   const std::string cmd = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool offset " + file + " " + args + " 2>&1";
   FILE* p = popen(cmd.c_str(), "r");
