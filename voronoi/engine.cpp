@@ -7,6 +7,7 @@
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/offset_state.hpp"
 #include "voronoi/detail/point_insertion.hpp"
 
 namespace zt {
@@ -94,6 +95,7 @@ void VD_Reset() {
   g.markedSites.count = 0;
   g.checkedNodes.count = 0;
   g.offsetNewRequest = true;
+  ResetOffsetState();
   g.offsetCurves.count = 0;
   g.offsetElements.count = 0;
   g.medialAxisComputed = false;
@@ -125,6 +127,7 @@ void VD_Terminate() {
   g.stack.Free();
   g.offsetCurves.Free();
   g.offsetElements.Free();
+  FreeOffsetState();
   ReleaseInsertionScratch();
   g.initialised = false;
 }

@@ -9,6 +9,8 @@
 
 #include <cstdint>
 
+#include "zone/core/points.hpp"
+
 namespace zt {
 
 // False (and nothing changes) when the engine is already initialised.
@@ -40,6 +42,42 @@ void API_ComputeVD(bool writeOutput, bool newInput, bool timing, std::int32_t bo
 
 bool VD_IsUpToDate();
 
+// Traces offset curves at distance t (user units) into the offset store, on
+// side 1 (left of the segments), 2 (right) or 3 (both); side 0 does nothing
+// and succeeds. A t from 0 to 1e-11 selects the automatic distances, a d of
+// 1e-11 or less a single distance; otherwise the family t, t + d, ... below
+// the maximal offset. False when the diagram is not up to date, when t or d
+// is negative or not finite, when d would give more than 100,000 distances,
+// or when a curve could not be traced (a broken diagram).
+bool VD_ComputeOffsets(std::int32_t side, double t, double d);
+// The engine operation behind VD_ComputeOffsets (left and right both false
+// mean both sides). Ends the process when the diagram is not up to date.
+bool API_ComputeOff(bool timing, const char* outputFile, bool write, bool dxfFormat, double t,
+                    double d, bool autoOffset, bool left, bool right);
+
+// Read-out of the offset store. Curves hold their elements contiguously;
+// an element runs from its start point to the next element's (the last one
+// back to the curve's first), so every curve is closed. Element points are
+// in internal coordinates (ToUserCoordinates converts them).
+inline constexpr std::int32_t kOffsetLineKind = 0;       // offset of a segment
+inline constexpr std::int32_t kOffsetPointArcKind = 2;   // arc about a point site
+inline constexpr std::int32_t kOffsetArcInsideKind = 6;  // arc site, inside its circle
+inline constexpr std::int32_t kOffsetArcOutsideKind = 7;
+std::int32_t GetNumOffsetCurves();
+// False (outputs untouched) for an index outside the store.
+bool GetOffsetCurve(std::int32_t i, double& offset, std::int32_t& first, std::int32_t& last);
+// `tag` is always -1: the tag belongs to the site (VD_GetPointTag ...).
+bool GetOffsetElement(std::int32_t k, std::int32_t& kind, std::int32_t& site, double& x, double& y,
+                      std::int32_t& tag);
+void ToUserCoordinates(const Point2d& p, double& x, double& y);
+// Distance at most kCoincidenceDistance (internal units).
+inline constexpr double kCoincidenceDistance = 1e-6;
+bool PointsCoincide(const Point2d& a, const Point2d& b);
+// Centre of a point site / of an arc site, internal coordinates ((0, 0) for
+// an unknown index).
+Point2d VD_GetPointCentre(std::int32_t point);
+Point2d VD_GetArcCentre(std::int32_t arc);
+
 // Largest coordinate magnitude the engine accepts.
 inline constexpr double kMaxInputMagnitude = 1e15;
 
@@ -70,5 +108,6 @@ std::int32_t VD_GetPointCount();
 // The caller's tag of a point or segment site (-1 for an unknown index).
 std::int32_t VD_GetPointTag(std::int32_t point);
 std::int32_t VD_GetSegmentTag(std::int32_t segment);
+std::int32_t VD_GetArcTag(std::int32_t arc);
 
 }  // namespace zt

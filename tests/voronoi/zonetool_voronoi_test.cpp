@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <array>
 #include <cstdio>
@@ -18,7 +19,10 @@ struct ToolRun {
 };
 
 ToolRun Zonetool(const std::string& text) {
-  const std::string file = testing::TempDir() + "zt_voronoi_input.txt";
+  // One file per test and process: ctest runs the cases side by side.
+  const std::string file = testing::TempDir() + "zt_voronoi_" +
+                           testing::UnitTest::GetInstance()->current_test_info()->name() + "_" +
+                           std::to_string(getpid()) + ".txt";
   std::ofstream(file) << text;
   const std::string cmd = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool voronoi " + file + " 2>&1";
   FILE* p = popen(cmd.c_str(), "r");

@@ -1,0 +1,1 @@
+zt_bench(bench_boolean LIBS regions NEEDS CLIPPER)

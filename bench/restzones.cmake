@@ -1,0 +1,5 @@
+zt_bench(bench_restzones LIBS driver NEEDS CLIPPER)
+if(TARGET bench_restzones)
+  target_compile_definitions(bench_restzones PRIVATE ZT_BINARY_DIR="${PROJECT_BINARY_DIR}")
+  add_dependencies(bench_restzones restzones)
+endif()

@@ -1,0 +1,153 @@
+// The main sequence of restzones.
+#include "driver/main_flow.hpp"
+
+#include <array>
+#include <cstdio>
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "driver/detail/result_guard.hpp"
+#include "driver/level_tables.hpp"
+#include "driver/logical_units.hpp"
+#include "driver/message_text.hpp"
+#include "driver/record_files.hpp"
+#include "runtime/error_report.hpp"
+#include "runtime/path_expansion.hpp"
+#include "runtime/progress.hpp"
+#include "zone/entry_points.hpp"
+
+namespace zt {
+
+namespace {
+
+// Width of the driver's file name buffer.
+constexpr std::int32_t kNameWidth = 512;
+// Mode of open_unformatted: read an existing file / create a new one.
+constexpr std::int32_t kOpenRead = 1;
+constexpr std::int32_t kOpenCreate = 2;
+
+constexpr const char* kContourFile = "$TMP/contour.bin";
+constexpr const char* kStockFile = "$TMP/stock1.bin";
+constexpr const char* kResultFile = "$TMP/stock2.bin";
+
+// The driver's static data: level tables, point buffer, name buffer.
+LevelTable g_contourLevels;
+LevelTable g_stockLevels;
+std::vector<Point2f> g_points;
+
+// A blank-padded name of kNameWidth characters, as the record layer takes it.
+class Name {
+ public:
+  explicit Name(const char* text) {
+    buffer_.fill(' ');
+    std::memcpy(buffer_.data(), text, std::strlen(text));
+  }
+  const char* data() const { return buffer_.data(); }
+  const std::int32_t& length() const { return kNameWidth; }
+
+ private:
+  std::array<char, kNameWidth> buffer_;
+};
+
+// Shows a message on the console and in the message file; the run stops.
+RunEnd stop_with(const char* message) {
+  const std::int32_t length = static_cast<std::int32_t>(std::strlen(message));
+  report_message(message, length);
+  return RunEnd::kStopped;
+}
+
+bool exists(const Name& name) {
+  bool found = false;
+  file_exists(name.data(), name.length(), found);
+  return found;
+}
+
+// Scans an existing record file into a level table on a fresh unit.
+void scan_file(const Name& name, LevelTable& table) {
+  const std::int32_t unit = free_unit();
+  std::int32_t ierr = 0;
+  open_unformatted(unit, name.data(), name.length(), kOpenRead, ierr);
+  scan_levels(unit, table);
+  close_unit(unit);
+}
+
+// Levels run from the top down: each z lower than the one before.
+bool runs_top_down(const LevelTable& table) {
+  for (std::size_t i = 1; i < table.z.size(); ++i) {
+    if (!(table.z[i] < table.z[i - 1])) return false;
+  }
+  return true;
+}
+
+// Three list-directed lines: blanks, the banner text, blanks.
+void show_banner() {
+  char text[kMessageBufferWidth];
+  std::int32_t length = 0;
+  message_text(kBannerMessage, text, kMessageBufferWidth, length);
+  std::string out = "        \n ";
+  if (length > 0) out.append(text, static_cast<std::size_t>(length));
+  out += "\n        \n";
+  std::fwrite(out.data(), 1, out.size(), stdout);
+  std::fflush(stdout);
+}
+
+}  // namespace
+
+RunEnd restzones_main() {
+  report_begin("");
+
+  const Name contourName(kContourFile);
+  if (!exists(contourName)) return stop_with(kMsgNoContours);
+  scan_file(contourName, g_contourLevels);
+  if (!runs_top_down(g_contourLevels)) return stop_with(kMsgContoursUnordered);
+
+  std::int32_t ierr = 0;
+  wf_init_czone(g_contourLevels.z.data(), g_contourLevels.count(), ierr);
+  if (ierr != 0) return stop_with(kMsgInitFailed);
+
+  const Name stockName(kStockFile);
+  if (!exists(stockName)) return stop_with(kMsgNoStock);
+  scan_file(stockName, g_stockLevels);
+  if (!runs_top_down(g_stockLevels)) return stop_with(kMsgStockUnordered);
+
+  show_banner();
+  const std::int32_t levels = g_stockLevels.count();
+  progress(levels, 0);
+
+  const std::int32_t stockUnit = free_unit();
+  open_unformatted(stockUnit, stockName.data(), stockName.length(), kOpenRead, ierr);
+  for (std::int32_t i = 1; i <= levels; ++i) {
+    const float z = g_stockLevels.z[static_cast<std::size_t>(i - 1)];
+    std::int32_t first = 0, last = 0;
+    if (find_level(z, g_stockLevels, first, last)) {
+      read_level_points(stockUnit, first, last, g_points);
+      const std::int32_t count = static_cast<std::int32_t>(g_points.size());
+      if (count > kMinLevelRecords) {
+        wf_add_level(z, g_points.data(), count, ierr);
+        if (ierr != 0) return stop_with(kMsgAddFailed);
+      }
+    }
+    progress(levels, i);
+  }
+  close_unit(stockUnit);
+
+  const std::int32_t resultUnit = free_unit();
+  const Name resultName(kResultFile);
+  open_unformatted(resultUnit, resultName.data(), resultName.length(), kOpenCreate, ierr);
+  detail::guard_result(unit_path(resultUnit));
+  wf_fin_czone(g_points, resultUnit, ierr, write_contour);
+  close_unit(resultUnit);
+  detail::release_result();
+
+  if (ierr != 0) {
+    report_message(kMsgFinFailed, static_cast<std::int32_t>(std::strlen(kMsgFinFailed)));
+    std::int32_t status = 0;
+    delete_file(resultName.data(), resultName.length(), status);
+    return RunEnd::kStopped;
+  }
+  report_end();
+  return RunEnd::kNormal;
+}
+
+}  // namespace zt

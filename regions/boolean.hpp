@@ -1,0 +1,38 @@
+// Union, intersection and difference of planar regions bounded by polygons.
+//
+// Input: two TaggedPointLists of contours, each contour ended by a separator
+// (a record with x above 99990; x at or above 99990 never starts one). A
+// contour whose last point repeats its first (within 2^-47) is closed, any
+// other is an open polyline. Closed contours bound their region on their left:
+// counter-clockwise outer boundaries, clockwise holes. Self-intersections
+// within one operand are not resolved. Every coordinate must be finite and at
+// most 1e15 in magnitude.
+//
+// Output: the result contours, each followed by one separator (tag
+// -100000000, x = y = 99999): first the contours that meet the other operand
+// nowhere and are kept whole (A's, then B's), then the contours chained from
+// cut pieces. Union and intersection give counter-clockwise outer boundaries
+// and clockwise holes. A difference contour runs in the direction of the
+// piece its chain starts from: clockwise when that is a piece of B (the two
+// overlapping squares), counter-clockwise when it is one of A; contours kept
+// whole keep their input orientation. Every point carries the tag of the
+// input edge it lies on; where the tag changes, the point is written once
+// with each tag. Consecutive points closer than 1e-7 with one tag are merged.
+//
+// Returns 0, or -1 on failure: a null result, an unknown operation, an operand
+// without any edge, bad coordinates, exhausted storage, or an inconsistent
+// overlay. A failure before the classification leaves the result untouched;
+// a later one leaves what had been written. The operands are read completely
+// before the result is touched, so the result may be either operand.
+// One operation per thread at a time; each thread keeps its own engine.
+#pragma once
+
+#include "zone/core/points.hpp"
+
+namespace zt {
+
+// op: its first character, in either case, selects U union, I intersection,
+// D difference a minus b.
+int rg_boolean(const TaggedPointList& a, const TaggedPointList& b, const char* op, TaggedPointList* result);
+
+}  // namespace zt

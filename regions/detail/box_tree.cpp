@@ -1,0 +1,172 @@
+// Finishing a polygon set: its contours' points become grid vertices, its
+// consecutive distinct vertices edges with integer boxes, and the boxes are
+// indexed by a box tree split at the median of the longer side.
+#include <algorithm>
+#include <cmath>
+#include <new>
+#include <utility>
+
+#include "regions/detail/engine.hpp"
+
+namespace zt::detail {
+
+std::int32_t box_coordinate(double v, std::int32_t pad) {
+  double f = kBoxUnitsPerSquare * v;
+  if (!(f > -kIndexClamp)) f = std::isnan(f) ? 0.0 : -kIndexClamp;
+  if (f > kIndexClamp) f = kIndexClamp;
+  // floor by truncation, one step down for negative non-integers
+  std::int32_t i = static_cast<std::int32_t>(f);
+  if (i > f) --i;
+  return i + pad;
+}
+
+namespace {
+
+int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
+  Edge* edge = e.edges.take();
+  if (!edge) return -1;
+  *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
+  EdgeBox* box = e.boxes.take();
+  if (!box) return -1;
+  const bool xUp = from->x < to->x, yUp = from->y < to->y;
+  box->xmin = box_coordinate(xUp ? from->x : to->x, -1);
+  box->xmax = box_coordinate(xUp ? to->x : from->x, 1);
+  box->ymin = box_coordinate(yUp ? from->y : to->y, -1);
+  box->ymax = box_coordinate(yUp ? to->y : from->y, 1);
+  box->edge = edge;
+  return 0;
+}
+
+template <bool kByX>
+int key_of(const EdgeBox& b) {
+  return kByX ? b.xmin : b.ymin;
+}
+
+template <bool kByX>
+std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m) {
+  std::int64_t comparisons = 0;
+  // Hoare partitions around the key at m; both scans stop on keys equal to
+  // the pivot and swap them, so runs of equal keys split evenly instead of
+  // degrading into one-element steps.
+  while (hi - lo >= kLeafSpan) {
+    const int pivot = key_of<kByX>(boxes[m]);
+    std::int32_t i = lo, j = hi;
+    while (i <= j) {
+      while (++comparisons, key_of<kByX>(boxes[i]) < pivot) ++i;
+      while (++comparisons, key_of<kByX>(boxes[j]) > pivot) --j;
+      if (i <= j) {
+        std::swap(boxes[i], boxes[j]);
+        ++i;
+        --j;
+      }
+    }
+    if (m <= j) {
+      hi = j;
+    } else if (m >= i) {
+      lo = i;
+    } else {
+      return comparisons;  // m lies in a run equal to the pivot
+    }
+  }
+  for (std::int32_t p = lo; p <= m; ++p) {
+    std::int32_t best = p;
+    for (std::int32_t q = p + 1; q <= hi; ++q) {
+      ++comparisons;
+      if (key_of<kByX>(boxes[q]) < key_of<kByX>(boxes[best])) best = q;
+    }
+    if (best != p) std::swap(boxes[p], boxes[best]);
+  }
+  return comparisons;
+}
+
+// Builds the node over boxes[first..last] of the scratch copy; `base` is the
+// pool index of the scratch's first box, so node ranges are pool indexes.
+BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std::int32_t first,
+                        std::int32_t last) {
+  BoxTreeNode* node = e.nodes.take();
+  if (!node) return nullptr;
+  *node = BoxTreeNode{};
+  node->first = base + first;
+  node->last = base + last;
+  const EdgeBox& b0 = boxes[first];
+  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
+  std::int32_t xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
+  for (std::int32_t i = first + 1; i <= last; ++i) {
+    const EdgeBox& b = boxes[i];
+    xmin = std::min(xmin, b.xmin);
+    ymin = std::min(ymin, b.ymin);
+    xmax = std::max(xmax, b.xmax);
+    ymax = std::max(ymax, b.ymax);
+  }
+  node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
+  if (last - first <= kLeafSpan) return node;
+  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
+  const std::int32_t m = first + (last - first) / 2;
+  select_median(boxes, first, last, m, byX);
+  node->low = build_node(e, boxes, base, first, m);
+  if (!node->low) return nullptr;
+  node->high = build_node(e, boxes, base, m + 1, last);
+  if (!node->high) return nullptr;
+  return node;
+}
+
+// The tree is built on a contiguous copy of the set's boxes (the selection
+// moves them a lot), which is then written back in its new order.
+int build_tree(BooleanEngine& e, PolygonSet& set) {
+  const std::int32_t n = set.lastBox - set.firstBox + 1;
+  if (n > e.boxScratchCapacity) {
+    delete[] e.boxScratch;
+    e.boxScratch = nullptr;
+    e.boxScratchCapacity = 0;
+    if (!allocationAllowed()) return -1;
+    e.boxScratch = new (std::nothrow) EdgeBox[static_cast<std::size_t>(n)];
+    if (!e.boxScratch) return -1;
+    e.boxScratchCapacity = n;
+  }
+  for (std::int32_t i = 0; i < n; ++i) e.boxScratch[i] = e.boxes[set.firstBox + i];
+  set.root = build_node(e, e.boxScratch, set.firstBox, 0, n - 1);
+  for (std::int32_t i = 0; i < n; ++i) e.boxes[set.firstBox + i] = e.boxScratch[i];
+  return set.root ? 0 : -1;
+}
+
+}  // namespace
+
+std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
+  return byX ? select_on_axis<true>(boxes, lo, hi, m) : select_on_axis<false>(boxes, lo, hi, m);
+}
+
+int finish_set(BooleanEngine& e, PolygonSet& set) {
+  set.firstBox = e.boxes.count();
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) {
+    InputContour& c = set.contours[ci];
+    c.firstEdge = e.edges.count();
+    Vertex* firstVertex = nullptr;
+    Vertex* prev = nullptr;
+    std::int32_t prevTag = 0;
+    bool failed = false;
+    for_each_stored_point(c, [&](const TaggedPoint& p) {
+      if (failed) return;
+      Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
+      if (!v) {
+        failed = true;
+        return;
+      }
+      if (!firstVertex) {
+        firstVertex = v;
+      } else if (v != prev && append_edge(e, prev, v, prevTag) != 0) {
+        failed = true;
+        return;
+      }
+      prev = v;
+      prevTag = p.tag;
+    });
+    if (failed) return -1;
+    if (c.closed && prev != firstVertex && append_edge(e, prev, firstVertex, prevTag) != 0) return -1;
+    c.endEdge = e.edges.count();
+  }
+  set.lastBox = e.boxes.count() - 1;
+  if (set.lastBox < set.firstBox) return -1;
+  return build_tree(e, set);
+}
+
+}  // namespace zt::detail

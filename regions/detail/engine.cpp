@@ -1,0 +1,86 @@
+// The per-thread engine: created on the first operation of a thread, reset at
+// the start of every later one, its storage kept until the thread ends.
+#include <memory>
+#include <new>
+
+#include "regions/detail/engine.hpp"
+#include "regions/detail/geometry.hpp"
+
+namespace zt::detail {
+
+BooleanEngine::BooleanEngine() {
+  a.owner = 1;
+  b.owner = 2;
+  probe.intersect = &segment_intersection;
+  probe.cross = &ray_crossing;
+  probe.grid = &grid;
+  probe.splits = &splits;
+  probe.eps = eps;
+  grid.eps = eps;
+}
+
+BooleanEngine::~BooleanEngine() {
+  reset_set(*this, a);
+  reset_set(*this, b);
+  while (freeBlocks) {
+    PointBlock* next = freeBlocks->next;
+    delete[] freeBlocks->points;
+    delete freeBlocks;
+    freeBlocks = next;
+  }
+  delete grid.vertices;
+  delete[] grid.buckets;
+  delete[] boxScratch;
+  delete[] splitScratch;
+}
+
+void reset_set(BooleanEngine& e, PolygonSet& set) {
+  for (std::int32_t i = 0; i < set.contours.count(); ++i) {
+    InputContour& c = set.contours[i];
+    // Hand the contour's blocks back to the engine's free list.
+    PointBlock* blk = c.firstBlock;
+    while (blk) {
+      PointBlock* next = blk->next;
+      blk->next = e.freeBlocks;
+      e.freeBlocks = blk;
+      blk = next;
+    }
+    c = InputContour{};
+  }
+  set.contours.reset();
+  set.root = nullptr;
+  set.firstBox = 0;
+  set.lastBox = -1;
+}
+
+namespace {
+
+// Frees the engine when its thread ends; the engine itself lives as long as
+// the thread, as every operation of the thread reuses its storage.
+struct ThreadEngineHolder {
+  std::unique_ptr<BooleanEngine> engine;
+};
+thread_local ThreadEngineHolder tl_engine;
+
+}  // namespace
+
+BooleanEngine* prepare_thread_engine() {
+  if (!tl_engine.engine) {
+    if (!allocationAllowed()) return nullptr;
+    tl_engine.engine.reset(new (std::nothrow) BooleanEngine());
+    return tl_engine.engine.get();
+  }
+  BooleanEngine& e = *tl_engine.engine;
+  reset_set(e, e.a);
+  reset_set(e, e.b);
+  e.edges.reset();
+  e.boxes.reset();
+  e.nodes.reset();
+  e.halves.reset();
+  e.splits.reset();
+  e.stars.reset();
+  clear_grid(e.grid);
+  return &e;
+}
+
+}  // namespace zt::detail

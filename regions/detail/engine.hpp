@@ -1,0 +1,213 @@
+// The Boolean engine's state and the stages that work on it, in the order an
+// operation runs them:
+//   operands      bounding box, normalisation, snapping, reading contours
+//   vertex_grid   merging of points closer than the engine tolerance
+//   box_tree      edges, integer boxes and the median-split box trees
+//   intersections dual box-tree walk (with geometry.hpp)
+//   split_lists   the crossings on each edge, settled into sorted lists
+//   half_edges    cut contours as twin half-edges with contour links
+//   stars         angular sweep at shared vertices, keep propagation, pairing
+//   whole_contours ray parity of contours that meet the other operand nowhere
+//   emission      kept pieces chained into contours for the OutputCollector
+// One engine per thread; it keeps its storage from one operation to the next.
+#pragma once
+
+#include <cstdint>
+
+#include "regions/detail/pool.hpp"
+#include "regions/detail/records.hpp"
+#include "zone/core/points.hpp"
+
+namespace zt::detail {
+
+// Coordinates are snapped to multiples of this quantum before normalisation.
+inline constexpr double kSnapQuantum = 0x1p-48;
+// Engine tolerance: points closer than this (normalised, per coordinate)
+// are one vertex; also the closing-duplicate tolerance in input units.
+inline constexpr double kEngineEpsilon = 2 * kSnapQuantum;
+// A record with x above this ends a contour; one at or above it never starts one.
+inline constexpr double kSeparatorThreshold = 99990.0;
+// Grid cell and box unit: 1/1000 of the normalised square.
+inline constexpr double kGridCell = 0.001;
+inline constexpr double kBoxUnitsPerSquare = 1000.0;
+// Cells of the vertex index proper: fine enough that densely sampled
+// contours put only a few points in one, and laid onto the bucket table in
+// tiles of 2^kFineTileBits cells a side so that neighbours share cache lines.
+inline constexpr double kFineCell = 0x1p-14;
+inline constexpr std::uint64_t kFineTileBits = 9;
+inline constexpr std::int32_t kMinFineBuckets = 1024;
+// Cell indexes and box bounds are clamped to this magnitude so that points far
+// outside the normalised square (read, but not counted by the bounding box)
+// still give well-defined integer keys.
+inline constexpr double kIndexClamp = 1073741824.0;  // 2^30
+// A box-tree node holding at most this many boxes beyond its first is a leaf.
+inline constexpr std::int32_t kLeafSpan = 20;
+// Upper x bound of a ray query box (box units).
+inline constexpr std::int32_t kRayBoxXmax = 99999001;
+// Inputs beyond this magnitude (or not finite) are refused.
+inline constexpr double kMaxInputMagnitude = 1e15;
+
+using EdgePool = ChunkPool<Edge>;
+using BoxPool = ChunkPool<EdgeBox>;
+using NodePool = ChunkPool<BoxTreeNode>;
+using HalfEdgePool = ChunkPool<HalfEdge>;
+using SplitPool = ChunkPool<SplitPoint>;
+using StarPool = ChunkPool<StarEntry, 10, 10>;
+using VertexPool = ChunkPool<Vertex>;
+using ContourPool = ChunkPool<InputContour>;
+
+// Vertices are found through a hash of fine cells, so a lookup costs about
+// the same however densely the contours are sampled. Which vertex a lookup
+// returns when several lie within the tolerance is ruled by the 1/1000
+// grid: the first grid cell, column by column and row by row, that holds
+// one, and within it the vertex created last.
+struct VertexGrid {
+  std::int32_t bucketMask = 0;  // bucket count - 1, a power of two
+  VertexPool* vertices = nullptr;  // created at the first sizing
+  Vertex** buckets = nullptr;
+  Vertex* sharedHead = nullptr;
+  double originX = 0.0, originY = 0.0;
+  double cell = kGridCell;
+  double eps = kEngineEpsilon;
+};
+
+// Direction of a segment: its vector and length.
+struct SegmentDirection {
+  double dx = 0.0, dy = 0.0, length = 0.0;
+};
+
+struct IntersectionProbe {
+  std::int32_t crossingCount = 0;
+  std::int32_t mode = 1;  // 1 intersect, 0 count crossings
+  double qx = 0.0, qy = 0.0;
+  double eps = kEngineEpsilon;
+  SegmentDirection dirA, dirB;
+  Point2d p0, p1, q0, q1, r1, r2;
+  int (*intersect)(const Point2d&, const Point2d&, const Point2d&, const Point2d&, Point2d&,
+                   Point2d&, SegmentDirection&, SegmentDirection&, double) = nullptr;
+  int (*cross)(double, double, double, double, double, double, double) = nullptr;
+  VertexGrid* grid = nullptr;
+  SplitPool* splits = nullptr;
+  std::int32_t retryReversed = 0;
+};
+
+struct SplitCandidate {
+  double t = 0.0;
+  std::int32_t order = 0;  // place in the order the crossings were found
+  std::int32_t accepted = 0;
+  SplitPoint* split = nullptr;
+};
+
+struct PolygonSet {
+  std::int32_t owner = 0;
+  ContourPool contours;
+  BoxTreeNode* root = nullptr;
+  std::int32_t firstBox = 0;
+  std::int32_t lastBox = -1;
+};
+
+struct BooleanEngine {
+  PolygonSet a, b;
+  EdgePool edges;
+  BoxPool boxes;
+  NodePool nodes;
+  HalfEdgePool halves;
+  SplitPool splits;
+  StarPool stars;
+  PointBlock* freeBlocks = nullptr;
+  BoxTreeNode queryBox;
+  IntersectionProbe probe;
+  VertexGrid grid;
+  // Contiguous copy of one set's boxes while its tree is built.
+  EdgeBox* boxScratch = nullptr;
+  std::int32_t boxScratchCapacity = 0;
+  // The crossings found on one edge while its split list is settled.
+  SplitCandidate* splitScratch = nullptr;
+  std::int32_t splitScratchCapacity = 0;
+  double eps = kEngineEpsilon;
+  double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
+
+  BooleanEngine();
+  ~BooleanEngine();
+  BooleanEngine(const BooleanEngine&) = delete;
+  BooleanEngine& operator=(const BooleanEngine&) = delete;
+};
+
+// ---- engine (engine.cpp)
+// The calling thread's engine, created on first use and reset for a new
+// operation (sets, pools, grid contents); null if it cannot be created.
+BooleanEngine* prepare_thread_engine();
+void reset_set(BooleanEngine& e, PolygonSet& set);
+
+// ---- operands (operands.cpp)
+struct BoundingBox {
+  double minX = 99999.0, minY = 99999.0, maxX = -99999.0, maxY = -99999.0;
+  std::int32_t count = 0;
+};
+bool is_separator_record(const TaggedPoint& p);
+// False when a coordinate is not finite or beyond kMaxInputMagnitude.
+bool operand_is_sane(const TaggedPointList& list);
+BoundingBox scan_bounding_box(const TaggedPointList& a, const TaggedPointList& b);
+void set_normalisation(BooleanEngine& e, const BoundingBox& box);
+double snap_coordinate(double v);
+// Reads one operand into its set and finishes the set (vertices, edges, tree).
+int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner);
+bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p);
+template <typename F>
+void for_each_stored_point(const InputContour& c, F&& f) {
+  std::int32_t i = 0;
+  for (const PointBlock* b = c.firstBlock; b && i < c.pointCount; b = b->next) {
+    const std::int32_t blockStart = b->end - kPointBlockSize;
+    for (; i < c.pointCount && i < b->end; ++i) f(b->points[i - blockStart]);
+  }
+}
+
+// ---- vertex grid (vertex_grid.cpp)
+std::int32_t grid_bucket_count_for(std::int32_t pointCount);
+int size_grid(VertexGrid& g, std::int32_t pointCount);
+void clear_grid(VertexGrid& g);
+// The vertex within eps of (x, y), made shared when met by another owner, or a
+// new one; null on storage failure.
+Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// Bucket of a fine cell, never outside the table whatever the cell's sign.
+std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column);
+// Cell of a coordinate, clamped to +-kIndexClamp.
+std::int64_t grid_cell_index(double v, double origin, double cell);
+
+// ---- edges and box trees (box_tree.cpp)
+int finish_set(BooleanEngine& e, PolygonSet& set);
+std::int32_t box_coordinate(double v, std::int32_t pad);
+// Reorders boxes[lo..hi] so that position m holds the key of rank m; returns
+// the number of key comparisons made (for the linear-time checks).
+std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX);
+inline bool boxes_overlap(std::int32_t axmin, std::int32_t aymin, std::int32_t axmax, std::int32_t aymax,
+                          std::int32_t bxmin, std::int32_t bymin, std::int32_t bxmax, std::int32_t bymax) {
+  return axmin < bxmax && axmax > bxmin && aymin < bymax && aymax > bymin;
+}
+
+// ---- overlay (intersections.cpp, half_edges.cpp)
+int find_intersections(BooleanEngine& e);
+// Crossings are recorded on their edges as they are found, then each edge's
+// list is settled: taken in the order found, a crossing is kept unless one
+// kept before lies within eps in t; the kept ones sorted by ascending t.
+int record_split(SplitPool& pool, Edge& edge, double t, Vertex* v);
+int settle_splits(BooleanEngine& e, Edge& edge, double eps);
+int build_half_edges(BooleanEngine& e, PolygonSet& set);
+bool contour_has_splits(BooleanEngine& e, InputContour& c);
+
+// ---- classification (stars.cpp, whole_contours.cpp)
+double pseudo_angle(double c, double s);
+int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t keepBInsideA);
+void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag);
+// Crossings of the ray from (px, py) towards +x with the set's edges.
+std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py);
+
+// ---- emission (emission.cpp)
+int emit_result(BooleanEngine& e);
+
+// ---- debug validator (validate.cpp)
+// Checks the overlay's invariants that are cheap to check; after the star
+// classification also that kept half-edges at shared vertices are paired.
+bool overlay_is_consistent(BooleanEngine& e, bool afterStars);
+
+}  // namespace zt::detail

@@ -1,0 +1,99 @@
+// The fixed-size records of the overlay graph. They come from the engine's
+// pools, are addressed by pointer, and never move while an operation runs.
+#pragma once
+
+#include <cstdint>
+
+#include "zone/core/points.hpp"
+
+namespace zt::detail {
+
+struct HalfEdge;
+struct SplitPoint;
+
+// Owner of a vertex met by both operands, or created at a crossing.
+inline constexpr std::int32_t kSharedOwner = 300;
+// Keep marks of half-edges and star entries.
+inline constexpr std::int32_t kUndecided = -1;
+// Emission mark of a written half-edge, and direction mark of a paired star entry.
+inline constexpr std::int32_t kDoneMark = 400;
+
+struct Vertex {
+  std::int32_t owner = 0;  // 1, 2, or kSharedOwner
+  double x = 0.0;          // normalised coordinates
+  double y = 0.0;
+  std::int32_t serial = 0;  // creation order within the operation
+  Vertex* nextInBucket = nullptr;
+  Vertex* nextShared = nullptr;
+  HalfEdge* firstOut = nullptr;
+};
+
+struct Edge {
+  Vertex* start = nullptr;
+  Vertex* end = nullptr;
+  SplitPoint* splits = nullptr;  // ascending t
+  std::uint32_t tag = 0;
+};
+
+// Box of an edge in integer units of 1/1000 of the normalised square.
+struct EdgeBox {
+  std::int32_t xmin = 0, ymin = 0, xmax = 0, ymax = 0;
+  Edge* edge = nullptr;
+};
+
+struct BoxTreeNode {
+  std::int32_t xmin = 0, ymin = 0, xmax = 0, ymax = 0;
+  BoxTreeNode* low = nullptr;  // both null in a leaf
+  BoxTreeNode* high = nullptr;
+  std::int32_t first = 0;  // inclusive range of box indexes
+  std::int32_t last = -1;
+};
+
+struct SplitPoint {
+  double t = 0.0;
+  Vertex* vertex = nullptr;
+  SplitPoint* next = nullptr;
+};
+
+struct HalfEdge {
+  std::int32_t side = 0;  // +owner along its contour, -owner against it
+  std::int32_t keep = kUndecided;
+  std::int32_t emitted = -1;
+  Vertex* origin = nullptr;
+  HalfEdge* twin = nullptr;
+  HalfEdge* nextOut = nullptr;
+  HalfEdge* link = nullptr;  // contour continuation, or output partner at a shared vertex
+  Edge* edge = nullptr;
+};
+
+struct StarEntry {
+  std::int32_t direction = 0;  // +1 / -1 kept, 0 dropped, kDoneMark once paired
+  std::int32_t keep = 0;
+  double angle = 0.0;
+  HalfEdge* half = nullptr;
+  StarEntry* next = nullptr;
+};
+
+inline constexpr std::int32_t kPointBlockSize = 512;
+
+struct PointBlock {
+  std::int32_t end = 0;  // the contour's capacity just after this block was added
+  TaggedPoint* points = nullptr;
+  PointBlock* next = nullptr;
+};
+
+struct InputContour {
+  std::int32_t firstEdge = -1;
+  std::int32_t endEdge = -1;  // exclusive
+  std::int32_t hasSplits = -1;
+  std::int32_t keepWhole = 0;
+  std::int32_t closed = 1;
+  std::int32_t pointCount = 0;
+  std::int32_t capacity = 0;
+  PointBlock* firstBlock = nullptr;
+  PointBlock* currentBlock = nullptr;
+  HalfEdge* firstHalf = nullptr;
+  HalfEdge* lastHalf = nullptr;
+};
+
+}  // namespace zt::detail

@@ -1,0 +1,132 @@
+// The vertex grid: merges points closer than the engine tolerance into one
+// vertex and marks the vertices met by both operands (or by a crossing) as
+// shared. Candidates are found through a hash of fine cells; the choice
+// among several candidates follows the 1/1000 grid's scan order (see
+// VertexGrid), so the result does not depend on the fine cells.
+#include <cmath>
+#include <new>
+
+#include "regions/detail/engine.hpp"
+
+namespace zt::detail {
+
+std::int32_t grid_bucket_count_for(std::int32_t pointCount) {
+  std::int64_t n = kMinFineBuckets;
+  while (n < pointCount && n < (std::int64_t{1} << 30)) n *= 2;
+  return static_cast<std::int32_t>(n);
+}
+
+void clear_grid(VertexGrid& g) {
+  for (std::int32_t i = 0; g.buckets && i <= g.bucketMask; ++i) g.buckets[i] = nullptr;
+  g.sharedHead = nullptr;
+  if (g.vertices) g.vertices->reset();
+}
+
+int size_grid(VertexGrid& g, std::int32_t pointCount) {
+  g.cell = kGridCell;
+  g.originX = g.originY = 0.0 - g.cell;
+  const std::int32_t wanted = grid_bucket_count_for(pointCount);
+  if (!g.buckets || wanted > g.bucketMask + 1) {
+    delete[] g.buckets;
+    g.buckets = nullptr;
+    g.bucketMask = 0;
+    if (!allocationAllowed()) return -1;
+    g.buckets = new (std::nothrow) Vertex*[static_cast<std::size_t>(wanted)];
+    if (!g.buckets) return -1;
+    g.bucketMask = wanted - 1;
+  }
+  if (!g.vertices) {
+    if (!allocationAllowed()) return -1;
+    g.vertices = new (std::nothrow) VertexPool();
+    if (!g.vertices) return -1;
+  }
+  clear_grid(g);
+  return 0;
+}
+
+std::int64_t grid_cell_index(double v, double origin, double cell) {
+  double c = std::trunc((v - origin) / cell);
+  if (std::isnan(c)) c = 0.0;
+  if (c > kIndexClamp) c = kIndexClamp;
+  if (c < -kIndexClamp) c = -kIndexClamp;
+  return static_cast<std::int64_t>(c);
+}
+
+std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column) {
+  // Square tiles of cells laid side by side in the table, the tiles wrapped
+  // round it; unsigned arithmetic, so negative cells (points read outside
+  // the square) wrap like any other.
+  const std::uint64_t tile = (std::uint64_t{1} << kFineTileBits) - 1;
+  const std::uint64_t r = static_cast<std::uint64_t>(row), c = static_cast<std::uint64_t>(column);
+  const std::uint64_t key = ((r & tile) << kFineTileBits | (c & tile)) +
+                            ((r >> kFineTileBits) * 0x9E3779B1u + (c >> kFineTileBits)) * (tile + 1) * (tile + 1);
+  return static_cast<std::int32_t>(key & static_cast<std::uint64_t>(g.bucketMask));
+}
+
+namespace {
+
+// Fine cell of a coordinate (the cell is a power of two, so the product is
+// exact), clamped like grid_cell_index; truncation by the conversion.
+std::int64_t fine_index(double v) {
+  double c = v * (1.0 / kFineCell);
+  if (!(c > -kIndexClamp)) c = std::isnan(c) ? 0.0 : -kIndexClamp;
+  if (c > kIndexClamp) c = kIndexClamp;
+  return static_cast<std::int64_t>(c);
+}
+
+void make_shared(VertexGrid& g, Vertex* v) {
+  v->owner = kSharedOwner;
+  v->nextShared = g.sharedHead;
+  g.sharedHead = v;
+}
+
+}  // namespace
+
+Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner) {
+  const std::int64_t f0 = fine_index(x - g.eps), f1 = fine_index(x + g.eps);
+  const std::int64_t q0 = fine_index(y - g.eps), q1 = fine_index(y + g.eps);
+  Vertex* best = nullptr;
+  std::int64_t bestRank = 0;
+  std::int64_t c0 = 0, r0 = 0, rows = 0;
+  for (std::int64_t col = f0; col <= f1; ++col) {
+    for (std::int64_t row = q0; row <= q1; ++row) {
+      for (Vertex* v = g.buckets[grid_bucket_of(g, row, col)]; v; v = v->nextInBucket) {
+        if (!(std::fabs(x - v->x) < g.eps && std::fabs(y - v->y) < g.eps)) continue;
+        if (!best) {
+          c0 = grid_cell_index(x - g.eps, g.originX, g.cell);
+          r0 = grid_cell_index(y - g.eps, g.originY, g.cell);
+          rows = grid_cell_index(y + g.eps, g.originY, g.cell) - r0 + 1;
+        }
+        // Position of the vertex's 1/1000 cell in the scan, column-major.
+        const std::int64_t rank = (grid_cell_index(v->x, g.originX, g.cell) - c0) * rows +
+                                  (grid_cell_index(v->y, g.originY, g.cell) - r0);
+        if (!best || rank < bestRank || (rank == bestRank && v->serial > best->serial)) {
+          best = v;
+          bestRank = rank;
+        }
+      }
+    }
+  }
+  if (best) {
+    if (best->owner != kSharedOwner && best->owner != owner) make_shared(g, best);
+    return best;
+  }
+  const std::int32_t serial = g.vertices->count();
+  Vertex* v = g.vertices->take();
+  if (!v) return nullptr;
+  *v = Vertex{};
+  v->owner = owner;
+  v->x = x;
+  v->y = y;
+  v->serial = serial;
+  Vertex*& head = g.buckets[grid_bucket_of(g, fine_index(y), fine_index(x))];
+  v->nextInBucket = head;
+  head = v;
+  if (owner == kSharedOwner) {
+    v->nextShared = g.sharedHead;
+    g.sharedHead = v;
+  }
+  return v;
+}
+
+}  // namespace zt::detail

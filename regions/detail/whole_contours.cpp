@@ -1,0 +1,59 @@
+// Contours that meet the other operand nowhere are kept or dropped whole, by
+// the parity of the crossings of a ray from their first point towards +x with
+// the other operand's edges.
+#include <cmath>
+
+#include "regions/detail/engine.hpp"
+
+namespace zt::detail {
+
+namespace {
+
+void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
+  const BoxTreeNode& q = e.queryBox;
+  if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, node->xmin, node->ymin, node->xmax, node->ymax)) return;
+  if (node->low) {
+    count_in_node(e, node->low);
+    count_in_node(e, node->high);
+    return;
+  }
+  IntersectionProbe& pr = e.probe;
+  for (std::int32_t i = node->first; i <= node->last; ++i) {
+    const EdgeBox& b = e.boxes[i];
+    if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, b.xmin, b.ymin, b.xmax, b.ymax)) continue;
+    const Edge& edge = *b.edge;
+    pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
+  }
+}
+
+}  // namespace
+
+std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py) {
+  IntersectionProbe& pr = e.probe;
+  pr.mode = 0;
+  pr.crossingCount = 0;
+  pr.qx = px;
+  pr.qy = py;
+  BoxTreeNode& q = e.queryBox;
+  q.xmin = box_coordinate(px, -1);
+  q.ymin = box_coordinate(py, -1);
+  q.xmax = kRayBoxXmax;
+  q.ymax = box_coordinate(py, 1);
+  if (set.root) count_in_node(e, set.root);
+  return pr.crossingCount;
+}
+
+void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag) {
+  for (std::int32_t ci = 0; ci < x.contours.count(); ++ci) {
+    InputContour& c = x.contours[ci];
+    if (contour_has_splits(e, c)) {
+      c.keepWhole = 0;
+      continue;
+    }
+    const TaggedPoint& p = c.firstBlock->points[0];
+    const std::int32_t parity = count_ray_crossings(e, y, p.x, p.y) % 2;
+    c.keepWhole = flag == 1 ? parity : 1 - parity;
+  }
+}
+
+}  // namespace zt::detail

@@ -1,0 +1,96 @@
+// Cleaning of the input: sorting, duplicate points, degenerate and duplicate
+// segments with their ends following their points; the cross-reference of
+// segment ends; segment line data.
+#include <gtest/gtest.h>
+
+#include <cfloat>
+#include <cmath>
+
+#include "vd_test_util.hpp"
+#include "voronoi/detail/preprocess.hpp"
+
+namespace zt {
+namespace {
+
+using namespace vd;
+
+// Stores points and segments as a caller would, with dummy slots in place.
+void StoreSites(const std::vector<vdtest::Pt>& pts, const std::vector<std::pair<int, int>>& segs) {
+  vdtest::Store(pts);
+  for (auto [a, b] : segs) ASSERT_GE(API_AddSegment(a + 2, b + 2, 100 + a), 0);
+  AddDummySlots();
+}
+
+// The coordinates at both ends of every segment, in segment order.
+std::vector<double> SegmentEnds() {
+  const Engine& g = Vd();
+  std::vector<double> v;
+  for (std::int32_t s = 0; s < g.segments.count; ++s) {
+    const PointRecord& a = g.points[g.segments[s].i1];
+    const PointRecord& b = g.points[g.segments[s].i2];
+    v.insert(v.end(), {a.x, a.y, b.x, b.y});
+  }
+  return v;
+}
+
+TEST(Cleaning, SortRemovesDuplicatesAndSegmentEndsFollowTheirPoints) {
+  // A closed square that repeats its first point, stored unsorted.
+  StoreSites({{1, 1}, {0, 1}, {0, 0}, {1, 0}, {1, 1}, {0.5, 0.5}},
+             {{0, 1}, {1, 2}, {2, 3}, {3, 4}});
+  const std::vector<double> before = SegmentEnds();
+  CleanInput(false);
+  const Engine& g = Vd();
+  EXPECT_EQ(g.points.count, 2 + 5 + 2);
+  EXPECT_EQ(g.duplicatePoints, 1);
+  EXPECT_EQ(SegmentEnds(), before);
+  for (std::int32_t i = 1; i < g.points.count; ++i)
+    EXPECT_TRUE(g.points[i - 1].x < g.points[i].x ||
+                (g.points[i - 1].x == g.points[i].x && g.points[i - 1].y < g.points[i].y));
+  EXPECT_EQ(g.points[0].x, -DBL_MAX);
+  EXPECT_EQ(g.points[g.points.count - 1].y, DBL_MAX);
+  // The segment closing the square ends where the first one starts.
+  EXPECT_EQ(g.segments[3].i2, g.segments[0].i1);
+}
+
+TEST(Cleaning, DegenerateAndDuplicateSegmentsGo) {
+  StoreSites({{0, 0}, {1, 0}, {1, 0}, {2, 5}}, {{0, 1}, {1, 2}, {1, 0}, {2, 3}, {0, 1}});
+  CleanInput(true);
+  const Engine& g = Vd();
+  // (1,2) joins two copies of one point; (1,0) and the second (0,1) repeat (0,1).
+  EXPECT_EQ(g.segments.count, 2);
+  EXPECT_EQ(g.removedSegments, 3);
+  for (std::int32_t s = 0; s < g.segments.count; ++s) EXPECT_NE(g.segments[s].i1, g.segments[s].i2);
+  // Without the segment sorting only the degenerate one goes.
+  StoreSites({{0, 0}, {1, 0}, {1, 0}, {2, 5}}, {{0, 1}, {1, 2}, {1, 0}, {2, 3}, {0, 1}});
+  CleanInput(false);
+  EXPECT_EQ(Vd().segments.count, 4);
+}
+
+TEST(Cleaning, CrossReferenceRedirectsEveryEndOfAPoint) {
+  StoreSites({{0, 0}, {1, 0}, {2, 0}, {1, 0}}, {{0, 1}, {1, 2}, {3, 0}, {2, 3}});
+  BuildCrossReference();
+  RedirectSegmentEnds(5, 3);  // engine index of the fourth point onto the second
+  const Engine& g = Vd();
+  EXPECT_EQ(g.segments[2].i1, 3);
+  EXPECT_EQ(g.segments[3].i2, 3);
+  EXPECT_EQ(g.segments[0].i2, 3);
+  EXPECT_FALSE(g.xrefBuilt);  // stale after a redirection
+}
+
+TEST(Cleaning, SegmentLineDataHasTheUnitNormalToTheLeft) {
+  StoreSites({{1, 1}, {4, 5}, {2, 2}, {2, 2 + 1e-12}}, {{0, 1}, {2, 3}});
+  Engine& g = Vd();
+  g.restartPending = false;
+  ComputeSegmentLineData();
+  const SegmentRecord& s = g.segments[0];
+  EXPECT_DOUBLE_EQ(s.length, 5.0);
+  EXPECT_DOUBLE_EQ(s.a, -0.8);
+  EXPECT_DOUBLE_EQ(s.b, 0.6);
+  EXPECT_NEAR(s.a * 1 + s.b * 1 + s.c, 0.0, 1e-15);
+  EXPECT_GT(s.a * 0 + s.b * 10 + s.c, 0.0);  // (0, 10) lies on the left
+  // A segment shorter than the zero length asks for a restart.
+  EXPECT_TRUE(g.restartPending);
+}
+
+}  // namespace
+}  // namespace zt

@@ -1,0 +1,223 @@
+// Test support of the zone builder: stand-in offset engines, a fresh $TMP
+// per test, record files written byte by byte.
+#pragma once
+
+#include <gtest/gtest.h>
+#include <stdlib.h>
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <map>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "zone/offset_engine.hpp"
+#include "zone/zone_context.hpp"
+
+namespace zt::testing {
+
+struct FakeElement {
+  std::int32_t kind, site;
+  Point2d p;  // user coordinates; handed out as (p - shift) x scale
+};
+using FakeCurve = std::vector<FakeElement>;
+
+// Records every call; a successful offset request fills the store with
+// trace() (the scripted curves unless overridden).
+class FakeEngine : public OffsetEngine {
+ public:
+  struct Added {
+    double x, y;
+    std::int32_t tag;
+  };
+  std::vector<std::string> calls;
+  std::vector<Added> points;
+  std::vector<std::array<std::int32_t, 3>> segments;  // i1, i2, tag
+  std::vector<FakeCurve> script;
+  std::map<std::int32_t, Point2d> centres;  // of point sites (arcs: -1 - index)
+  bool diagramOk = true, offsetsOk = true;
+  double scale = 1.0;
+  Point2d shift;
+  double requestT = 0.0;
+
+  bool initialize() override { return log("initialize"), true; }
+  void terminate() override { log("terminate"); }
+  void reset() override {
+    log("reset");
+    points.clear();
+    segments.clear();
+    store_.clear();
+  }
+  std::int32_t addPoint(double x, double y, std::int32_t tag) override {
+    points.push_back({x, y, tag});
+    return static_cast<std::int32_t>(points.size()) + 1;
+  }
+  std::int32_t addSegment(std::int32_t i1, std::int32_t i2, std::int32_t tag) override {
+    segments.push_back({i1, i2, tag});
+    return static_cast<std::int32_t>(segments.size()) - 1;
+  }
+  bool computeDiagram(bool clean, std::int32_t bound, bool pointsOnly, bool keepArcLinks,
+                      std::int32_t density, std::int32_t pieces, double tol, double tol2,
+                      bool autoTol) override {
+    std::ostringstream s;
+    s << "diagram " << clean << bound << pointsOnly << keepArcLinks << density << pieces << tol
+      << tol2 << autoTol;
+    return log(s.str()), diagramOk;
+  }
+  bool computeOffsets(std::int32_t side, double t, double d) override {
+    std::ostringstream s;
+    s << "offsets " << side << ' ' << t << ' ' << d;
+    log(s.str());
+    requestT = t;
+    if (offsetsOk) store_ = trace(side, t);
+    return offsetsOk;
+  }
+  std::int32_t curveCount() override { return static_cast<std::int32_t>(store_.size()); }
+  void curve(std::int32_t i, double& offset, std::int32_t& first, std::int32_t& last) override {
+    first = 0;
+    for (std::int32_t c = 0; c < i; ++c) first += static_cast<std::int32_t>(store_[c].size());
+    last = first + static_cast<std::int32_t>(store_[i].size()) - 1;
+    offset = 1.0;
+  }
+  void element(std::int32_t k, std::int32_t& kind, std::int32_t& site, Point2d& start) override {
+    for (const FakeCurve& c : store_) {
+      if (k < static_cast<std::int32_t>(c.size())) {
+        kind = c[k].kind;
+        site = c[k].site;
+        start = internal(c[k].p);
+        return;
+      }
+      k -= static_cast<std::int32_t>(c.size());
+    }
+  }
+  Point2d toUser(const Point2d& p) override { return {p.x / scale + shift.x, p.y / scale + shift.y}; }
+  bool coincide(const Point2d& a, const Point2d& b) override {
+    return std::hypot(a.x - b.x, a.y - b.y) <= 1e-6;
+  }
+  std::int32_t siteTag(SiteRef site) override { return 1000 * site.kind + site.index; }
+  Point2d pointCentre(std::int32_t point) override { return internal(centres[point]); }
+  Point2d arcCentre(std::int32_t arc) override { return internal(centres[-1 - arc]); }
+
+ protected:
+  virtual std::vector<FakeCurve> trace(std::int32_t, double) { return script; }
+  void log(const std::string& call) { calls.push_back(call); }
+  Point2d internal(const Point2d& u) const { return {(u.x - shift.x) * scale, (u.y - shift.y) * scale}; }
+
+ private:
+  std::vector<FakeCurve> store_;
+};
+
+// Offsets every fed polyline as its bounding box grown (side 2) or shrunk
+// (side 1) by t, traced so that the collection hands back a
+// counter-clockwise rectangle: exact for axis-parallel rectangles with
+// mitred corners.
+class BoxOffsetEngine : public FakeEngine {
+ protected:
+  std::vector<FakeCurve> trace(std::int32_t side, double t) override {
+    std::map<std::int32_t, std::array<double, 4>> boxes;  // by polyline tag
+    for (const auto& s : segments) {
+      for (std::int32_t i : {s[0], s[1]}) {
+        const Added& p = points[i - 2];
+        auto& b = boxes.try_emplace(s[2], std::array<double, 4>{p.x, p.y, p.x, p.y}).first->second;
+        b = {std::min(b[0], p.x), std::min(b[1], p.y), std::max(b[2], p.x), std::max(b[3], p.y)};
+      }
+    }
+    std::vector<FakeCurve> curves;
+    const double g = side == 1 ? -t : t;
+    for (const auto& [tag, b] : boxes) {
+      const double x0 = b[0] - g, y0 = b[1] - g, x1 = b[2] + g, y1 = b[3] + g;
+      if (x1 > x0 && y1 > y0) {
+        curves.push_back({{0, tag, {x0, y0}}, {0, tag, {x0, y1}}, {0, tag, {x1, y1}}, {0, tag, {x1, y0}}});
+      }
+    }
+    return curves;
+  }
+};
+
+// A fresh directory as $TMP (KVLTMPDIR) and a fresh zone builder per test.
+class ZoneTmpTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    char pattern[] = "/tmp/zt_zone_XXXXXX";
+    ASSERT_NE(::mkdtemp(pattern), nullptr);
+    dir_ = pattern;
+    ::setenv("KVLTMPDIR", dir_.c_str(), 1);
+    reset_zone_builder();
+  }
+  void TearDown() override {
+    reset_zone_builder();
+    set_offset_engine(nullptr);
+    ::unsetenv("KVLTMPDIR");
+    std::filesystem::remove_all(dir_);
+  }
+  std::string path(const std::string& name) const { return dir_ + "/" + name; }
+  void write_file(const std::string& name, const std::string& content) const {
+    std::ofstream(path(name), std::ios::binary) << content;
+  }
+  std::string read_file(const std::string& name) const {
+    std::ifstream in(path(name), std::ios::binary);
+    std::ostringstream s;
+    s << in.rdbuf();
+    return s.str();
+  }
+  std::string dir_;
+};
+
+// A record file of 18-byte point records: per level its contours, each
+// behind a separator record.
+struct LevelContours {
+  float z;
+  std::vector<std::vector<Point2f>> contours;
+};
+inline std::string record_file(const std::vector<LevelContours>& levels) {
+  std::string out = "K";
+  auto record = [&out](float x, float y, float z, std::int32_t code) {
+    const std::int16_t flag = 1;
+    char r[20] = {18};
+    std::memcpy(r + 1, &x, 4);
+    std::memcpy(r + 5, &y, 4);
+    std::memcpy(r + 9, &z, 4);
+    std::memcpy(r + 13, &code, 4);
+    std::memcpy(r + 17, &flag, 2);
+    r[19] = 18;
+    out.append(r, 20);
+  };
+  for (const LevelContours& level : levels) {
+    for (const auto& contour : level.contours) {
+      record(99999.0f, 99999.0f, 99999.0f, -1001);
+      for (const Point2f& p : contour) record(p.x, p.y, level.z, -1003);
+    }
+  }
+  return out + '\x82';
+}
+
+// A closed counter-clockwise axis-parallel rectangle.
+inline std::vector<Point2f> rectangle(float x0, float y0, float x1, float y1) {
+  return {{x0, y0}, {x1, y0}, {x1, y1}, {x0, y1}, {x0, y0}};
+}
+
+// Driver-style point pairs: each contour behind a (99999, 99999) pair.
+inline std::vector<Point2f> stock_points(const std::vector<std::vector<Point2f>>& contours) {
+  std::vector<Point2f> out;
+  for (const auto& c : contours) {
+    out.push_back({99999.0f, 99999.0f});
+    out.insert(out.end(), c.begin(), c.end());
+  }
+  return out;
+}
+
+// Bounding box {xmin, ymin, xmax, ymax} of the non-separator points.
+inline std::array<float, 4> box_of(const std::vector<Point2f>& pts) {
+  std::array<float, 4> b{1e9f, 1e9f, -1e9f, -1e9f};
+  for (const Point2f& p : pts) {
+    if (p.x < 99990.0f) b = {std::min(b[0], p.x), std::min(b[1], p.y), std::max(b[2], p.x), std::max(b[3], p.y)};
+  }
+  return b;
+}
+
+}  // namespace zt::testing

@@ -1,0 +1,56 @@
+// The zone builder's entry points, called from the driver in the order
+// wf_init_czone once, wf_add_level once per stock level with more than 4
+// points (from the top down), wf_fin_czone once. Every argument is passed by
+// reference; ierr is 0 on success and -1 on failure, and nothing is printed.
+//
+// Between the calls the zone builder keeps the scratch level file
+// "$TMP/temp1" (each level's zone points, contours separated by points of
+// x = 99999) and the level range table saying which points belong to which
+// contour level.
+#pragma once
+
+#include <cstdint>
+#include <vector>
+
+#include "zone/core/points.hpp"
+#include "zone/zone_context.hpp"
+
+namespace zt {
+
+// Writes one closed contour of n points at height z on a logical unit of the
+// driver; ierr 0 when written. The driver's write_contour has this form: it
+// is handed to wf_fin_czone so that the zone builder needs none of the
+// driver's record layer.
+using ContourWriter = void (*)(const std::int32_t& n, const Point2f* points, const float& z,
+                               const std::int32_t& unit, std::int32_t& ierr);
+
+// Stock levels within this (single precision) of a contour level belong to it.
+inline constexpr float kLevelPlacementTolerance = 0.0001f;
+// A level result with fewer points than this is not stored.
+inline constexpr std::int32_t kMinStoredPoints = 4;
+
+// levels: the z of each contour level, from the top down. Creates "$TMP/temp1"
+// empty and a level range table of count levels without points.
+void wf_init_czone(const float* levels, const std::int32_t& count, std::int32_t& ierr);
+
+// Computes the zones of one stock level (points: its rest-material pairs,
+// separators x = 99999 between contours) and appends them to "$TMP/temp1" on
+// the contour level they belong to.
+void wf_add_level(const float& z, const Point2f* points, const std::int32_t& count,
+                  std::int32_t& ierr);
+
+// Assembles the final zones over all levels and writes them, as closed
+// contours, on the unit where the driver opened "$TMP/stock2.bin", through
+// writeContour. points: the driver's point buffer, lent as scratch space (it
+// grows to the largest level when needed).
+void wf_fin_czone(std::vector<Point2f>& points, const std::int32_t& unit, std::int32_t& ierr,
+                  ContourWriter writeContour);
+
+// The level range that receives a stock level at z: moves `cursor` past every
+// range whose z lies above z + kLevelPlacementTolerance and returns it, or -1
+// when the cursor reaches `count` (the level lies below every remaining
+// contour level).
+std::int32_t place_level(const LevelRange* ranges, std::int32_t count, std::int32_t& cursor,
+                         float z);
+
+}  // namespace zt

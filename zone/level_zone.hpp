@@ -1,0 +1,38 @@
+// Level zone computation: one Z level's rest-machining zones.
+//
+// The level's rest-material contours are grown by the context's offset
+// distance on their right side (outwards for counter-clockwise contours)
+// through the Voronoi engine, the offset curves thinned, and the region they
+// bound intersected with the region of the finishing contours of the same z.
+// When the engine cannot offset, the rest material itself stands in for its
+// offset. The result goes to context.levelResult as single-precision pairs,
+// separators (99999, 99999) included.
+#pragma once
+
+#include <cstdint>
+
+#include "zone/core/points.hpp"
+#include "zone/zone_context.hpp"
+
+namespace zt {
+
+// Input pairs whose x exceeds this are separators.
+inline constexpr float kInputSeparatorX = 99990.0f;
+// Room every working list gets before a level is read.
+inline constexpr std::int32_t kLevelListCapacity = 10000;
+// Tolerance of the thinning of the offset curves.
+inline constexpr double kLevelSimplifyTolerance = 0.005;
+// Tag of a rest-material point.
+inline constexpr std::int32_t kRestPointTag = 0;
+
+// 0 with context.levelResult holding the level's zones (possibly none); -1
+// when no finishing level matches z, it has no records or cannot be read, or
+// the intersection fails (an empty zone region included).
+std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
+                                std::int32_t count);
+
+// Fills context.zonePoints with the thinned offset curves of the rest
+// material, or with the rest material itself when the engine cannot offset.
+void build_level_zones(ZoneContext& context, const Point2f* points, std::int32_t count);
+
+}  // namespace zt

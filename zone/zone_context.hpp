@@ -1,0 +1,60 @@
+// The zone builder's process-wide state: the zone context (index of the
+// finishing contours and the per-level working lists), the level range
+// tables and the two scratch files.
+//
+// The state is created on first use and lives to the end of the process;
+// reset_zone_builder exists only so that tests can start from a fresh one.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <vector>
+
+#include "zone/contour_store.hpp"
+#include "zone/core/points.hpp"
+#include "zone/scratch_file.hpp"
+
+namespace zt {
+
+// The rest material is grown by at least this much.
+inline constexpr double kMinOffsetDistance = 1.0;
+// Growth step of the context's point lists.
+inline constexpr std::int32_t kContextListGrowth = 100;
+
+// A range of point numbers (from 1) of a scratch file holding one level:
+// -1, -1 while the level has none; last = first - 1 when it is empty.
+struct LevelRange {
+  std::int32_t first = -1;
+  std::int32_t last = -1;
+  float z = 0.0f;
+
+  bool hasPoints() const { return first != -1; }
+};
+
+struct ZoneContext {
+  ContourStore store;  // levelCount, levelCursor, levels, readRecord, reader, recordIndex
+  TaggedPointList contourPoints{0, kContextListGrowth};
+  TaggedPointList zonePoints{0, kContextListGrowth};
+  std::vector<Point2f> levelResult;
+  TaggedPointList restPoints{0, kContextListGrowth};
+  double offsetDistance = kMinOffsetDistance;
+};
+
+struct ZoneBuilderState {
+  std::unique_ptr<ZoneContext> context;  // created by the first wf_add_level
+  ScratchFile levelFile;                 // "$TMP/temp1"
+  std::int32_t levelCount = 0;
+  // levelCount real entries and two spare ones.
+  std::vector<LevelRange> levelRanges;
+  std::int32_t rangeCursor = 0;
+  std::int32_t pointsWritten = 0;
+  std::vector<LevelRange> resultRanges;
+  std::int32_t resultCount = 0;
+};
+
+ZoneBuilderState& zone_builder();
+// Drops the context and the tables and closes the scratch files, as in a
+// new process; also forgets engineReady and the merge radius (tests only).
+void reset_zone_builder();
+
+}  // namespace zt
