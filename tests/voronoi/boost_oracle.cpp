@@ -44,7 +44,6 @@ Outcome Compare(const std::vector<BPoint>& input) {
   }
   const double tol = 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
 
-  const Corners corners;
   // Our nodes whose sites are all caller points.
   const OurNodes nodes = CollectNodes(
       [](const VD_EdgeInfo& info) {
@@ -54,23 +53,14 @@ Outcome Compare(const std::vector<BPoint>& input) {
 
   boost::polygon::voronoi_diagram<double> bd;
   boost::polygon::construct_voronoi(input.begin(), input.end(), &bd);
-  std::vector<XY> theirs;
-  for (const auto& v : bd.vertices()) {
-    const XY p{v.x(), v.y()};
-    theirs.push_back(p);
-    if (!corners.inBox(p)) continue;
-    // The circle of the vertex: through the site of one of its cells.
-    const auto* cell = v.incident_edge()->cell();
-    const BPoint& s = input[cell->source_index()];
-    const double r = std::hypot(p.x - s.x(), p.y - s.y());
-    if (corners.anyWithin(p, r)) { ++out.skipped; continue; }
-    ++out.boostChecked;
-    if (!Near(nodes.all, p, tol)) {
-      out.error = "boost vertex " + Describe(p) + " has no node";
-      return out;
-    }
-  }
-  out.error = EveryNodeIsAVertex(nodes.proper, theirs, tol, out.oursChecked);
+  // The circle of a vertex: through the site of one of its cells.
+  const auto clearance = [&](const auto& v, XY p) {
+    const BPoint& s = input[v.incident_edge()->cell()->source_index()];
+    return std::hypot(p.x - s.x(), p.y - s.y());
+  };
+  MatchCounts counts;
+  out.error = MatchBothWays(bd, clearance, nodes, tol, counts);
+  out.boostChecked = counts.theirsChecked, out.oursChecked = counts.oursChecked, out.skipped = counts.skipped;
   return out;
 }
 

@@ -99,7 +99,6 @@ Outcome Compare(const std::vector<Polygon>& polys) {
     return out;
   }
   const double tol = 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
-  const Corners corners;
   // Proper nodes of ours: degree 3 and no corner site around.
   const auto corner = [](std::int32_t site, std::int32_t kind) {
     return kind == 8 || (kind == 2 && VD_GetPointTag(site) < 0);
@@ -109,30 +108,20 @@ Outcome Compare(const std::vector<Polygon>& polys) {
 
   boost::polygon::voronoi_diagram<double> bd;
   boost::polygon::construct_voronoi(segs.begin(), segs.end(), &bd);
-  std::vector<XY> theirs;
-  for (const auto& v : bd.vertices()) {
-    const XY p{v.x(), v.y()};
-    theirs.push_back(p);
-    if (!corners.inBox(p)) continue;
-    // Clearance: distance to the site of one incident cell.
+  // Clearance: distance to the site of one incident cell.
+  const auto clearance = [&](const auto& v, XY p) {
     const auto* cell = v.incident_edge()->cell();
     const BSegment& s = segs[cell->source_index()];
-    double r;
     if (cell->contains_point()) {
       const BPoint q = cell->source_category() == boost::polygon::SOURCE_CATEGORY_SEGMENT_START_POINT ? s.low() : s.high();
-      r = std::hypot(p.x - double(q.x()), p.y - double(q.y()));
-    } else {
-      const double ax = double(s.low().x()), ay = double(s.low().y()), bx = double(s.high().x()), by = double(s.high().y());
-      r = std::fabs((bx - ax) * (p.y - ay) - (by - ay) * (p.x - ax)) / std::hypot(bx - ax, by - ay);
+      return std::hypot(p.x - double(q.x()), p.y - double(q.y()));
     }
-    if (corners.anyWithin(p, r)) continue;
-    ++out.boostChecked;
-    if (!Near(nodes.all, p, tol)) {
-      out.error = "boost vertex " + Describe(p) + " has no node";
-      return out;
-    }
-  }
-  out.error = EveryNodeIsAVertex(nodes.proper, theirs, tol, out.oursChecked);
+    const double ax = double(s.low().x()), ay = double(s.low().y()), bx = double(s.high().x()), by = double(s.high().y());
+    return std::fabs((bx - ax) * (p.y - ay) - (by - ay) * (p.x - ax)) / std::hypot(bx - ax, by - ay);
+  };
+  MatchCounts counts;
+  out.error = MatchBothWays(bd, clearance, nodes, tol, counts);
+  out.boostChecked = counts.theirsChecked, out.oursChecked = counts.oursChecked;
   return out;
 }
 

@@ -77,12 +77,33 @@ OurNodes CollectNodes(CornerEdge cornerEdge, bool skipDegree2) {
 
 inline std::string Describe(XY p) { return "(" + std::to_string(p.x) + ", " + std::to_string(p.y) + ")"; }
 
-// Every proper node of ours must be one of `theirs` within tol: "" or the
-// first node that is not; `checked` counts the nodes looked at.
-inline std::string EveryNodeIsAVertex(const std::vector<XY>& ours, std::vector<XY> theirs, double tol, int& checked) {
+// Every vertex of `diagram` inside the corner box whose circle (of the radius
+// `clearance(vertex, p)`) holds no corner point must be one of our nodes
+// within tol; then every proper node of ours must be one of the vertices.
+// "" or the first point that fails; the counters count what was looked at.
+struct MatchCounts {
+  int theirsChecked = 0, oursChecked = 0, skipped = 0;
+};
+
+template <class Diagram, class Clearance>
+std::string MatchBothWays(const Diagram& diagram, Clearance clearance, const OurNodes& nodes, double tol,
+                          MatchCounts& counts) {
+  const Corners corners;
+  std::vector<XY> theirs;
+  for (const auto& v : diagram.vertices()) {
+    const XY p{v.x(), v.y()};
+    theirs.push_back(p);
+    if (!corners.inBox(p)) continue;
+    if (corners.anyWithin(p, clearance(v, p))) {
+      ++counts.skipped;
+      continue;
+    }
+    ++counts.theirsChecked;
+    if (!Near(nodes.all, p, tol)) return "boost vertex " + Describe(p) + " has no node";
+  }
   SortByX(theirs);
-  for (const XY& p : ours) {
-    ++checked;
+  for (const XY& p : nodes.proper) {
+    ++counts.oursChecked;
     if (!Near(theirs, p, tol)) return "node " + Describe(p) + " is no boost vertex";
   }
   return "";
