@@ -7,8 +7,8 @@
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/nearest_search.hpp"
-#include "voronoi/detail/point_insertion.hpp"
 #include "voronoi/detail/offset_state.hpp"
+#include "voronoi/detail/point_insertion.hpp"
 
 namespace zt {
 
@@ -127,8 +127,8 @@ void VD_Terminate() {
   g.stack.Free();
   g.offsetCurves.Free();
   g.offsetElements.Free();
-  ReleaseInsertionScratch();
   FreeOffsetState();
+  ReleaseInsertionScratch();
   g.initialised = false;
 }
 

@@ -44,10 +44,11 @@ bool VD_IsUpToDate();
 
 // Traces offset curves at distance t (user units) into the offset store, on
 // side 1 (left of the segments), 2 (right) or 3 (both); side 0 does nothing
-// and succeeds. A t of 1e-11 or less selects the automatic distance, a d of
+// and succeeds. A t from 0 to 1e-11 selects the automatic distances, a d of
 // 1e-11 or less a single distance; otherwise the family t, t + d, ... below
 // the maximal offset. False when the diagram is not up to date, when t or d
-// is not finite or d is negative, or when a curve could not be traced.
+// is negative or not finite, when d would give more than 100,000 distances,
+// or when a curve could not be traced (a broken diagram).
 bool VD_ComputeOffsets(std::int32_t side, double t, double d);
 // The engine operation behind VD_ComputeOffsets (left and right both false
 // mean both sides). Ends the process when the diagram is not up to date.

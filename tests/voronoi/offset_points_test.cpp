@@ -60,6 +60,16 @@ TEST(OffsetRequest, NonFiniteOrNegativeDistancesAreRefused) {
   EXPECT_EQ(GetNumOffsetCurves(), 0);
 }
 
+// A step of 1e-10 on a problem of size 1 would mean billions of distances.
+TEST(OffsetRequest, StepTooSmallForTheFamilyIsRefused) {
+  vdtest::Store({{0, 0}, {1, 0}, {0, 1}});
+  ASSERT_TRUE(vdtest::ComputePoints());
+  EXPECT_FALSE(VD_ComputeOffsets(3, 0.1, 1e-10));
+  EXPECT_EQ(GetNumOffsetCurves(), 0);
+  EXPECT_TRUE(VD_ComputeOffsets(3, 0.1, 0.01));
+  EXPECT_GT(GetNumOffsetCurves(), 0);
+}
+
 TEST(OffsetRequest, ZeroDistanceSelectsTheAutomaticOffsets) {
   vdtest::Store({{0, 0}, {10, 0}});
   ASSERT_TRUE(vdtest::ComputePoints());
@@ -221,6 +231,39 @@ TEST(TracedOffsets, BrokenDiagramEndsTheRequestWithFailure) {
   ASSERT_GE(crossed, 0);
   for (std::int32_t e = 4; e < g.edges.count; ++e) g.edges[e].s_ccw = g.edges[e].e_ccw = crossed;
   EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
+}
+
+// Every crossed edge but the first turns back onto itself: the walk comes
+// back to an edge it has already crossed at this distance.
+TEST(TracedOffsets, WalkBackOntoACrossedEdgeEndsTheRequestWithFailure) {
+  const auto pts = vdtest::UniformPoints(40, 5, 10.0);
+  vdtest::Store(pts);
+  ASSERT_TRUE(vdtest::ComputePoints());
+  ASSERT_TRUE(VD_ComputeOffsets(3, 1.5, 0.0));
+  const std::int32_t before = GetNumOffsetCurves();
+  vd::Engine& g = vd::Vd();
+  const double t = 1.5 * g.scale;
+  bool first = true;
+  for (std::int32_t e = 4; e < g.edges.count; ++e) {
+    auto& r = g.edges[e];
+    const double r1 = g.nodes[r.n1].r, r2 = g.nodes[r.n2].r;
+    if (r.deleted || !(std::fmin(r1, r2) <= t && t < std::fmax(r1, r2))) continue;
+    if (first) {
+      first = false;  // the edge the sweep starts from
+      continue;
+    }
+    r.s_ccw = r.e_ccw = e;
+  }
+  EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
+  // The failed curve leaves nothing behind; the circles of the request stay.
+  std::int32_t kind, site, tag;
+  double x, y, offset;
+  std::int32_t f, l;
+  for (std::int32_t i = before; i < GetNumOffsetCurves(); ++i) {
+    ASSERT_TRUE(GetOffsetCurve(i, offset, f, l));
+    EXPECT_TRUE(GetOffsetElement(l, kind, site, x, y, tag));
+  }
+  EXPECT_FALSE(GetOffsetElement(vd::Vd().offsetElements.count, kind, site, x, y, tag));
 }
 
 }  // namespace

@@ -4,6 +4,8 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <fstream>
+#include <iterator>
 #include <numbers>
 #include <random>
 
@@ -140,6 +142,26 @@ TEST(PolygonOffsets, NeckBetweenACornerAndAWallIsNotCutThrough) {
   EXPECT_EQ(CheckSide(neck, curves, true), "");
 }
 
+// Necks at random places and depths, with distances below, near and above
+// half the neck's width.
+TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
+  std::mt19937 rng(17);
+  std::uniform_real_distribution<double> ux(-5, 10), uy(0.3, 3.6), ut(0.2, 2.2), uw(0.3, 3);
+  for (int trial = 0; trial < 60; ++trial) {
+    const double x = ux(rng), y = uy(rng), w = uw(rng), t = ut(rng);
+    const std::vector<Contour> neck{{{-10, 0}, {14, 0}, {14, 4}, {x + w, 4}, {x, y}, {x - w, 4}, {-10, 4}}};
+    const auto in = StoreContours(neck);
+    ASSERT_TRUE(Compute());
+    ASSERT_TRUE(VD_ComputeOffsets(1, t, 0.0));
+    const auto curves = vdtest::ReadStore();
+    if (t < 2.0) {
+      ASSERT_FALSE(curves.empty()) << trial;
+    }
+    ASSERT_EQ(vdtest::CheckAtDistance(in, curves, t, 1e-9 * Extent(in)), "") << "trial " << trial;
+    ASSERT_EQ(CheckSide(neck, curves, true), "") << trial;
+  }
+}
+
 // A star-shaped polygon around (cx, cy) with n vertices, counter-clockwise
 // unless `clockwise`.
 Contour Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
@@ -182,6 +204,59 @@ TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
       ASSERT_EQ(CheckSide(cs, curves, side == 1), "") << trial;
     }
   }
+}
+
+// Loose points inside a pocket: their circles (both sides) and the curves
+// where circles meet the walls' offsets, against brute force.
+TEST(PolygonOffsets, PocketWithLoosePointsAgainstBruteForce) {
+  std::mt19937 rng(5);
+  for (int trial = 0; trial < 30; ++trial) {
+    const std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 12 + trial, false)};
+    auto in = StoreContours(cs);
+    std::uniform_real_distribution<double> u(-40, 40);
+    for (int k = 0; k < 1 + trial % 6; ++k) {
+      const vdtest::Site2 p{u(rng), u(rng)};
+      API_AddPoint(p.x, p.y, 100 + k);
+      in.points.push_back(p);
+    }
+    ASSERT_TRUE(Compute()) << trial;
+    const double t = 2.0 + trial % 7 * 1.5;
+    ASSERT_TRUE(VD_ComputeOffsets(1 + trial % 3, t, 0.0)) << trial;
+    ASSERT_EQ(vdtest::CheckAtDistance(in, vdtest::ReadStore(), t, 1e-9 * Extent(in)), "") << "trial " << trial;
+  }
+}
+
+}  // namespace
+}  // namespace zt
+
+namespace zt {
+namespace {
+
+// A request that asks for a file writes the whole store there.
+TEST(PolygonOffsets, RequestedFileHoldsTheStore) {
+  VD_Initialize();
+  VD_Reset();
+  const std::int32_t a = API_AddPoint(0, 0, -1), b = API_AddPoint(1, 0, -1), c = API_AddPoint(1, 1, -1),
+                     d = API_AddPoint(0, 1, -1);
+  API_AddSegment(a, b, 0), API_AddSegment(b, c, 0), API_AddSegment(c, d, 0), API_AddSegment(d, a, 0);
+  ASSERT_TRUE(VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true));
+  const std::string text = testing::TempDir() + "zt_offsets.txt";
+  ASSERT_TRUE(API_ComputeOff(false, text.c_str(), true, false, 0.1, 0.0, false, true, false));
+  std::ifstream in(text);
+  std::string line;
+  std::getline(in, line);
+  EXPECT_EQ(line, "curve 0.10000000000000001");
+  int elements = 0;
+  while (std::getline(in, line)) ++elements;
+  EXPECT_EQ(elements, 4);
+  const std::string dxf = testing::TempDir() + "zt_offsets.dxf";
+  ASSERT_TRUE(API_ComputeOff(false, dxf.c_str(), true, true, 0.1, 0.0, false, false, true));
+  std::ifstream din(dxf);
+  const std::string all((std::istreambuf_iterator<char>(din)), std::istreambuf_iterator<char>());
+  EXPECT_NE(all.find("ARC"), std::string::npos);
+  EXPECT_NE(all.find("EOF"), std::string::npos);
+  // A file that cannot be written fails the request.
+  EXPECT_FALSE(API_ComputeOff(false, "/nonexistent/dir/x.txt", true, false, 0.1, 0.0, false, true, false));
 }
 
 }  // namespace

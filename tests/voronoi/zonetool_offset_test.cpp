@@ -13,7 +13,9 @@ namespace {
 using ToolRun = zt::test::CommandRun;
 
 ToolRun Offset(const std::string& text, const std::string& args) {
-  const std::string file = testing::TempDir() + "zt_offset_input.txt";
+  // ctest runs the cases as parallel processes: one input file each.
+  const std::string file = testing::TempDir() + "zt_offset_" +
+                           testing::UnitTest::GetInstance()->current_test_info()->name() + ".txt";
   std::ofstream(file) << text;
   return zt::test::run_command(zt::test::zonetool_path() + " offset " + file + " " + args + " 2>&1");
 }

@@ -2,6 +2,8 @@
 // input.
 #include <gtest/gtest.h>
 
+#include <unistd.h>
+
 #include <fstream>
 #include <sstream>
 #include <string>
@@ -13,7 +15,10 @@ namespace {
 using ToolRun = zt::test::CommandRun;
 
 ToolRun Zonetool(const std::string& text) {
-  const std::string file = testing::TempDir() + "zt_voronoi_input.txt";
+  // One file per test and process: ctest runs the cases side by side.
+  const std::string file = testing::TempDir() + "zt_voronoi_" +
+                           testing::UnitTest::GetInstance()->current_test_info()->name() + "_" +
+                           std::to_string(getpid()) + ".txt";
   std::ofstream(file) << text;
   return zt::test::run_command(zt::test::zonetool_path() + " voronoi " + file + " 2>&1");
 }

@@ -70,11 +70,18 @@ void PointPointData(const EdgeRecord& r, OffsetEdgeData& d) {
   d.v2 = (dx * dx + dy * dy) / 4.0;
 }
 
+// The diagram leaves the segment on either side of such an edge, so the
+// swap is routine here: its diagnostic is written once per diagram, not once
+// per edge, to keep the console of a batch run readable.
 void ParabolaData(const EdgeRecord& r, OffsetEdgeData& d) {
   const Engine& g = Vd();
   std::int32_t seg = r.lft, pnt = r.rgt;
   if (r.ltype != SEG) {
-    std::fputs("CreateParabolaData(): in else branch!\n", stderr);
+    static std::int32_t reportedGeneration = -1;
+    if (reportedGeneration != g.generation) {
+      reportedGeneration = g.generation;
+      std::fputs("CreateParabolaData(): in else branch!\n", stderr);
+    }
     std::swap(seg, pnt);
   }
   const NodeRecord& a = g.nodes[r.n1];

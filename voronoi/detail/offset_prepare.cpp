@@ -24,30 +24,49 @@ void SquareRootRadii() {
   g.nodeRadiiSquared = false;
 }
 
+// Position of node n along direction (dx, dy) from (ox, oy).
+double Along(std::int32_t n, double ox, double oy, double dx, double dy) {
+  const NodeRecord& r = Vd().nodes[n];
+  return (r.x - ox) * dx + (r.y - oy) * dy;
+}
+
+bool Straddles(double u1, double u2) {
+  return (u1 < -kOffsetZero && u2 > kOffsetZero) || (u1 > kOffsetZero && u2 < -kOffsetZero);
+}
+
 // A reflex corner facing a wall across a narrow neck: the clearance along
 // the edge between the corner point and the wall falls to the parabola's
 // apex and rises again. A sweep that takes the clearance of an edge to run
 // between its end radii would skip the edge and cut through the neck, so
 // the edge is split at the apex (the midpoint of the point and its foot).
-void SplitParabolaApexes() {
+// Bisectors of two points that still pass the points' midpoint (the split
+// after the points were inserted skips edges ending at degree-2 nodes) are
+// split there for the same reason.
+void SplitAtClearanceMinima() {
   Engine& g = Vd();
   const std::int32_t edgeCount = g.edges.count;  // the new halves need no split
   for (std::int32_t e = kFirstInnerEdge; e < edgeCount; ++e) {
     const EdgeRecord r = g.edges[e];
-    if (r.deleted || EdgeKindOf(r) != OffsetEdgeKind::kParabola) continue;
-    const bool pointLeft = r.ltype == PNT;
-    const PointRecord& p = g.points[pointLeft ? r.lft : r.rgt];
-    const SegmentRecord& s = g.segments[pointLeft ? r.rgt : r.lft];
-    const double d = s.a * p.x + s.b * p.y + s.c;
-    if (std::fabs(d) <= kOffsetZero) continue;
-    const double fx = p.x - d * s.a, fy = p.y - d * s.b;
-    // Position along the wall (tau = (-b, a)) relative to the foot.
-    const auto along = [&](std::int32_t n) { return (g.nodes[n].x - fx) * -s.b + (g.nodes[n].y - fy) * s.a; };
-    const double u1 = along(r.n1), u2 = along(r.n2);
-    const bool straddles = (u1 < -kOffsetZero && u2 > kOffsetZero) || (u1 > kOffsetZero && u2 < -kOffsetZero);
-    if (!straddles) continue;
-    const std::int32_t m = NewNode(0.5 * (p.x + fx), 0.5 * (p.y + fy), 0.5 * std::fabs(d));
-    SplitEdge(e, m, false);
+    if (r.deleted) continue;
+    const OffsetEdgeKind kind = EdgeKindOf(r);
+    if (kind == OffsetEdgeKind::kParabola) {
+      const bool pointLeft = r.ltype == PNT;
+      const PointRecord& p = g.points[pointLeft ? r.lft : r.rgt];
+      const SegmentRecord& s = g.segments[pointLeft ? r.rgt : r.lft];
+      const double d = s.a * p.x + s.b * p.y + s.c;
+      if (std::fabs(d) <= kOffsetZero) continue;
+      const double fx = p.x - d * s.a, fy = p.y - d * s.b;
+      if (!Straddles(Along(r.n1, fx, fy, -s.b, s.a), Along(r.n2, fx, fy, -s.b, s.a))) continue;
+      SplitEdge(e, NewNode(0.5 * (p.x + fx), 0.5 * (p.y + fy), 0.5 * std::fabs(d)), false);
+    } else if (kind == OffsetEdgeKind::kPointPoint) {
+      const PointRecord& p = g.points[r.lft];
+      const PointRecord& q = g.points[r.rgt];
+      const double dx = q.x - p.x, dy = q.y - p.y, len = std::hypot(dx, dy);
+      if (len <= kOffsetZero) continue;
+      const double mx = 0.5 * (p.x + q.x), my = 0.5 * (p.y + q.y);
+      if (!Straddles(Along(r.n1, mx, my, -dy / len, dx / len), Along(r.n2, mx, my, -dy / len, dx / len))) continue;
+      SplitEdge(e, NewNode(mx, my, 0.5 * len), false);
+    }
   }
 }
 
@@ -112,7 +131,7 @@ void PrepareDiagramForOffsets() {
   if (o.preparedGeneration == g.generation && !g.nodeRadiiSquared && g.bisectorsSplit) return;
   SquareRootRadii();
   SplitPointBisectors();
-  if (o.preparedGeneration != g.generation) SplitParabolaApexes();
+  if (o.preparedGeneration != g.generation) SplitAtClearanceMinima();
   o.preparedGeneration = g.generation;
 }
 

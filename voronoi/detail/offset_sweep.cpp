@@ -66,14 +66,19 @@ bool ComputeOffsets(bool, const char* outputFile, bool write, bool dxfFormat, do
     o.distance = t * g.scale;
     o.step = d * g.scale;
     o.failed = false;
+    o.written = false;
+    if (o.step <= kOffsetZero) o.step = g.maxOffset;
     if (o.distance >= g.maxOffset || o.distance <= kOffsetZero) {
       o.finished = true;
+    } else if ((g.maxOffset - o.distance) / o.step > kMaxOffsetDistances) {
+      // A step tiny beside the maximal offset would run for hours and fill
+      // memory with curves: refuse the request rather than appear to hang.
+      o.finished = true;
+      ok = false;
     } else {
       o.finished = false;
-      o.written = false;
       const bool both = !left && !right;
       InitializeEdgeData(left, right);
-      if (o.step <= kOffsetZero) o.step = g.maxOffset;
       if (both && g.isolatedPoints) AddIsolatedPointCircles(o.distance, o.step);
     }
   }
@@ -84,7 +89,8 @@ bool ComputeOffsets(bool, const char* outputFile, bool write, bool dxfFormat, do
       break;
     }
     o.distance += o.step;
-    if (o.distance >= g.maxOffset) o.finished = true;
+    // With no edge left in the list, later distances would trace nothing.
+    if (o.distance >= g.maxOffset || o.workList.count == 0) o.finished = true;
   }
   if (o.finished && !o.written) {
     o.written = true;

@@ -1,0 +1,1 @@
+zt_bench(bench_offset LIBS zone voronoi NEEDS CLIPPER)
