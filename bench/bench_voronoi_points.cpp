@@ -3,18 +3,15 @@
 // points. Each case also reports the peak memory of one construction
 // (growth of the resident set's high-water mark, in a child process).
 #include <benchmark/benchmark.h>
-#include <sys/wait.h>
-#include <malloc.h>
-#include <unistd.h>
 
 #include <boost/polygon/voronoi.hpp>
 #include <cstdio>
-#include <fstream>
 #include <map>
 #include <random>
 #include <string>
 #include <vector>
 
+#include "bench/common.hpp"
 #include "voronoi/engine.hpp"
 
 namespace {
@@ -61,50 +58,16 @@ void RunBoost(const std::vector<BPoint>& pts) {
   benchmark::DoNotOptimize(vd.num_vertices());
 }
 
-long StatusKb(const char* field) {
-  std::ifstream f("/proc/self/status");
-  std::string line;
-  const std::string key = std::string(field) + ":";
-  while (std::getline(f, line))
-    if (line.rfind(key, 0) == 0) return std::stol(line.substr(key.size()));
-  return 0;
-}
-
-// Peak resident growth (MB) of one run, in a fresh child process.
-double PeakMb(void (*run)(const std::vector<BPoint>&), const std::vector<BPoint>& pts) {
-  int fds[2];
-  if (pipe(fds) != 0) return -1;
-  const pid_t pid = fork();
-  if (pid == 0) {
-    close(fds[0]);
-    zt::VD_Terminate();  // start from an engine without memory
-    malloc_trim(0);
-    std::ofstream("/proc/self/clear_refs") << "5";  // restart the peak from here
-    const long before = StatusKb("VmRSS");
-    run(pts);
-    const double mb = (StatusKb("VmHWM") - before) / 1024.0;
-    if (write(fds[1], &mb, sizeof mb) != sizeof mb) _exit(1);
-    _exit(0);
-  }
-  close(fds[1]);
-  double mb = -1;
-  if (read(fds[0], &mb, sizeof mb) != sizeof mb) mb = -1;
-  close(fds[0]);
-  int status = 0;
-  waitpid(pid, &status, 0);
-  return mb;
-}
-
 void BM_Ours(benchmark::State& state) {
   const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = PeakMb(RunOurs, pts);
+  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(pts); });
   for (auto _ : state) RunOurs(pts);
   state.counters["restarts"] = zt::VD_GetRestartCount();
 }
 
 void BM_Boost(benchmark::State& state) {
   const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = PeakMb(RunBoost, pts);
+  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunBoost(pts); });
   for (auto _ : state) RunBoost(pts);
 }
 

@@ -4,19 +4,16 @@
 // peak memory of one construction (growth of the resident set's high-water
 // mark, in a child process) and our restarts.
 #include <benchmark/benchmark.h>
-#include <malloc.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <boost/polygon/segment_data.hpp>
 #include <boost/polygon/voronoi.hpp>
 #include <cmath>
-#include <fstream>
 #include <map>
 #include <random>
 #include <string>
 #include <vector>
 
+#include "bench/common.hpp"
 #include "voronoi/engine.hpp"
 
 namespace {
@@ -77,42 +74,9 @@ void RunBoost(const std::vector<Polygon>& polys) {
   benchmark::DoNotOptimize(vd.num_vertices());
 }
 
-long StatusKb(const char* field) {
-  std::ifstream f("/proc/self/status");
-  std::string line;
-  const std::string key = std::string(field) + ":";
-  while (std::getline(f, line))
-    if (line.rfind(key, 0) == 0) return std::stol(line.substr(key.size()));
-  return 0;
-}
-
-double PeakMb(void (*run)(const std::vector<Polygon>&), const std::vector<Polygon>& polys) {
-  int fds[2];
-  if (pipe(fds) != 0) return -1;
-  const pid_t pid = fork();
-  if (pid == 0) {
-    close(fds[0]);
-    zt::VD_Terminate();
-    malloc_trim(0);
-    std::ofstream("/proc/self/clear_refs") << "5";
-    const long before = StatusKb("VmRSS");
-    run(polys);
-    const double mb = (StatusKb("VmHWM") - before) / 1024.0;
-    if (write(fds[1], &mb, sizeof mb) != sizeof mb) _exit(1);
-    _exit(0);
-  }
-  close(fds[1]);
-  double mb = -1;
-  if (read(fds[0], &mb, sizeof mb) != sizeof mb) mb = -1;
-  close(fds[0]);
-  int status = 0;
-  waitpid(pid, &status, 0);
-  return mb;
-}
-
 void BM_Ours(benchmark::State& state) {
   const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = PeakMb(RunOurs, polys);
+  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(polys); });
   for (auto _ : state) RunOurs(polys);
   state.counters["restarts"] = zt::VD_GetRestartCount();
   state.counters["recovery"] = zt::VD_InRecoveryMode();
@@ -120,7 +84,7 @@ void BM_Ours(benchmark::State& state) {
 
 void BM_Boost(benchmark::State& state) {
   const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = PeakMb(RunBoost, polys);
+  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunBoost(polys); });
   for (auto _ : state) RunBoost(polys);
 }
 

@@ -154,22 +154,22 @@ std::string ConfigTable::resolve(std::int32_t entry) const {
   return older;
 }
 
+std::int32_t ConfigTable::lookup(std::string_view section, std::string_view name) const {
+  if (ds_ == nullptr) return -1;
+  const std::int32_t s = find_section(section);
+  return s < 0 ? -1 : find_live_entry(s, name, /*exact=*/false);
+}
+
 std::optional<std::string> ConfigTable::value(std::string_view section,
                                               std::string_view name) const {
-  if (ds_ == nullptr) return std::nullopt;
-  const std::int32_t s = find_section(section);
-  if (s < 0) return std::nullopt;
-  const std::int32_t e = find_live_entry(s, name, /*exact=*/false);
+  const std::int32_t e = lookup(section, name);
   if (e < 0) return std::nullopt;
   return resolve(e);
 }
 
 std::optional<std::string> ConfigTable::origin(std::string_view section,
                                                std::string_view name) const {
-  if (ds_ == nullptr) return std::nullopt;
-  const std::int32_t s = find_section(section);
-  if (s < 0) return std::nullopt;
-  const std::int32_t e = find_live_entry(s, name, /*exact=*/false);
+  const std::int32_t e = lookup(section, name);
   if (e < 0) return std::nullopt;
   return origin_of(e);
 }

@@ -49,6 +49,8 @@ class ConfigTable {
   std::int32_t find_section(std::string_view section) const;
   std::int32_t add_section(std::string_view section);
   std::int32_t find_live_entry(std::int32_t section, std::string_view name, bool exact) const;
+  // The live entry that value() and origin() read, or -1 when there is none.
+  std::int32_t lookup(std::string_view section, std::string_view name) const;
   std::string resolve(std::int32_t entry) const;
   std::string origin_of(std::int32_t entry) const;
   const char* text(std::int32_t handle) const;

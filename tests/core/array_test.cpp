@@ -2,6 +2,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdint>
+#include <functional>
 
 #include "zone/core/points.hpp"
 
@@ -74,45 +75,41 @@ TEST(ArrayDeathTest, InvalidIndexReport) {
   EXPECT_EXIT(at(-1), testing::ExitedWithCode(1), "");
 }
 
-// The report goes to standard output; a child writes it into a pipe we read.
-TEST(ArrayDeathTest, ReportBytesOnStdout) {
+// The report goes to standard output: the child that runs `body` and must
+// end with status 1 writes it into a temporary file, returned as text.
+static std::string stdout_of_exit_1(const std::function<void()>& body) {
   FILE* f = std::tmpfile();
-  ASSERT_NE(f, nullptr);
+  if (!f) return "no temporary file";
   const int fd = fileno(f);
   EXPECT_EXIT(
       {
         std::fflush(stdout);
         dup2(fd, 1);
-        Array<int> a;
-        (void)a.At(0);
+        body();
       },
       testing::ExitedWithCode(1), "");
   std::rewind(f);
   std::string got;
   char buf[256];
-  size_t n;
-  while ((n = std::fread(buf, 1, sizeof buf, f)) > 0) got.append(buf, n);
-  EXPECT_EQ(got, report("Invalid Array Index", 59));
+  for (size_t n; (n = std::fread(buf, 1, sizeof buf, f)) > 0;) got.append(buf, n);
+  std::fclose(f);
+  return got;
+}
+
+TEST(ArrayDeathTest, ReportBytesOnStdout) {
+  EXPECT_EQ(stdout_of_exit_1([] {
+              Array<int> a;
+              (void)a.At(0);
+            }),
+            report("Invalid Array Index", 59));
 }
 
 TEST(ArrayDeathTest, CapacityBeyond32BitsIsAllocationFailure) {
-  FILE* f = std::tmpfile();
-  ASSERT_NE(f, nullptr);
-  const int fd = fileno(f);
-  EXPECT_EXIT(
-      {
-        std::fflush(stdout);
-        dup2(fd, 1);
-        Array<char> a(0, 0x7fffffff);
-        a.Add('x');  // capacity 0x7fffffff: allocated lazily below only if it fits
-        a.SetCount(a.capacity());
-        a.Add('y');  // would need 2^32 - 2 elements
-      },
-      testing::ExitedWithCode(1), "");
-  std::rewind(f);
-  std::string got;
-  char buf[256];
-  size_t n;
-  while ((n = std::fread(buf, 1, sizeof buf, f)) > 0) got.append(buf, n);
-  EXPECT_EQ(got, report("Memory Allocation Failure", 105));
+  EXPECT_EQ(stdout_of_exit_1([] {
+              Array<char> a(0, 0x7fffffff);
+              a.Add('x');  // capacity 0x7fffffff: allocated lazily below only if it fits
+              a.SetCount(a.capacity());
+              a.Add('y');  // would need 2^32 - 2 elements
+            }),
+            report("Memory Allocation Failure", 105));
 }

@@ -26,13 +26,9 @@ class ZonetoolRecords : public ::testing::Test {
     const std::string cmd = tool + " " + args + " <" + dir.file("in.txt") + " >" + dir.file("out.txt") +
                             " 2>" + dir.file("err.txt");
     const int status = std::system(cmd.c_str());
-    out = read_text("out.txt");
-    err = read_text("err.txt");
+    out = test::read_text(dir.file("out.txt"));
+    err = test::read_text(dir.file("err.txt"));
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  }
-  std::string read_text(const std::string& name) {
-    const Bytes b = test::read_bytes(dir.file(name));
-    return std::string(b.begin(), b.end());
   }
 
   test::ScratchDir dir;

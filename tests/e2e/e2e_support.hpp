@@ -14,6 +14,7 @@
 #include <vector>
 
 #include "driver/test_files.hpp"
+#include "support/subprocess.hpp"
 
 namespace zt::e2e {
 
@@ -105,10 +106,7 @@ class ProgramRun {
   void put(const std::string& name, const std::string& text) const { test::write_text(path(name), text); }
   bool has(const std::string& name) const { return std::filesystem::exists(path(name)); }
   Bytes bytes(const std::string& name) const { return test::read_bytes(path(name)); }
-  std::string text(const std::string& name) const {
-    const Bytes b = bytes(name);
-    return std::string(b.begin(), b.end());
-  }
+  std::string text(const std::string& name) const { return test::read_text(path(name)); }
 
   // The usual parameter files of a run.
   void parameters() const {
@@ -125,9 +123,8 @@ class ProgramRun {
                             std::to_string(kRunTimeoutSeconds) + " '" + binary() + "' >'" + dir_.file("out.txt") +
                             "' 2>'" + dir_.file("err.txt") + "' </dev/null";
     const int status = std::system(cmd.c_str());
-    const Bytes o = test::read_bytes(dir_.file("out.txt")), e = test::read_bytes(dir_.file("err.txt"));
-    out = std::string(o.begin(), o.end());
-    err = std::string(e.begin(), e.end());
+    out = test::read_text(dir_.file("out.txt"));
+    err = test::read_text(dir_.file("err.txt"));
     return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
   }
 

@@ -12,13 +12,11 @@ namespace {
 class ZonetoolSvg : public ::testing::Test {
  protected:
   int svg(const std::string& args) {
-    const std::string tool = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool";
+    const std::string tool = test::zonetool_path();
     const std::string cmd = tool + " svg " + args + " >/dev/null 2>'" + dir.file("err.txt") + "'";
     const int status = std::system(cmd.c_str());
-    const Bytes e = test::read_bytes(dir.file("err.txt"));
-    err = std::string(e.begin(), e.end());
-    const Bytes o = test::read_bytes(dir.file("out.svg"));
-    out = std::string(o.begin(), o.end());
+    err = test::read_text(dir.file("err.txt"));
+    out = test::read_text(dir.file("out.svg"));
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
   }
   static int count(const std::string& s, const std::string& what) {

@@ -11,25 +11,13 @@
 #include <random>
 #include <vector>
 
-#include "vd_test_util.hpp"
+#include "node_match.hpp"
 
 namespace zt {
 namespace {
 
 using namespace vdtest;
 using BPoint = boost::polygon::point_data<int>;
-
-struct XY {
-  double x, y;
-};
-
-// Whether some point of `b` (sorted by x) lies within tol of p.
-bool Near(const std::vector<XY>& b, XY p, double tol) {
-  auto it = std::lower_bound(b.begin(), b.end(), p.x - tol, [](const XY& q, double v) { return q.x < v; });
-  for (; it != b.end() && it->x <= p.x + tol; ++it)
-    if (std::fabs(it->y - p.y) <= tol) return true;
-  return false;
-}
 
 struct Outcome {
   int boostChecked = 0, oursChecked = 0, skipped = 0;
@@ -56,59 +44,23 @@ Outcome Compare(const std::vector<BPoint>& input) {
   }
   const double tol = 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
 
-  // Corner points in user coordinates.
-  std::vector<XY> corners;
-  const vd::Engine& g = vd::Vd();
-  for (std::int32_t i : {0, 1, g.points.count - 2, g.points.count - 1})
-    corners.push_back({vd::ToUserX(g.points[i].x), vd::ToUserY(g.points[i].y)});
-  double cx0 = 1e300, cx1 = -1e300, cy0 = 1e300, cy1 = -1e300;
-  for (const XY& c : corners) cx0 = std::min(cx0, c.x), cx1 = std::max(cx1, c.x), cy0 = std::min(cy0, c.y), cy1 = std::max(cy1, c.y);
-
   // Our nodes whose sites are all caller points.
-  std::vector<char> real(VD_GetNodeCount(), 1);
-  for (std::int32_t e = 0; e < VD_GetEdgeCount(); ++e) {
-    const VD_EdgeInfo info = VD_GetEdge(e);
-    if (!info.live) continue;
-    const bool corner = info.ltype != 2 || info.rtype != 2 || VD_GetPointTag(info.lft) < 0 || VD_GetPointTag(info.rgt) < 0;
-    if (corner) real[info.n1] = real[info.n2] = 0;
-  }
-  std::vector<XY> ours, oursAll;
-  for (std::int32_t n = 4; n < VD_GetNodeCount(); ++n) {
-    const VD_NodeInfo info = VD_GetNode(n);
-    if (!info.live) continue;
-    oursAll.push_back({info.x, info.y});
-    if (real[n]) ours.push_back({info.x, info.y});
-  }
-  std::sort(oursAll.begin(), oursAll.end(), [](XY a, XY b) { return a.x < b.x; });
+  const OurNodes nodes = CollectNodes(
+      [](const VD_EdgeInfo& info) {
+        return info.ltype != 2 || info.rtype != 2 || VD_GetPointTag(info.lft) < 0 || VD_GetPointTag(info.rgt) < 0;
+      },
+      false);
 
   boost::polygon::voronoi_diagram<double> bd;
   boost::polygon::construct_voronoi(input.begin(), input.end(), &bd);
-  std::vector<XY> theirs;
-  for (const auto& v : bd.vertices()) {
-    const XY p{v.x(), v.y()};
-    theirs.push_back(p);
-    if (p.x < cx0 || p.x > cx1 || p.y < cy0 || p.y > cy1) continue;
-    // The circle of the vertex: through the site of one of its cells.
-    const auto* cell = v.incident_edge()->cell();
-    const BPoint& s = input[cell->source_index()];
-    const double r = std::hypot(p.x - s.x(), p.y - s.y());
-    bool holdsCorner = false;
-    for (const XY& c : corners) holdsCorner |= std::hypot(p.x - c.x, p.y - c.y) < r;
-    if (holdsCorner) { ++out.skipped; continue; }
-    ++out.boostChecked;
-    if (!Near(oursAll, p, tol)) {
-      out.error = "boost vertex (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") has no node";
-      return out;
-    }
-  }
-  std::sort(theirs.begin(), theirs.end(), [](XY a, XY b) { return a.x < b.x; });
-  for (const XY& p : ours) {
-    ++out.oursChecked;
-    if (!Near(theirs, p, tol)) {
-      out.error = "node (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") is no boost vertex";
-      return out;
-    }
-  }
+  // The circle of a vertex: through the site of one of its cells.
+  const auto clearance = [&](const auto& v, XY p) {
+    const BPoint& s = input[v.incident_edge()->cell()->source_index()];
+    return std::hypot(p.x - s.x(), p.y - s.y());
+  };
+  MatchCounts counts;
+  out.error = MatchBothWays(bd, clearance, nodes, tol, counts);
+  out.boostChecked = counts.theirsChecked, out.oursChecked = counts.oursChecked, out.skipped = counts.skipped;
   return out;
 }
 

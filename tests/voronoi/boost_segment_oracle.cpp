@@ -13,7 +13,7 @@
 #include <string>
 #include <vector>
 
-#include "vd_test_util.hpp"
+#include "node_match.hpp"
 
 namespace zt {
 namespace {
@@ -21,17 +21,6 @@ namespace {
 using namespace vdtest;
 using BPoint = boost::polygon::point_data<long long>;
 using BSegment = boost::polygon::segment_data<long long>;
-
-struct XY {
-  double x, y;
-};
-
-bool Near(const std::vector<XY>& b, XY p, double tol) {
-  auto it = std::lower_bound(b.begin(), b.end(), p.x - tol, [](const XY& q, double v) { return q.x < v; });
-  for (; it != b.end() && it->x <= p.x + tol; ++it)
-    if (std::fabs(it->y - p.y) <= tol) return true;
-  return false;
-}
 
 using Polygon = std::vector<BPoint>;
 
@@ -110,67 +99,29 @@ Outcome Compare(const std::vector<Polygon>& polys) {
     return out;
   }
   const double tol = 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
-  std::vector<XY> corners;
-  const vd::Engine& g = vd::Vd();
-  for (std::int32_t i : {0, 1, g.points.count - 2, g.points.count - 1})
-    corners.push_back({vd::ToUserX(g.points[i].x), vd::ToUserY(g.points[i].y)});
-  double cx0 = 1e300, cx1 = -1e300, cy0 = 1e300, cy1 = -1e300;
-  for (const XY& c : corners) cx0 = std::min(cx0, c.x), cx1 = std::max(cx1, c.x), cy0 = std::min(cy0, c.y), cy1 = std::max(cy1, c.y);
-
   // Proper nodes of ours: degree 3 and no corner site around.
-  std::vector<char> real(VD_GetNodeCount(), 1);
-  for (std::int32_t e = 0; e < VD_GetEdgeCount(); ++e) {
-    const VD_EdgeInfo info = VD_GetEdge(e);
-    if (!info.live) continue;
-    const auto corner = [](std::int32_t site, std::int32_t kind) {
-      return kind == 8 || (kind == 2 && VD_GetPointTag(site) < 0);
-    };
-    if (corner(info.lft, info.ltype) || corner(info.rgt, info.rtype)) real[info.n1] = real[info.n2] = 0;
-  }
-  std::vector<XY> ours, oursAll;
-  for (std::int32_t n = 4; n < VD_GetNodeCount(); ++n) {
-    const VD_NodeInfo info = VD_GetNode(n);
-    if (!info.live) continue;
-    oursAll.push_back({info.x, info.y});
-    if (real[n] && !info.degree2) ours.push_back({info.x, info.y});
-  }
-  std::sort(oursAll.begin(), oursAll.end(), [](XY a, XY b) { return a.x < b.x; });
+  const auto corner = [](std::int32_t site, std::int32_t kind) {
+    return kind == 8 || (kind == 2 && VD_GetPointTag(site) < 0);
+  };
+  const OurNodes nodes = CollectNodes(
+      [&](const VD_EdgeInfo& info) { return corner(info.lft, info.ltype) || corner(info.rgt, info.rtype); }, true);
 
   boost::polygon::voronoi_diagram<double> bd;
   boost::polygon::construct_voronoi(segs.begin(), segs.end(), &bd);
-  std::vector<XY> theirs;
-  for (const auto& v : bd.vertices()) {
-    const XY p{v.x(), v.y()};
-    theirs.push_back(p);
-    if (p.x < cx0 || p.x > cx1 || p.y < cy0 || p.y > cy1) continue;
-    // Clearance: distance to the site of one incident cell.
+  // Clearance: distance to the site of one incident cell.
+  const auto clearance = [&](const auto& v, XY p) {
     const auto* cell = v.incident_edge()->cell();
     const BSegment& s = segs[cell->source_index()];
-    double r;
     if (cell->contains_point()) {
       const BPoint q = cell->source_category() == boost::polygon::SOURCE_CATEGORY_SEGMENT_START_POINT ? s.low() : s.high();
-      r = std::hypot(p.x - double(q.x()), p.y - double(q.y()));
-    } else {
-      const double ax = double(s.low().x()), ay = double(s.low().y()), bx = double(s.high().x()), by = double(s.high().y());
-      r = std::fabs((bx - ax) * (p.y - ay) - (by - ay) * (p.x - ax)) / std::hypot(bx - ax, by - ay);
+      return std::hypot(p.x - double(q.x()), p.y - double(q.y()));
     }
-    bool holdsCorner = false;
-    for (const XY& c : corners) holdsCorner |= std::hypot(p.x - c.x, p.y - c.y) < r;
-    if (holdsCorner) continue;
-    ++out.boostChecked;
-    if (!Near(oursAll, p, tol)) {
-      out.error = "boost vertex (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") has no node";
-      return out;
-    }
-  }
-  std::sort(theirs.begin(), theirs.end(), [](XY a, XY b) { return a.x < b.x; });
-  for (const XY& p : ours) {
-    ++out.oursChecked;
-    if (!Near(theirs, p, tol)) {
-      out.error = "node (" + std::to_string(p.x) + ", " + std::to_string(p.y) + ") is no boost vertex";
-      return out;
-    }
-  }
+    const double ax = double(s.low().x()), ay = double(s.low().y()), bx = double(s.high().x()), by = double(s.high().y());
+    return std::fabs((bx - ax) * (p.y - ay) - (by - ay) * (p.x - ax)) / std::hypot(bx - ax, by - ay);
+  };
+  MatchCounts counts;
+  out.error = MatchBothWays(bd, clearance, nodes, tol, counts);
+  out.boostChecked = counts.theirsChecked, out.oursChecked = counts.oursChecked;
   return out;
 }
 

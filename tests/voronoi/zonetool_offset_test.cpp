@@ -2,36 +2,22 @@
 // its answers to bad arguments and input.
 #include <gtest/gtest.h>
 
-#include <sys/wait.h>
-
-#include <array>
-#include <cstdio>
 #include <fstream>
 #include <sstream>
 #include <string>
 
+#include "support/subprocess.hpp"
+
 namespace {
 
-struct ToolRun {
-  int status;
-  std::string out;
-};
+using ToolRun = zt::test::CommandRun;
 
 ToolRun Offset(const std::string& text, const std::string& args) {
   // ctest runs the cases as parallel processes: one input file each.
   const std::string file = testing::TempDir() + "zt_offset_" +
                            testing::UnitTest::GetInstance()->current_test_info()->name() + ".txt";
   std::ofstream(file) << text;
-  const std::string cmd = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool offset " + file + " " + args + " 2>&1";
-  FILE* p = popen(cmd.c_str(), "r");
-  ToolRun r{-1, ""};
-  if (!p) return r;
-  std::array<char, 4096> buf;
-  size_t n;
-  while ((n = fread(buf.data(), 1, buf.size(), p)) > 0) r.out.append(buf.data(), n);
-  const int st = pclose(p);
-  r.status = WIFEXITED(st) ? WEXITSTATUS(st) : -1;
-  return r;
+  return zt::test::run_command(zt::test::zonetool_path() + " offset " + file + " " + args + " 2>&1");
 }
 
 const char* kSquare = "0 0\n1 0\n1 1\n0 1\n0 0\n";

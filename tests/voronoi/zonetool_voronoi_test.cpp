@@ -2,21 +2,17 @@
 // input.
 #include <gtest/gtest.h>
 
-#include <sys/wait.h>
 #include <unistd.h>
 
-#include <array>
-#include <cstdio>
 #include <fstream>
 #include <sstream>
 #include <string>
 
+#include "support/subprocess.hpp"
+
 namespace {
 
-struct ToolRun {
-  int status;
-  std::string out;
-};
+using ToolRun = zt::test::CommandRun;
 
 ToolRun Zonetool(const std::string& text) {
   // One file per test and process: ctest runs the cases side by side.
@@ -24,16 +20,7 @@ ToolRun Zonetool(const std::string& text) {
                            testing::UnitTest::GetInstance()->current_test_info()->name() + "_" +
                            std::to_string(getpid()) + ".txt";
   std::ofstream(file) << text;
-  const std::string cmd = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool voronoi " + file + " 2>&1";
-  FILE* p = popen(cmd.c_str(), "r");
-  ToolRun r{-1, ""};
-  if (!p) return r;
-  std::array<char, 4096> buf;
-  size_t n;
-  while ((n = fread(buf.data(), 1, buf.size(), p)) > 0) r.out.append(buf.data(), n);
-  const int st = pclose(p);
-  r.status = WIFEXITED(st) ? WEXITSTATUS(st) : -1;
-  return r;
+  return zt::test::run_command(zt::test::zonetool_path() + " voronoi " + file + " 2>&1");
 }
 
 TEST(ZonetoolVoronoi, PrintsNodesEdgesAndFigures) {

@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+#include "support/scratch_dir.hpp"
+
 namespace {
 
 using zt::ContourStore;
@@ -52,13 +54,6 @@ std::string contour_file(const std::vector<Rec>& recs, int width, bool header = 
 
 class ContourStoreTest : public testing::Test {
  protected:
-  void SetUp() override {
-    char tmpl[] = "/tmp/zt_store_XXXXXX";
-    ASSERT_NE(mkdtemp(tmpl), nullptr);
-    dir_ = tmpl;
-  }
-  void TearDown() override { std::filesystem::remove_all(dir_); }
-
   // Writes the file, opens it as wf_add_level does and scans it.
   int load(const std::string& bytes) {
     path_ = dir_ + "/contour.bin";
@@ -75,7 +70,9 @@ class ContourStoreTest : public testing::Test {
     EXPECT_EQ(store_.levels[i].z, z) << "level " << i;
   }
 
-  std::string dir_, path_;
+  zt::test::ScratchDir scratch_;
+  const std::string dir_ = scratch_.path().string();
+  std::string path_;
   ContourStore store_;
 };
 

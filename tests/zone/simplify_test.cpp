@@ -3,7 +3,6 @@
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -11,6 +10,8 @@
 #include <random>
 #include <string>
 #include <vector>
+
+#include "support/subprocess.hpp"
 
 namespace {
 
@@ -270,17 +271,12 @@ TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
 // zonetool simplify's text form: blank lines only between polylines, shortest
 // numbers, bad input refused with status 2.
 TEST(ZonetoolSimplify, TextRoundTrip) {
-  const std::string tool = std::string(ZT_BINARY_DIR) + "/tools/zonetool/zonetool";
+  const std::string tool = zt::test::zonetool_path();
   if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
   auto run = [&](const std::string& args, const std::string& input, int& status) {
-    const std::string cmd = "printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null";
-    FILE* p = popen(cmd.c_str(), "r");
-    if (!p) return std::string("popen failed");
-    std::string out;
-    char buf[256];
-    for (size_t n; (n = fread(buf, 1, sizeof buf, p)) > 0;) out.append(buf, n);
-    status = WEXITSTATUS(pclose(p));
-    return out;
+    const zt::test::CommandRun r = zt::test::run_command("printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null");
+    status = r.status;
+    return r.out;
   };
   int status = -1;
   EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),

@@ -3,91 +3,30 @@
 // grow / unite / shrink over the levels), on generated pockets with islands
 // and rest material in their corners, on the real engines.
 #include <gtest/gtest.h>
-#include <polyclipping/clipper.hpp>
 
 #include <cmath>
 #include <map>
 #include <random>
 
 #include "zone/entry_points.hpp"
+#include "support/clipper_paths.hpp"
 #include "zone_test_support.hpp"
 
 namespace zt::testing {
 namespace {
 
 namespace cl = ClipperLib;
+using test::boundary_distance;
+using test::to_path;
 
-constexpr double kScale = 1e5;  // Clipper works on integers
+constexpr double kArcTolerance = 0.005;
 constexpr double kBoundaryDistance = 0.02;
 constexpr double kMergeRadius = 2.0;
 constexpr double kOffsetDistance = 1.0;
 
 using Poly = std::vector<Point2f>;  // closed: first point repeated
 
-cl::Path to_path(const Poly& p) {
-  cl::Path out;
-  for (size_t i = 0; i + 1 < p.size(); ++i) {
-    out.push_back({static_cast<cl::cInt>(std::llround(p[i].x * kScale)),
-                   static_cast<cl::cInt>(std::llround(p[i].y * kScale))});
-  }
-  return out;
-}
-
-cl::Paths offset(const cl::Paths& in, double delta) {
-  cl::ClipperOffset co(2.0, 0.005 * kScale);
-  co.AddPaths(in, cl::jtRound, cl::etClosedPolygon);
-  cl::Paths out;
-  co.Execute(out, delta * kScale);
-  return out;
-}
-
-cl::Paths boolean(const cl::Paths& a, const cl::Paths& b, cl::ClipType op) {
-  cl::Clipper c;
-  c.AddPaths(a, cl::ptSubject, true);
-  c.AddPaths(b, cl::ptClip, true);
-  cl::Paths out;
-  c.Execute(op, out, cl::pftNonZero, cl::pftNonZero);
-  return out;
-}
-
-struct Segment2 {
-  double ax, ay, bx, by;
-};
-double distance_to(double x, double y, const std::vector<Segment2>& edges) {
-  double best = 1e300;
-  for (const Segment2& e : edges) {
-    const double dx = e.bx - e.ax, dy = e.by - e.ay;
-    const double len2 = dx * dx + dy * dy;
-    double t = len2 > 0 ? ((x - e.ax) * dx + (y - e.ay) * dy) / len2 : 0.0;
-    t = std::clamp(t, 0.0, 1.0);
-    best = std::min(best, std::hypot(x - e.ax - t * dx, y - e.ay - t * dy));
-  }
-  return best;
-}
-
-// Largest distance from a boundary point (vertices and edge midpoints) of
-// either side to the other side's boundary.
-double boundary_distance(const std::vector<Poly>& ours, const cl::Paths& ref) {
-  std::vector<Segment2> a, b;
-  for (const Poly& p : ours) {
-    for (size_t i = 0; i + 1 < p.size(); ++i) a.push_back({p[i].x, p[i].y, p[i + 1].x, p[i + 1].y});
-  }
-  for (const cl::Path& p : ref) {
-    for (size_t i = 0; i < p.size(); ++i) {
-      const cl::IntPoint &s = p[i], &e = p[(i + 1) % p.size()];
-      b.push_back({s.X / kScale, s.Y / kScale, e.X / kScale, e.Y / kScale});
-    }
-  }
-  if (a.empty() || b.empty()) return a.empty() && b.empty() ? 0.0 : 1e300;
-  double worst = 0.0;
-  for (const auto& [from, to] : {std::make_pair(&a, &b), std::make_pair(&b, &a)}) {
-    for (const Segment2& e : *from) {
-      worst = std::max(worst, distance_to(e.ax, e.ay, *to));
-      worst = std::max(worst, distance_to(0.5 * (e.ax + e.bx), 0.5 * (e.ay + e.by), *to));
-    }
-  }
-  return worst;
-}
+cl::Paths offset(const cl::Paths& in, double delta) { return test::round_offset(in, delta, kArcTolerance); }
 
 struct Level {
   float z;
@@ -145,9 +84,9 @@ std::map<float, cl::Paths> reference(const std::vector<Level>& levels) {
     for (const Poly& p : it->rest) rest.push_back(to_path(p));
     const bool hasRest = !rest.empty();
     if (hasRest) {
-      const cl::Paths zones = boolean(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
+      const cl::Paths zones = test::clip(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
       if (!zones.empty()) {
-        carried = boolean(carried, offset(zones, kMergeRadius + 0.04), cl::ctUnion);
+        carried = test::clip(carried, offset(zones, kMergeRadius + 0.04), cl::ctUnion);
         last = offset(carried, -kMergeRadius);
         any = true;
       }
@@ -196,7 +135,7 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
       cl::Paths pocket, rest;
       for (const Poly& p : l.pocket) pocket.push_back(to_path(p));
       for (const Poly& p : l.rest) rest.push_back(to_path(p));
-      const cl::Paths want = boolean(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
+      const cl::Paths want = test::clip(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
       std::vector<Poly> got(1);
       for (const Point2f& p : zone_builder().context->levelResult) {
         if (p.x < 99990.0f) got.back().push_back(p);

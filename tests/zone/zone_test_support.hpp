@@ -16,6 +16,7 @@
 #include <string>
 #include <vector>
 
+#include "support/scratch_dir.hpp"
 #include "zone/offset_engine.hpp"
 #include "zone/zone_context.hpp"
 
@@ -143,9 +144,6 @@ class BoxOffsetEngine : public FakeEngine {
 class ZoneTmpTest : public ::testing::Test {
  protected:
   void SetUp() override {
-    char pattern[] = "/tmp/zt_zone_XXXXXX";
-    ASSERT_NE(::mkdtemp(pattern), nullptr);
-    dir_ = pattern;
     ::setenv("KVLTMPDIR", dir_.c_str(), 1);
     reset_zone_builder();
   }
@@ -153,19 +151,14 @@ class ZoneTmpTest : public ::testing::Test {
     reset_zone_builder();
     set_offset_engine(nullptr);
     ::unsetenv("KVLTMPDIR");
-    std::filesystem::remove_all(dir_);
   }
   std::string path(const std::string& name) const { return dir_ + "/" + name; }
   void write_file(const std::string& name, const std::string& content) const {
-    std::ofstream(path(name), std::ios::binary) << content;
+    test::write_text(path(name), content);
   }
-  std::string read_file(const std::string& name) const {
-    std::ifstream in(path(name), std::ios::binary);
-    std::ostringstream s;
-    s << in.rdbuf();
-    return s.str();
-  }
-  std::string dir_;
+  std::string read_file(const std::string& name) const { return test::read_text(path(name)); }
+  test::ScratchDir scratch_;
+  const std::string dir_ = scratch_.path().string();
 };
 
 // A record file of 18-byte point records: per level its contours, each
