@@ -1,0 +1,157 @@
+// The runtime's cases kept as data: every case of data/*.cases runs as one
+// named test in a fresh RuntimeTest, its commands in order (the format is
+// described at the top of each data file).
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+
+#include "runtime/detail/runtime_state.hpp"
+#include "runtime/environment.hpp"
+#include "runtime/path_expansion.hpp"
+#include "runtime_fixture.hpp"
+
+namespace zt {
+namespace {
+
+using Words = std::vector<std::string>;
+
+struct Case {
+  std::string name, where;                  // "file:line" of the case line
+  std::vector<std::pair<int, Words>> lines;  // commands with their line numbers
+};
+
+// Words are blank-separated; a quoted word may hold blanks and \n \r \t \" \\ \xHH.
+Words split(const std::string& line) {
+  Words out;
+  for (std::size_t i = 0; i < line.size();) {
+    if (line[i] == ' ') { ++i; continue; }
+    std::string w;
+    if (line[i] != '"') {
+      while (i < line.size() && line[i] != ' ') w += line[i++];
+    } else {
+      for (++i; i < line.size() && line[i] != '"'; ++i) {
+        if (line[i] != '\\' || i + 1 == line.size()) { w += line[i]; continue; }
+        const char e = line[++i];
+        if (e == 'x') w += static_cast<char>(std::stoi(line.substr(i + 1, 2), nullptr, 16)), i += 2;
+        else w += e == 'n' ? '\n' : e == 'r' ? '\r' : e == 't' ? '\t' : e;
+      }
+      ++i;
+    }
+    out.push_back(w);
+  }
+  return out;
+}
+
+std::vector<Case> load_cases() {
+  std::vector<Case> cases;
+  for (const char* file : {"expansion", "configuration", "workzone"}) {
+    std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/" + file + ".cases");
+    std::string line;
+    for (int n = 1; std::getline(in, line); ++n) {
+      const Words w = split(line);
+      if (w.empty() || w[0][0] == '#') continue;
+      if (w[0] != "case") {
+        if (!cases.empty()) cases.back().lines.emplace_back(n, w);
+        continue;
+      }
+      std::string name = file, where = file;
+      cases.push_back({name.append("_").append(w.at(1)), where.append(":").append(std::to_string(n)), {}});
+    }
+  }
+  return cases;
+}
+
+void PrintTo(const Case& c, std::ostream* os) { *os << c.where; }
+
+class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<Case> {
+ protected:
+  // "@" is the test directory; a relative path lies in it.
+  std::string at(const std::string& s) const {
+    std::string out;
+    for (char c : s) c == '@' ? out += dir_ : out += c;
+    return out;
+  }
+  std::string in_dir(const std::string& s) const { return (std::filesystem::path(dir_) / at(s)).string(); }
+  static std::string shown(const char* text) { return text ? text : "<none>"; }
+  static std::string shown(const std::optional<std::string>& text) { return text.value_or("<none>"); }
+  // The next unchecked diagnostic of a kind.
+  void next(const std::vector<std::string>& list, std::size_t& seen, const std::string& expected) {
+    ASSERT_LT(seen, list.size()) << "no more diagnostics";
+    EXPECT_EQ(list[seen++], expected);
+  }
+  void run(const Words& w);
+
+  char out_[600] = "stale";
+  ConfigTable table_;
+  std::size_t warnings_seen_ = 0, fatals_seen_ = 0;
+};
+
+void RuntimeCases::run(const Words& raw) {
+  Words w;
+  for (const std::string& s : raw) w.push_back(at(s));
+  const std::string& op = w[0];
+  const auto status = [&](std::size_t i) { return static_cast<std::int32_t>(std::stol(w.at(i))); };
+  std::int32_t s = 0;
+  if (op == "env") set_env(w.at(1), w.at(2));
+  else if (op == "unenv") unset_env(w.at(1));
+  else if (op == "file") write_file(w.at(1), w.at(2));
+  else if (op == "config") write_install_config(w.at(1));
+  else if (op == "mkdir") std::filesystem::create_directories(in_dir(w.at(1)));
+  else if (op == "remove") std::filesystem::remove(in_dir(w.at(1)));
+  else if (op == "exists") {
+    const std::string p = in_dir(w.at(1));
+    EXPECT_EQ(std::filesystem::is_directory(p) ? "dir" : std::filesystem::exists(p) ? "yes" : "no", w.at(2));
+  } else if (op == "read") EXPECT_EQ(shown(read_file(w.at(1))), w.at(2));
+  else if (op == "expand") {  // in place, in a buffer of the given capacity
+    const std::int32_t capacity = status(2);
+    std::string buffer(static_cast<std::size_t>(capacity), '\0');
+    std::memcpy(buffer.data(), w[1].c_str(), std::min(w[1].size() + 1, buffer.size()));
+    EXPECT_EQ(expand_path(buffer.data(), capacity), status(3));
+    EXPECT_EQ(std::string(buffer.c_str()), w.at(4));
+  } else if (op == "name") {  // the name's first LEN bytes into the case's buffer, said to hold CAP
+    expand_name(w[1].c_str(), status(2), out_, status(3), s);
+    EXPECT_EQ(s, status(4));
+    if (w.size() > 5) { EXPECT_EQ(std::string(out_), w[5]); }
+  } else if (op == "existing") {
+    expand_existing(w[1].c_str(), static_cast<std::int32_t>(w[1].size()), out_, sizeof out_, s);
+    EXPECT_EQ(s, status(2));
+    if (w.size() > 3) { EXPECT_EQ(std::string(out_), w[3]); }
+  } else if (op == "string") {
+    std::string converted = "untouched";
+    EXPECT_EQ(expand_to_string(w.at(1), converted), status(2));
+    EXPECT_EQ(converted, w.at(3));
+  } else if (op == "delete") {
+    delete_file(w.at(1).c_str(), static_cast<std::int32_t>(w[1].size()), s);
+    EXPECT_EQ(s, status(2));
+  } else if (op == "load") {  // the files, in order, into a fresh table
+    table_.clear();
+    for (std::size_t i = 1; i + 1 < w.size(); ++i) EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
+  } else if (op == "value") EXPECT_EQ(shown(table_.value(w.at(1), w.at(2))), w.at(3));
+  else if (op == "origin") EXPECT_EQ(table_.origin(w.at(1), w.at(2)), w.at(3));
+  else if (op == "variable") EXPECT_EQ(shown(get_variable(w.at(1).c_str())), w.at(2));
+  else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
+  else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
+  else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
+  else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
+  else if (op == "fatal") next(fatals, fatals_seen_, w.at(1));
+  else if (op == "warnings") { EXPECT_EQ(warnings.size(), std::stoul(w.at(1))); }
+  else if (op == "fatals") { EXPECT_EQ(fatals.size(), std::stoul(w.at(1))); }
+  else if (op == "clear") warnings.clear(), fatals.clear(), warnings_seen_ = fatals_seen_ = 0;
+  else ADD_FAILURE() << "unknown command " << op;
+}
+
+TEST_P(RuntimeCases, Run) {
+  SCOPED_TRACE(GetParam().where);
+  for (const auto& [line, words] : GetParam().lines) {
+    SCOPED_TRACE("line " + std::to_string(line));
+    run(words);
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(load_cases()),
+                         [](const auto& info) { return info.param.name; });
+
+}  // namespace
+}  // namespace zt
