@@ -3,6 +3,7 @@
 // described at the top of each data file).
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -130,7 +131,17 @@ void RuntimeCases::run(const Words& raw) {
     for (std::size_t i = 1; i + 1 < w.size(); ++i) EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
   } else if (op == "value") EXPECT_EQ(shown(table_.value(w.at(1), w.at(2))), w.at(3));
   else if (op == "origin") EXPECT_EQ(table_.origin(w.at(1), w.at(2)), w.at(3));
-  else if (op == "variable") EXPECT_EQ(shown(get_variable(w.at(1).c_str())), w.at(2));
+  else if (op == "installed-origin") EXPECT_EQ(configuration().origin(w.at(1), w.at(2)), w.at(3));
+  else if (op == "environment") load_environment();
+  else if (op == "reset") detail::reset_runtime_state();
+  else if (op == "trace") {
+    ASSERT_FALSE(traces.empty());
+    EXPECT_EQ(w.at(1) == "first" ? traces.front() : traces.back(), w.at(2));
+  } else if (op == "traces") {  // how many start with PREFIX; "N+": at least N
+    const auto n = std::count_if(traces.begin(), traces.end(), [&](auto& t) { return t.rfind(w.at(1), 0) == 0; });
+    if (w.at(2).back() == '+') { EXPECT_GE(n, std::stol(w[2])); }
+    else { EXPECT_EQ(n, std::stol(w[2])); }
+  } else if (op == "variable") EXPECT_EQ(shown(get_variable(w.at(1).c_str())), w.at(2));
   else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
   else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
   else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
