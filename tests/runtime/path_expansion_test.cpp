@@ -1,6 +1,6 @@
 // Path expansion beyond the cases of data/expansion.cases: arguments no text
-// can carry, deep and doubling references, the zone hook, random texts and
-// the small-buffer hunting aids.
+// can carry, deep and doubling references, the zone hook, random texts, the
+// small-buffer hunting aids, and the default fatal end of a missing workzone.
 #include "runtime/path_expansion.hpp"
 
 #include <cstring>
@@ -119,6 +119,15 @@ TEST_F(ExpansionTest, SmallBufferHuntingAids) {
   EXPECT_DEATH(expand_name("toolong", 7, out, 4, status), "");
   expand_name("fits", 4, out, 5, status);
   EXPECT_EQ(status, kExpandOk);
+}
+
+TEST_F(ExpansionTest, DefaultFatalHandlerEndsWithStatusMinusOne) {
+  EXPECT_EXIT(
+      {
+        set_fatal_handler(nullptr);
+        temp_directory();
+      },
+      ::testing::ExitedWithCode(255), "KVLZONE is not defined");
 }
 
 }  // namespace

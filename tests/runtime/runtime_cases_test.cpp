@@ -82,6 +82,11 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
     ASSERT_LT(seen, list.size()) << "no more diagnostics";
     EXPECT_EQ(list[seen++], expected);
   }
+  // "N": exactly N, "N+": at least N.
+  static void count(std::size_t n, const std::string& expected) {
+    if (expected.back() == '+') { EXPECT_GE(n, std::stoul(expected)); }
+    else { EXPECT_EQ(n, std::stoul(expected)); }
+  }
   void run(const Words& w);
 
   char out_[600] = "stale";
@@ -137,18 +142,16 @@ void RuntimeCases::run(const Words& raw) {
   else if (op == "trace") {
     ASSERT_FALSE(traces.empty());
     EXPECT_EQ(w.at(1) == "first" ? traces.front() : traces.back(), w.at(2));
-  } else if (op == "traces") {  // how many start with PREFIX; "N+": at least N
-    const auto n = std::count_if(traces.begin(), traces.end(), [&](auto& t) { return t.rfind(w.at(1), 0) == 0; });
-    if (w.at(2).back() == '+') { EXPECT_GE(n, std::stol(w[2])); }
-    else { EXPECT_EQ(n, std::stol(w[2])); }
+  } else if (op == "traces") {  // how many start with PREFIX
+    count(std::count_if(traces.begin(), traces.end(), [&](auto& t) { return t.rfind(w.at(1), 0) == 0; }), w.at(2));
   } else if (op == "variable") EXPECT_EQ(shown(get_variable(w.at(1).c_str())), w.at(2));
   else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
   else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
   else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
   else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
   else if (op == "fatal") next(fatals, fatals_seen_, w.at(1));
-  else if (op == "warnings") { EXPECT_EQ(warnings.size(), std::stoul(w.at(1))); }
-  else if (op == "fatals") { EXPECT_EQ(fatals.size(), std::stoul(w.at(1))); }
+  else if (op == "warnings") count(warnings.size(), w.at(1));
+  else if (op == "fatals") count(fatals.size(), w.at(1));
   else if (op == "clear") warnings.clear(), fatals.clear(), warnings_seen_ = fatals_seen_ = 0;
   else ADD_FAILURE() << "unknown command " << op;
 }
