@@ -1,72 +1,25 @@
 // The runtime's cases kept as data: every case of data/*.cases runs as one
-// named test in a fresh RuntimeTest, its commands in order (the format is
-// described at the top of each data file).
+// named test in a fresh RuntimeTest, its commands in order (described at the
+// top of data/expansion.cases).
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cstring>
 #include <filesystem>
-#include <fstream>
 
 #include "runtime/detail/runtime_state.hpp"
 #include "runtime/environment.hpp"
 #include "runtime/path_expansion.hpp"
 #include "runtime_fixture.hpp"
+#include "support/case_script.hpp"
 
 namespace zt {
 namespace {
 
-using Words = std::vector<std::string>;
+using test::ScriptCase;
+using test::Words;
 
-struct Case {
-  std::string name, where;                  // "file:line" of the case line
-  std::vector<std::pair<int, Words>> lines;  // commands with their line numbers
-};
-
-// Words are blank-separated; a quoted word may hold blanks and \n \r \t \" \\ \xHH.
-Words split(const std::string& line) {
-  Words out;
-  for (std::size_t i = 0; i < line.size();) {
-    if (line[i] == ' ') { ++i; continue; }
-    std::string w;
-    if (line[i] != '"') {
-      while (i < line.size() && line[i] != ' ') w += line[i++];
-    } else {
-      for (++i; i < line.size() && line[i] != '"'; ++i) {
-        if (line[i] != '\\' || i + 1 == line.size()) { w += line[i]; continue; }
-        const char e = line[++i];
-        if (e == 'x') w += static_cast<char>(std::stoi(line.substr(i + 1, 2), nullptr, 16)), i += 2;
-        else w += e == 'n' ? '\n' : e == 'r' ? '\r' : e == 't' ? '\t' : e;
-      }
-      ++i;
-    }
-    out.push_back(w);
-  }
-  return out;
-}
-
-std::vector<Case> load_cases() {
-  std::vector<Case> cases;
-  for (const char* file : {"expansion", "configuration", "workzone"}) {
-    std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/" + file + ".cases");
-    std::string line;
-    for (int n = 1; std::getline(in, line); ++n) {
-      const Words w = split(line);
-      if (w.empty() || w[0][0] == '#') continue;
-      if (w[0] != "case") {
-        if (!cases.empty()) cases.back().lines.emplace_back(n, w);
-        continue;
-      }
-      std::string name = file, where = file;
-      cases.push_back({name.append("_").append(w.at(1)), where.append(":").append(std::to_string(n)), {}});
-    }
-  }
-  return cases;
-}
-
-void PrintTo(const Case& c, std::ostream* os) { *os << c.where; }
-
-class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<Case> {
+class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
   // "@" is the test directory; a relative path lies in it.
   std::string at(const std::string& s) const {
@@ -164,7 +117,7 @@ TEST_P(RuntimeCases, Run) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(load_cases()),
+INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone"})),
                          [](const auto& info) { return info.param.name; });
 
 }  // namespace
