@@ -4,10 +4,10 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
-#include <cmath>
-#include <cstring>
+#include <cstdio>
 
 #include "driver/detail/message_tables.hpp"
+#include "driver/level_tables.hpp"
 #include "driver/logical_units.hpp"
 #include "driver/message_text.hpp"
 #include "driver/record_files.hpp"
@@ -37,9 +37,19 @@ class DriverCases : public test::SuiteEnv, public ::testing::WithParamInterface<
     for (int i = 1; i <= lines; ++i) s += "line " + std::to_string(i) + "\n";
     return s;
   }
+  void TearDown() override {
+    for (std::int32_t unit = 3; unit < 10; ++unit) close_unit(unit);
+  }
+  // A float as the shortest text that reads back as the same float.
+  static std::string f(float v) {
+    char text[32];
+    std::snprintf(text, sizeof text, "%.9g", v);
+    return text;
+  }
   void run(const Words& w);
 
   std::string out_, err_;
+  LevelTable table_;
 };
 
 std::int32_t num(const std::string& s) { return static_cast<std::int32_t>(std::stol(s)); }
@@ -67,11 +77,12 @@ void DriverCases::run(const Words& raw) {
       b.insert(b.end(), reinterpret_cast<const std::uint8_t*>(&f), reinterpret_cast<const std::uint8_t*>(&f) + 4);
     }
     test::write_bytes(w.at(1), b);
-  } else if (op == "points") {  // PATH SIZE then "sep", "zeros:N" or x y z for each record
+  } else if (op == "points") {  // PATH SIZE then "sep", "zeros:N", "size:N" or x y z
     std::vector<test::Bytes> records;
-    const std::size_t size = std::stoul(w.at(2));
+    std::size_t size = std::stoul(w.at(2));
     for (std::size_t i = 3; i < w.size(); ++i) {
-      if (w[i] == "sep") records.push_back(test::separator(size));
+      if (w[i].rfind("size:", 0) == 0) size = std::stoul(w[i].substr(5));
+      else if (w[i] == "sep") records.push_back(test::separator(size));
       else if (w[i].rfind("zeros:", 0) == 0) records.emplace_back(std::stoul(w[i].substr(6)), 0);
       else records.push_back(test::point(std::stof(w[i]), std::stof(w.at(i + 1)), std::stof(w.at(i + 2)), size)), i += 2;
     }
@@ -124,7 +135,29 @@ void DriverCases::run(const Words& raw) {
     std::int32_t n = 0;
     (op == "message" ? message_text : message_text_e)(num(w.at(1)), buffer, 80, n);
     EXPECT_EQ(std::string(buffer, static_cast<std::size_t>(n)), w.at(2));
-  } else if (op == "reset-messages") detail::reset_message_tables();
+  } else if (op == "scan") {  // PATH then Z:FIRST-LAST of each level, on unit 3
+    close_unit(3);
+    attach_record_input(3, w.at(1));
+    scan_levels(3, table_);
+    rewind_unit(3);
+    Words levels, expected;
+    for (std::int32_t i = 0; i < table_.count(); ++i)
+      levels.push_back(f(table_.z[i]) + ":" + std::to_string(table_.range[i].first) + "-" + std::to_string(table_.range[i].last));
+    for (std::size_t i = 2; i < w.size(); ++i) expected.push_back(f(std::stof(w[i])) + w[i].substr(w[i].find(':')));
+    EXPECT_EQ(levels, expected);
+  } else if (op == "find") {  // Z then the first record, or "none" (and nothing changed)
+    std::int32_t first = -7, last = -7;
+    const bool found = find_level(std::stof(w.at(1)), table_, first, last);
+    EXPECT_EQ(found ? std::to_string(first) : first == -7 ? "none" : "changed", w.at(2));
+  } else if (op == "level-points") {  // FIRST LAST then the x of each point read
+    std::vector<Point2f> points;
+    read_level_points(3, num(w.at(1)), num(w.at(2)), points);
+    Words xs, expected;
+    for (const Point2f& p : points) xs.push_back(f(p.x));
+    for (std::size_t i = 3; i < w.size(); ++i) expected.push_back(f(std::stof(w[i])));
+    EXPECT_EQ(xs, expected);
+  } else if (op == "position") EXPECT_EQ(record_position(3), num(w.at(1)));
+  else if (op == "reset-messages") detail::reset_message_tables();
   else if (op == "zonetool") {  // STATUS STDIN ARGS...: the built zonetool
     test::write_text(tmp.file("stdin"), w.at(2));
     std::string cmd = test::zonetool_path();
@@ -146,7 +179,7 @@ TEST_P(DriverCases, Run) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, DriverCases, ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool"})),
+INSTANTIATE_TEST_SUITE_P(Data, DriverCases, ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool", "levels"})),
                          [](const auto& info) { return info.param.name; });
 
 }  // namespace
