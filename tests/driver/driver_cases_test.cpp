@@ -63,9 +63,18 @@ void DriverCases::run(const Words& raw) {
   const auto length = static_cast<std::int32_t>(name.size());
   std::int32_t ierr = -99;
   bool yes = false;
-  if (op == "exits") {  // the rest of the line ends the process (its standard output shown as errors)
-    const Words rest(raw.begin() + 3, raw.end());
-    EXPECT_EXIT((::dup2(2, 1), run(rest)), ::testing::ExitedWithCode(num(w.at(1))), w.at(2));
+  if (op == "exits") {  // the rest of the line, commands parted by ";", ends the process
+    const auto rest = [&] {
+      ::dup2(2, 1);  // standard output shown as errors
+      Words command;
+      for (auto it = raw.begin() + 3;; ++it) {
+        if (it != raw.end() && *it != ";") { command.push_back(*it); continue; }
+        run(command);
+        command.clear();
+        if (it == raw.end()) break;
+      }
+    };
+    EXPECT_EXIT(rest(), ::testing::ExitedWithCode(num(w.at(1))), w.at(2));
   } else if (op == "env") ::setenv(w.at(1).c_str(), w.at(2).c_str(), 1);
   else if (op == "text") test::write_text(w.at(1), w.at(2));
   else if (op == "numbered") test::write_text(w.at(1), numbered(num(w.at(2))) + (w.size() > 3 ? w[3] : ""));
@@ -94,6 +103,7 @@ void DriverCases::run(const Words& raw) {
   } else if (op == "remove") std::filesystem::remove(w.at(1));
   else if (op == "mkdir") std::filesystem::create_directories(w.at(1));
   else if (op == "present") EXPECT_EQ(std::filesystem::exists(w.at(1)) ? "yes" : "no", w.at(2));
+  else if (op == "same") EXPECT_EQ(test::read_bytes(w.at(1)), test::read_bytes(w.at(2)));
   else if (op == "size") EXPECT_EQ(test::read_bytes(w.at(1)).size(), std::stoul(w.at(2)));
   else if (op == "hex" || op == "head") {  // the whole file, or its first bytes
     std::string hex;
@@ -105,6 +115,14 @@ void DriverCases::run(const Words& raw) {
   } else if (op == "open" || op == "opensq") {  // NAME UNIT MODE IERR
     (op == "open" ? open_unformatted : opensq)(num(w.at(2)), name.data(), length, num(w.at(3)), ierr);
     EXPECT_EQ(ierr, num(w.at(4)));
+  } else if (op == "attach-in") attach_record_input(num(w.at(1)), w.at(2));
+  else if (op == "attach-out") attach_record_output(num(w.at(1)), w.at(2));
+  else if (op == "write-point") write_point_record(num(w.at(1)), 0, 0, 0, kPointCode, kPointFlag);
+  else if (op == "free-unit") EXPECT_EQ(free_unit(), num(w.at(1)));
+  else if (op == "get-free-unit") {
+    std::int32_t unit = 0;
+    get_free_unit(unit);
+    EXPECT_EQ(unit, num(w.at(1)));
   } else if (op == "attached") EXPECT_EQ(unit_attached(num(w.at(1))) ? "yes" : "no", w.at(2));
   else if (op == "close") close_unit(num(w.at(1)));
   else if (op == "xyz") {  // UNIT then x y z, or "end"
