@@ -10,6 +10,7 @@
 #include "runtime/detail/runtime_state.hpp"
 #include "runtime/environment.hpp"
 #include "runtime/path_expansion.hpp"
+#include "runtime/progress.hpp"
 #include "runtime_fixture.hpp"
 #include "support/case_script.hpp"
 
@@ -101,7 +102,11 @@ void RuntimeCases::run(const Words& raw) {
   else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
   else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
   else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
-  else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
+  else if (op == "progress") {  // TOTAL CURRENT then the bytes written to standard output
+    ::testing::internal::CaptureStdout();
+    progress(status(1), status(2));
+    EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(3));
+  } else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
   else if (op == "fatal") next(fatals, fatals_seen_, w.at(1));
   else if (op == "warnings") count(warnings.size(), w.at(1));
   else if (op == "fatals") count(fatals.size(), w.at(1));
@@ -117,7 +122,7 @@ TEST_P(RuntimeCases, Run) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone"})),
+INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone", "progress"})),
                          [](const auto& info) { return info.param.name; });
 
 }  // namespace
