@@ -6,13 +6,19 @@
 #include <algorithm>
 #include <cstring>
 #include <filesystem>
+#include <functional>
+#include <map>
+#include <memory>
+#include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
 #include "runtime/environment.hpp"
 #include "runtime/path_expansion.hpp"
 #include "runtime/progress.hpp"
+#include "runtime/record_readers.hpp"
 #include "runtime_fixture.hpp"
 #include "support/case_script.hpp"
+#include "support/record_bytes.hpp"
 
 namespace zt {
 namespace {
@@ -22,10 +28,10 @@ using test::Words;
 
 class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
-  // "@" is the test directory; a relative path lies in it.
+  // "@" before "/" or at the end of a word is the test directory; a relative path lies in it.
   std::string at(const std::string& s) const {
     std::string out;
-    for (char c : s) c == '@' ? out += dir_ : out += c;
+    for (std::size_t i = 0; i < s.size(); ++i) out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
     return out;
   }
   std::string in_dir(const std::string& s) const { return (std::filesystem::path(dir_) / at(s)).string(); }
@@ -43,7 +49,13 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
   }
   void run(const Words& w);
 
+  template <class T>
+  static std::string bytes_of(T v) { return std::string(reinterpret_cast<const char*>(&v), sizeof v); }  // little-endian host
+
   char out_[600] = "stale";
+  std::unique_ptr<CKvlBinaryResFileReader> reader_;
+  std::vector<std::string> messages_;
+  std::size_t messages_seen_ = 0;
   ConfigTable table_;
   std::size_t warnings_seen_ = 0, fatals_seen_ = 0;
 };
@@ -102,6 +114,47 @@ void RuntimeCases::run(const Words& raw) {
   else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
   else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
   else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
+  else if (op == "records") {  // PATH then each record: floats, "iN" int32, "sN" int16, parted by ","
+    std::vector<std::string> records;
+    for (std::size_t i = 2; i < w.size(); ++i) {
+      std::string r, v;
+      for (std::stringstream values(w[i] == "-" ? "" : w[i]); std::getline(values, v, ',');)
+        r += v[0] == 'i' ? bytes_of(static_cast<std::int32_t>(std::stol(v.substr(1))))
+             : v[0] == 's' ? bytes_of(static_cast<std::int16_t>(std::stoi(v.substr(1)))) : bytes_of(std::stof(v));
+      records.push_back(r);
+    }
+    write_file(w.at(1), test::segmented_record_file(records));
+  } else if (op == "poke") {  // PATH OFFSET BYTE
+    std::string bytes = *read_file(w.at(1));
+    bytes.at(std::stoul(w.at(2))) = static_cast<char>(std::stoi(w.at(3)));
+    write_file(w[1], bytes);
+  } else if (op == "cut") write_file(w.at(1), read_file(w.at(1))->substr(0, std::stoul(w.at(2))));
+  else if (op == "reader") {  // PATH STATUS [unlocked]: a new points reader, opened
+    reader_ = std::make_unique<CKvlBinaryResFileReader>(w.size() > 3);
+    reader_->setMessageHandler([](void* self, const char* text) { static_cast<RuntimeCases*>(self)->messages_.emplace_back(text); }, this);
+    EXPECT_EQ(reader_->openPoints(in_dir(w.at(1)).c_str()), status(2));
+  } else if (op == "get") {  // the reader's NAME is VALUE
+    const std::map<std::string, std::function<double()>> get = {
+        {"recordSize", [&] { return reader_->recordSize(); }}, {"recordCount", [&] { return reader_->recordCount(); }},
+        {"hasCode", [&] { return reader_->hasCode(); }}, {"hasFlag", [&] { return reader_->hasFlag(); }},
+        {"headerValue", [&] { return reader_->headerValue(); }}, {"headerCount", [&] { return reader_->headerCount(); }},
+        {"recordsRead", [&] { return reader_->recordsRead(); }}, {"tell", [&] { return reader_->tell(); }},
+        {"pendingLength", [&] { return reader_->pendingLength(); }}};
+    EXPECT_EQ(get.at(w.at(1))(), std::stod(w.at(2)));
+  } else if (op == "seek") EXPECT_EQ(reader_->seekToPoint(std::stol(w.at(1))), status(2));
+  else if (op == "point") {  // N [X Y Z [CODE|- FLAG]] from (5, 6, 7), code 9, flag 9
+    float p[3] = {5, 6, 7};
+    std::int32_t code = 9;
+    std::int16_t flag = 9;
+    const bool with_flag = w.size() > 6, with_code = with_flag && w[5] != "-";
+    EXPECT_EQ(reader_->readPoint(p[0], p[1], p[2], with_code ? &code : nullptr, with_flag ? &flag : nullptr), std::stol(w.at(1)));
+    for (std::size_t i = 2; i < w.size() && i < 5; ++i) EXPECT_EQ(p[i - 2], std::stof(w[i])) << "coordinate " << i - 2;
+    if (with_code) { EXPECT_EQ(code, status(5)); }
+    if (with_flag) { EXPECT_EQ(flag, status(6)); }
+  } else if (op == "reader-message") {  // the next message of the reader starts with TEXT
+    ASSERT_LT(messages_seen_, messages_.size());
+    EXPECT_EQ(messages_[messages_seen_++].rfind(w.at(1), 0), 0u) << messages_[messages_seen_ - 1];
+  } else if (op == "reader-messages") EXPECT_EQ(messages_.size(), std::stoul(w.at(1)));
   else if (op == "progress") {  // TOTAL CURRENT then the bytes written to standard output
     ::testing::internal::CaptureStdout();
     progress(status(1), status(2));
@@ -122,7 +175,7 @@ TEST_P(RuntimeCases, Run) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone", "progress"})),
+INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone", "progress", "readers"})),
                          [](const auto& info) { return info.param.name; });
 
 }  // namespace
