@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include <array>
 #include <cstdio>
 
 #include "driver/detail/message_tables.hpp"
@@ -53,6 +54,10 @@ class DriverCases : public test::SuiteEnv, public ::testing::WithParamInterface<
 };
 
 std::int32_t num(const std::string& s) { return static_cast<std::int32_t>(std::stol(s)); }
+// The three floats from word i on.
+std::array<float, 3> xyz(const Words& w, std::size_t i) {
+  return {std::stof(w.at(i)), std::stof(w.at(i + 1)), std::stof(w.at(i + 2))};
+}
 
 void DriverCases::run(const Words& raw) {
   Words w;
@@ -78,7 +83,10 @@ void DriverCases::run(const Words& raw) {
   } else if (op == "env") ::setenv(w.at(1).c_str(), w.at(2).c_str(), 1);
   else if (op == "text") test::write_text(w.at(1), w.at(2));
   else if (op == "numbered") test::write_text(w.at(1), numbered(num(w.at(2))) + (w.size() > 3 ? w[3] : ""));
-  else if (op == "fill") test::write_bytes(w.at(1), test::Bytes(std::stoul(w.at(2)), static_cast<std::uint8_t>(std::stoul(w.at(3), nullptr, 16))));
+  else if (op == "fill") {
+    const auto byte = static_cast<std::uint8_t>(std::stoul(w.at(3), nullptr, 16));
+    test::write_bytes(w.at(1), test::Bytes(std::stoul(w.at(2)), byte));
+  }
   else if (op == "floats") {
     test::Bytes b;
     for (std::size_t i = 2; i < w.size(); ++i) {
@@ -93,7 +101,11 @@ void DriverCases::run(const Words& raw) {
       if (w[i].rfind("size:", 0) == 0) size = std::stoul(w[i].substr(5));
       else if (w[i] == "sep") records.push_back(test::separator(size));
       else if (w[i].rfind("zeros:", 0) == 0) records.emplace_back(std::stoul(w[i].substr(6)), 0);
-      else records.push_back(test::point(std::stof(w[i]), std::stof(w.at(i + 1)), std::stof(w.at(i + 2)), size)), i += 2;
+      else {
+        const auto p = xyz(w, i);
+        records.push_back(test::point(p[0], p[1], p[2], size));
+        i += 2;
+      }
     }
     test::write_bytes(w[1], test::record_file(records));
   } else if (op == "chop") {
@@ -107,7 +119,7 @@ void DriverCases::run(const Words& raw) {
   else if (op == "size") EXPECT_EQ(test::read_bytes(w.at(1)).size(), std::stoul(w.at(2)));
   else if (op == "hex" || op == "head") {  // the whole file, or its first bytes
     std::string hex;
-    for (std::uint8_t b : test::read_bytes(w.at(1))) hex += "0123456789abcdef"[b >> 4], hex += "0123456789abcdef"[b & 15];
+    for (std::uint8_t b : test::read_bytes(w.at(1))) hex += {"0123456789abcdef"[b >> 4], "0123456789abcdef"[b & 15]};
     EXPECT_EQ(op == "hex" ? hex : hex.substr(0, w.at(2).size()), w.at(2));
   } else if (op == "file-exists") {
     file_exists(name.data(), length, yes);
@@ -126,10 +138,9 @@ void DriverCases::run(const Words& raw) {
   } else if (op == "attached") EXPECT_EQ(unit_attached(num(w.at(1))) ? "yes" : "no", w.at(2));
   else if (op == "close") close_unit(num(w.at(1)));
   else if (op == "xyz") {  // UNIT then x y z, or "end"
-    const auto shown = [](float x, float y, float z) { return std::to_string(x) + " " + std::to_string(y) + " " + std::to_string(z); };
-    float x, y, z;
-    const bool read = read_record_xyz(num(w.at(1)), x, y, z);
-    EXPECT_EQ(read ? shown(x, y, z) : "end", w.at(2) == "end" ? "end" : shown(std::stof(w[2]), std::stof(w.at(3)), std::stof(w.at(4))));
+    std::array<float, 3> p;
+    if (!read_record_xyz(num(w.at(1)), p[0], p[1], p[2])) { EXPECT_EQ(w.at(2), "end"); }
+    else { EXPECT_EQ(p, xyz(w, 2)); }
   } else if (op == "read-all") {  // the record file on unit 3, to its end
     attach_record_input(3, w.at(1));
     float x, y, z;
@@ -160,7 +171,8 @@ void DriverCases::run(const Words& raw) {
     rewind_unit(3);
     Words levels, expected;
     for (std::int32_t i = 0; i < table_.count(); ++i)
-      levels.push_back(f(table_.z[i]) + ":" + std::to_string(table_.range[i].first) + "-" + std::to_string(table_.range[i].last));
+      levels.push_back(f(table_.z[i]) + ":" + std::to_string(table_.range[i].first) + "-" +
+                       std::to_string(table_.range[i].last));
     for (std::size_t i = 2; i < w.size(); ++i) expected.push_back(f(std::stof(w[i])) + w[i].substr(w[i].find(':')));
     EXPECT_EQ(levels, expected);
   } else if (op == "find") {  // Z then the first record, or "none" (and nothing changed)
@@ -189,16 +201,11 @@ void DriverCases::run(const Words& raw) {
   else ADD_FAILURE() << "unknown command " << op;
 }
 
-TEST_P(DriverCases, Run) {
-  SCOPED_TRACE(GetParam().where);
-  for (const auto& [line, words] : GetParam().lines) {
-    SCOPED_TRACE("line " + std::to_string(line));
-    run(words);
-  }
-}
+TEST_P(DriverCases, Run) { test::run_script(GetParam(), [this](const Words& w) { run(w); }); }
 
-INSTANTIATE_TEST_SUITE_P(Data, DriverCases, ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool", "levels"})),
-                         [](const auto& info) { return info.param.name; });
+INSTANTIATE_TEST_SUITE_P(Data, DriverCases,
+                         ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool", "levels"})),
+                         test::case_name);
 
 }  // namespace
 }  // namespace zt

@@ -28,10 +28,12 @@ using test::Words;
 
 class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
-  // "@" before "/" or at the end of a word is the test directory; a relative path lies in it.
+  // "@" before "/" or at the end of a word is the test directory; a relative
+  // path lies in it.
   std::string at(const std::string& s) const {
     std::string out;
-    for (std::size_t i = 0; i < s.size(); ++i) out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
+    for (std::size_t i = 0; i < s.size(); ++i)
+      out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
     return out;
   }
   std::string in_dir(const std::string& s) const { return (std::filesystem::path(dir_) / at(s)).string(); }
@@ -49,8 +51,8 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
   }
   void run(const Words& w);
 
-  template <class T>
-  static std::string bytes_of(T v) { return std::string(reinterpret_cast<const char*>(&v), sizeof v); }  // little-endian host
+  template <class T>  // as the files hold it: the test host is little-endian
+  static std::string bytes_of(T v) { return std::string(reinterpret_cast<const char*>(&v), sizeof v); }
 
   char out_[600] = "stale";
   std::unique_ptr<CKvlBinaryResFileReader> reader_;
@@ -99,7 +101,8 @@ void RuntimeCases::run(const Words& raw) {
     EXPECT_EQ(s, status(2));
   } else if (op == "load") {  // the files, in order, into a fresh table
     table_.clear();
-    for (std::size_t i = 1; i + 1 < w.size(); ++i) EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
+    for (std::size_t i = 1; i + 1 < w.size(); ++i)
+      EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
   } else if (op == "value") EXPECT_EQ(shown(table_.value(w.at(1), w.at(2))), w.at(3));
   else if (op == "origin") EXPECT_EQ(table_.origin(w.at(1), w.at(2)), w.at(3));
   else if (op == "installed-origin") EXPECT_EQ(configuration().origin(w.at(1), w.at(2)), w.at(3));
@@ -109,12 +112,13 @@ void RuntimeCases::run(const Words& raw) {
     ASSERT_FALSE(traces.empty());
     EXPECT_EQ(w.at(1) == "first" ? traces.front() : traces.back(), w.at(2));
   } else if (op == "traces") {  // how many start with PREFIX
-    count(std::count_if(traces.begin(), traces.end(), [&](auto& t) { return t.rfind(w.at(1), 0) == 0; }), w.at(2));
+    const auto starts = [&](const std::string& t) { return t.rfind(w.at(1), 0) == 0; };
+    count(std::count_if(traces.begin(), traces.end(), starts), w.at(2));
   } else if (op == "variable") EXPECT_EQ(shown(get_variable(w.at(1).c_str())), w.at(2));
   else if (op == "getenv") EXPECT_EQ(shown(std::getenv(w.at(1).c_str())), w.at(2));
   else if (op == "installdir") EXPECT_EQ(detail::installation_directory_from(w.at(1)), w.at(2));
   else if (op == "tempdir") EXPECT_EQ(shown(temp_directory()), w.at(1));
-  else if (op == "records") {  // PATH then each record: floats, "iN" int32, "sN" int16, parted by ","
+  else if (op == "records") {  // PATH then each record: floats, "iN" int32, "sN" int16
     std::vector<std::string> records;
     for (std::size_t i = 2; i < w.size(); ++i) {
       std::string r, v;
@@ -131,14 +135,21 @@ void RuntimeCases::run(const Words& raw) {
   } else if (op == "cut") write_file(w.at(1), read_file(w.at(1))->substr(0, std::stoul(w.at(2))));
   else if (op == "reader") {  // PATH STATUS [unlocked]: a new points reader, opened
     reader_ = std::make_unique<CKvlBinaryResFileReader>(w.size() > 3);
-    reader_->setMessageHandler([](void* self, const char* text) { static_cast<RuntimeCases*>(self)->messages_.emplace_back(text); }, this);
+    const auto collect = [](void* self, const char* text) {
+      static_cast<RuntimeCases*>(self)->messages_.emplace_back(text);
+    };
+    reader_->setMessageHandler(collect, this);
     EXPECT_EQ(reader_->openPoints(in_dir(w.at(1)).c_str()), status(2));
   } else if (op == "get") {  // the reader's NAME is VALUE
     const std::map<std::string, std::function<double()>> get = {
-        {"recordSize", [&] { return reader_->recordSize(); }}, {"recordCount", [&] { return reader_->recordCount(); }},
-        {"hasCode", [&] { return reader_->hasCode(); }}, {"hasFlag", [&] { return reader_->hasFlag(); }},
-        {"headerValue", [&] { return reader_->headerValue(); }}, {"headerCount", [&] { return reader_->headerCount(); }},
-        {"recordsRead", [&] { return reader_->recordsRead(); }}, {"tell", [&] { return reader_->tell(); }},
+        {"recordSize", [&] { return reader_->recordSize(); }},
+        {"recordCount", [&] { return reader_->recordCount(); }},
+        {"hasCode", [&] { return reader_->hasCode(); }},
+        {"hasFlag", [&] { return reader_->hasFlag(); }},
+        {"headerValue", [&] { return reader_->headerValue(); }},
+        {"headerCount", [&] { return reader_->headerCount(); }},
+        {"recordsRead", [&] { return reader_->recordsRead(); }},
+        {"tell", [&] { return reader_->tell(); }},
         {"pendingLength", [&] { return reader_->pendingLength(); }}};
     EXPECT_EQ(get.at(w.at(1))(), std::stod(w.at(2)));
   } else if (op == "seek") EXPECT_EQ(reader_->seekToPoint(std::stol(w.at(1))), status(2));
@@ -147,8 +158,12 @@ void RuntimeCases::run(const Words& raw) {
     std::int32_t code = 9;
     std::int16_t flag = 9;
     const bool with_flag = w.size() > 6, with_code = with_flag && w[5] != "-";
-    EXPECT_EQ(reader_->readPoint(p[0], p[1], p[2], with_code ? &code : nullptr, with_flag ? &flag : nullptr), std::stol(w.at(1)));
-    for (std::size_t i = 2; i < w.size() && i < 5; ++i) EXPECT_EQ(p[i - 2], std::stof(w[i])) << "coordinate " << i - 2;
+    const std::int64_t n =
+        reader_->readPoint(p[0], p[1], p[2], with_code ? &code : nullptr, with_flag ? &flag : nullptr);
+    EXPECT_EQ(n, std::stol(w.at(1)));
+    for (std::size_t i = 2; i < w.size() && i < 5; ++i) {
+      EXPECT_EQ(p[i - 2], std::stof(w[i])) << "coordinate " << i - 2;
+    }
     if (with_code) { EXPECT_EQ(code, status(5)); }
     if (with_flag) { EXPECT_EQ(flag, status(6)); }
   } else if (op == "reader-message") {  // the next message of the reader starts with TEXT
@@ -167,16 +182,12 @@ void RuntimeCases::run(const Words& raw) {
   else ADD_FAILURE() << "unknown command " << op;
 }
 
-TEST_P(RuntimeCases, Run) {
-  SCOPED_TRACE(GetParam().where);
-  for (const auto& [line, words] : GetParam().lines) {
-    SCOPED_TRACE("line " + std::to_string(line));
-    run(words);
-  }
-}
+TEST_P(RuntimeCases, Run) { test::run_script(GetParam(), [this](const Words& w) { run(w); }); }
 
-INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases, ::testing::ValuesIn(test::load_script_cases({"expansion", "configuration", "workzone", "progress", "readers"})),
-                         [](const auto& info) { return info.param.name; });
+INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases,
+                         ::testing::ValuesIn(test::load_script_cases(
+                             {"expansion", "configuration", "workzone", "progress", "readers"})),
+                         test::case_name);
 
 }  // namespace
 }  // namespace zt

@@ -4,6 +4,8 @@
 // A suite runs each case as one named TEST_P, its commands in order.
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <fstream>
 #include <ostream>
 #include <string>
@@ -61,5 +63,17 @@ inline std::vector<ScriptCase> load_script_cases(const std::vector<std::string>&
   }
   return cases;
 }
+
+// Runs a case's commands in order, each failure naming the case and line.
+template <class Run>
+void run_script(const ScriptCase& c, Run run) {
+  SCOPED_TRACE(c.where);
+  for (const auto& [line, words] : c.lines) {
+    SCOPED_TRACE("line " + std::to_string(line));
+    run(words);
+  }
+}
+
+inline std::string case_name(const ::testing::TestParamInfo<ScriptCase>& info) { return info.param.name; }
 
 }  // namespace zt::test
