@@ -6,29 +6,13 @@
 #include <vector>
 
 #include "driver/record_stream.hpp"
+#include "support/record_bytes.hpp"
 #include "support/scratch_dir.hpp"
 
 namespace zt::test {
 
 // A record file of the given records, each written as segments.
-inline Bytes record_file(const std::vector<Bytes>& records) {
-  Bytes out{kRecordFileMarker};
-  for (const Bytes& r : records) {
-    std::size_t done = 0;
-    do {
-      const std::size_t rest = r.size() - done;
-      const std::size_t n = rest > kSegmentBytes ? kSegmentBytes : rest;
-      const auto mark = static_cast<std::uint8_t>(rest > kSegmentBytes ? kSegmentContinued : n);
-      out.push_back(mark);
-      out.insert(out.end(), r.begin() + static_cast<std::ptrdiff_t>(done),
-                 r.begin() + static_cast<std::ptrdiff_t>(done + n));
-      out.push_back(mark);
-      done += n;
-    } while (done < r.size());
-  }
-  out.push_back(kRecordEndMarker);
-  return out;
-}
+inline Bytes record_file(const std::vector<Bytes>& records) { return segmented_record_file(records); }
 
 // A point record of `size` bytes (12, 16 or 18) with x, y, z.
 inline Bytes point(float x, float y, float z, std::size_t size = kPointRecordBytes) {

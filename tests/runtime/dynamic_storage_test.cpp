@@ -94,22 +94,16 @@ TEST_F(TrackedAllocTest, DefaultFatalEndsProcess) {
 
 class DynamicStorageTest : public testing::RuntimeTest {};
 
-TEST_F(DynamicStorageTest, ReservationsAreRoundedToFour) {
+TEST_F(DynamicStorageTest, RoundingToFourAndGrowthByInitialSizeKeepHandles) {
   DynamicStorage* ds = ds_create(100);
   ASSERT_NE(ds, nullptr);
-  for (int n = 1; n <= 4; ++n) {
-    const std::int32_t before = ds->used;
-    EXPECT_EQ(ds_reserve(ds, n), before);
-    EXPECT_EQ(ds->used, before + 4);
-  }
-  ds_destroy(ds);
-}
-
-TEST_F(DynamicStorageTest, GrowthByInitialSizeKeepsHandles) {
-  DynamicStorage* ds = ds_create(100);
   const std::int32_t text = ds_store_string(ds, "hello");
   EXPECT_EQ(ds->used, 8);
-  ASSERT_EQ(ds_reserve(ds, 92), 8);
+  for (int n = 1; n <= 4; ++n) {
+    EXPECT_EQ(ds_reserve(ds, n), 4 + 4 * n);
+    EXPECT_EQ(ds->used, 8 + 4 * n);
+  }
+  ASSERT_EQ(ds_reserve(ds, 76), 24);
   EXPECT_EQ(ds->capacity, 100);
   EXPECT_EQ(ds_reserve(ds, 1), 100);
   EXPECT_EQ(ds->capacity, 200);

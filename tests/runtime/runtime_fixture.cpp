@@ -3,8 +3,6 @@
 
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
 #include "runtime/diagnostics.hpp"
@@ -26,9 +24,7 @@ const char* const kRuntimeVariables[] = {
 }  // namespace
 
 void RuntimeTest::SetUp() {
-  std::string pattern = (std::filesystem::temp_directory_path() / "zt_runtime_XXXXXX").string();
-  ASSERT_NE(::mkdtemp(pattern.data()), nullptr);
-  dir_ = pattern;
+  dir_ = scratch_.path().string();
   for (const char* name : kRuntimeVariables) unset_env(name);
   std::filesystem::create_directories(path("home/config"));
   write_install_config("");
@@ -51,8 +47,6 @@ void RuntimeTest::TearDown() {
     if (value) ::setenv(name.c_str(), value->c_str(), 1);
     else ::unsetenv(name.c_str());
   }
-  std::error_code ignored;
-  std::filesystem::remove_all(dir_, ignored);
 }
 
 void RuntimeTest::set_env(const std::string& name, const std::string& value) {
@@ -69,17 +63,13 @@ void RuntimeTest::unset_env(const std::string& name) {
 }
 
 void RuntimeTest::write_file(const std::string& relative, const std::string& content) const {
-  const std::filesystem::path p = path(relative);
-  std::filesystem::create_directories(p.parent_path());
-  std::ofstream(p, std::ios::binary) << content;
+  std::filesystem::create_directories(std::filesystem::path(path(relative)).parent_path());
+  test::write_text(path(relative), content);
 }
 
 std::optional<std::string> RuntimeTest::read_file(const std::string& relative) const {
-  std::ifstream in(path(relative), std::ios::binary);
-  if (!in) return std::nullopt;
-  std::ostringstream s;
-  s << in.rdbuf();
-  return s.str();
+  if (!exists(relative)) return std::nullopt;
+  return test::read_text(path(relative));
 }
 
 bool RuntimeTest::exists(const std::string& relative) const {

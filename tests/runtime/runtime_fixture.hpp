@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include "support/scratch_dir.hpp"
+
 namespace zt::testing {
 
 class RuntimeTest : public ::testing::Test {
@@ -36,6 +38,7 @@ class RuntimeTest : public ::testing::Test {
   std::string dir_;
 
  private:
+  test::ScratchDir scratch_;
   std::map<std::string, std::optional<std::string>> saved_env_;
 };
 
