@@ -5,54 +5,19 @@
 // way is known it is checked exactly. The file's header gives the format.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
-#include <fstream>
-#include <sstream>
-
 #include "e2e/e2e_support.hpp"
+#include "support/data_table.hpp"
 
 namespace zt::e2e {
 namespace {
 
-struct RunCase {
-  std::string name, setup, end, checks;
-};
-void PrintTo(const RunCase& c, std::ostream* os) { *os << c.name; }
-
-std::vector<std::string> split(const std::string& s, char sep) {
-  std::vector<std::string> out;
-  std::istringstream in(s);
-  for (std::string part; std::getline(in, part, sep);) {
-    const auto b = part.find_first_not_of(' '), e = part.find_last_not_of(' ');
-    out.push_back(b == std::string::npos ? "" : part.substr(b, e - b + 1));
-  }
-  return out;
-}
-
-std::string unescape(const std::string& s) {
-  std::string out;
-  for (std::size_t i = 0; i < s.size(); ++i) {
-    if (s[i] != '\\' || i + 1 == s.size()) out += s[i];
-    else out += s[++i] == 'n' ? '\n' : s[i] == 's' ? ' ' : s[i];
-  }
-  return out;
-}
-
-std::vector<RunCase> runs() {
-  std::vector<RunCase> out;
-  std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/runs.txt");
-  for (std::string line; std::getline(in, line);) {
-    if (line.empty() || line[0] == '#') continue;
-    std::vector<std::string> f = split(line, '|');
-    f.resize(4);
-    out.push_back({f[0], f[1], f[2], f[3]});
-  }
-  return out;
-}
+using test::Row;
+using test::split_fields;
+using test::unescape;
 
 std::vector<float> numbers(const std::string& list, char sep) {
   std::vector<float> out;
-  for (const std::string& n : split(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
+  for (const std::string& n : split_fields(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
   return out;
 }
 
@@ -68,7 +33,8 @@ Bytes recipe(const std::string& r, Bytes old) {
   }
   if (kind == "raw") {
     std::vector<Bytes> recs;
-    for (const std::string& x : split(arg, ',')) recs.push_back(x == "sep" ? test::separator() : Bytes(std::stoul(x), 0));
+    for (const std::string& x : split_fields(arg, ','))
+      recs.push_back(x == "sep" ? test::separator() : Bytes(std::stoul(x), 0));
     return test::record_file(recs);
   }
   if (kind == "byte") {
@@ -82,9 +48,9 @@ Bytes recipe(const std::string& r, Bytes old) {
     return old;
   }
   std::vector<Contour> contours;  // Z@X,Y;X,Y/...
-  for (const std::string& c : split(r, '/')) {
+  for (const std::string& c : split_fields(r, '/')) {
     contours.push_back({std::strtof(c.c_str(), nullptr), {}});
-    for (const std::string& p : split(c.substr(c.find('@') + 1), ';')) {
+    for (const std::string& p : split_fields(c.substr(c.find('@') + 1), ';')) {
       const std::vector<float> xy = numbers(p, ',');
       contours.back().points.push_back({xy.at(0), xy.at(1)});
     }
@@ -93,7 +59,7 @@ Bytes recipe(const std::string& r, Bytes old) {
 }
 
 void set_up(ProgramRun& r, const std::string& setup) {
-  for (const std::string& step : split(setup, ' ')) {
+  for (const std::string& step : split_fields(setup, ' ')) {
     if (step.empty()) continue;
     if (step == "params" || step == "usual") r.parameters();
     if (step == "usual") {
@@ -127,12 +93,13 @@ void check(const ProgramRun& r, const std::string& c) {
   else ADD_FAILURE() << "unknown check";
 }
 
-class RunTable : public ::testing::TestWithParam<RunCase> {};
+// NAME | SETUP | END | CHECKS
+class RunTable : public ::testing::TestWithParam<Row> {};
 
 TEST_P(RunTable, EndsAsListed) {
-  const RunCase& c = GetParam();
+  const Row& c = GetParam();
   ProgramRun r;
-  set_up(r, c.setup);
+  set_up(r, c[1]);
   const int status = r.run();
   ASSERT_NE(status, kTimedOut) << "hang";
   ASSERT_LT(status, 128) << "killed by signal " << status - 128;
@@ -149,7 +116,7 @@ TEST_P(RunTable, EndsAsListed) {
     EXPECT_FALSE(r.has("stock2.bin"));
     EXPECT_TRUE(!r.messages().empty() || !r.err.empty()) << "stopped without a message";
   }
-  const std::string how = c.end.substr(0, c.end.find(' ')), detail = c.end.substr(c.end.find(' ') + 1);
+  const std::string how = c[2].substr(0, c[2].find(' ')), detail = c[2].substr(c[2].find(' ') + 1);
   if (how == "fault") {
     EXPECT_EQ(status, std::stoi(detail)) << r.err;
     EXPECT_FALSE(normal);
@@ -165,12 +132,11 @@ TEST_P(RunTable, EndsAsListed) {
     ASSERT_EQ(how, "either");
     EXPECT_TRUE(status == 0 || (status >= 1 && status <= 2) || status == 255) << status;
   }
-  for (const std::string& one : split(c.checks, ';'))
+  for (const std::string& one : split_fields(c[3], ';'))
     if (!one.empty()) check(r, one);
 }
 
-INSTANTIATE_TEST_SUITE_P(Runs, RunTable, ::testing::ValuesIn(runs()),
-                         [](const ::testing::TestParamInfo<RunCase>& i) { return i.param.name; });
+INSTANTIATE_TEST_SUITE_P(Runs, RunTable, ::testing::ValuesIn(test::read_table("runs.txt", 4)), test::row_name);
 
 }  // namespace
 }  // namespace zt::e2e
