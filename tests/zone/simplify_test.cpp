@@ -1,5 +1,6 @@
 // Polyline simplification: a brute-force bound on random polylines, a
-// reference implementation of both passes, and the exact boundary cases.
+// reference implementation of both passes, and the exact boundary cases
+// (the rows of data/simplify.txt).
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
@@ -11,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "support/data_table.hpp"
 #include "support/subprocess.hpp"
 
 namespace {
@@ -156,51 +158,32 @@ std::vector<Point2d> run_polyline(const std::vector<Point2d>& p, double tol) {
 }
 
 
-TEST(SimplifyExact, PointAtToleranceDroppedJustBeyondKept) {
-  const double tol = 0.005;
-  const double beyond = std::nextafter(tol, 1.0);
-  std::vector<Point2d> at{{0, 0}, {1, tol}, {2, 0}}, past{{0, 0}, {1, beyond}, {2, 0}};
-  EXPECT_EQ(run_vector(at, 0, tol).size(), 2u);
-  EXPECT_EQ(run_vector(past, 0, tol).size(), 3u);
-  // PolylineSimplifier: the Douglas-Peucker part is what the radial part leaves.
-  const double tau = tol - tol * zt::kRadialFactor;
-  at[1].y = tau;
-  past[1].y = std::nextafter(tau, 1.0);
-  EXPECT_EQ(run_polyline(at, tol).size(), 2u);
-  EXPECT_EQ(run_polyline(past, tol).size(), 3u);
-  // Radial pass: a point exactly at rho from the last kept one is dropped.
-  const std::vector<Point2d> radial{{0, 0}, {0.5, 0}, {0.5, 3}};
-  EXPECT_TRUE(Same(run_vector(radial, 0.5, 0), std::vector<Point2d>{{0, 0}, {0.5, 3}}));
+// "x,y x,y ..."; a number ending in '+' is the next double above it.
+std::vector<Point2d> points(const std::string& field) {
+  auto num = [](std::string s) {
+    const bool up = s.ends_with('+');
+    if (up) s.pop_back();
+    const double v = std::strtod(s.c_str(), nullptr);
+    return up ? std::nextafter(v, INFINITY) : v;
+  };
+  std::vector<Point2d> out;
+  for (const std::string& p : zt::test::split_fields(field, ' '))
+    out.push_back({num(p.substr(0, p.find(','))), num(p.substr(p.find(',') + 1))});
+  return out;
 }
 
-TEST(SimplifyExact, TwoAndOnePointPolylines) {
-  const std::vector<Point2d> two{{0, 0}, {0.003, 0}};
-  EXPECT_TRUE(Same(run_polyline(two, 0.01), std::vector<Point2d>{{0.003, 0}}));
-  EXPECT_TRUE(Same(run_vector(two, 0.005, 0.005), std::vector<Point2d>{{0.003, 0}}));
-  EXPECT_TRUE(Same(run_polyline(two, 0.001), two));
-  EXPECT_TRUE(Same(run_vector(two, 0.001, 0.001), two));
-  const std::vector<Point2d> one{{4, 5}};
-  EXPECT_TRUE(Same(run_polyline(one, 1), one));
-  EXPECT_TRUE(Same(run_vector(one, 1, 1), one));
-  VectorSimplifier vs;
-  EXPECT_EQ(vs.simplify(nullptr, 3, 1, 1), 0);
-  // The first point too gives way to the last when everything lies within rho.
-  EXPECT_TRUE(Same(run_vector({{0, 0}, {0.1, 0}, {0.2, 0}}, 0.5, 1), std::vector<Point2d>{{0.2, 0}}));
+class SimplifyExact : public testing::TestWithParam<zt::test::Row> {};
+
+TEST_P(SimplifyExact, KeepsTheListedPoints) {
+  const zt::test::Row& row = GetParam();
+  const std::vector<double> a = zt::test::numbers(row[1].substr(row[1].find(' ')));
+  const std::vector<Point2d> in = points(row[2]);
+  const bool vector = row[1].rfind("vector", 0) == 0;
+  EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(row[3])));
 }
 
-TEST(SimplifyExact, FirstOfEqualMaximaAndStartPointRepeats) {
-  const std::vector<Point2d> twin{{0, 0}, {1, 1}, {2, 1}, {3, 0}};
-  const std::vector<Point2d> first{{0, 0}, {1, 1}, {3, 0}};
-  EXPECT_TRUE(Same(run_vector(twin, 0, 0.95), first));
-  EXPECT_TRUE(Same(run_polyline(twin, 1.9), first));
-  // An offset curve's start point arrives first, second and last.
-  const std::vector<Point2d> curve{{0, 0}, {0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}};
-  EXPECT_TRUE(Same(run_polyline(curve, 0.001),
-                   std::vector<Point2d>{{0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}}));
-  std::vector<Point2d> line;
-  for (int i = 0; i <= 50; ++i) line.push_back({i * 0.25, i * 0.5});
-  EXPECT_TRUE(Same(run_polyline(line, 0.001), std::vector<Point2d>{{0, 0}, {12.5, 25}}));
-}
+INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, testing::ValuesIn(zt::test::read_table("simplify.txt", 4)),
+                         zt::test::row_name);
 
 TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   PolylineSimplifier ps;
@@ -216,6 +199,8 @@ TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   Array<Point2d>* list = ps.resultList(100);
   EXPECT_TRUE(list->capacity() == 5000 && list->growBy() == 1000 && ps.resultList(9000) == list);
   EXPECT_EQ(PolylineSimplifier().resultList(6000)->capacity(), 6010);
+  VectorSimplifier vs;
+  EXPECT_EQ(vs.simplify(nullptr, 3, 1, 1), 0);
 }
 
 TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
