@@ -4,7 +4,6 @@
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cmath>
@@ -13,7 +12,6 @@
 #include <vector>
 
 #include "support/data_table.hpp"
-#include "support/subprocess.hpp"
 
 namespace {
 
@@ -252,23 +250,3 @@ TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
 }
 
 }  // namespace
-
-// zonetool simplify's text form: blank lines only between polylines, shortest
-// numbers, bad input refused with status 2.
-TEST(ZonetoolSimplify, TextRoundTrip) {
-  const std::string tool = zt::test::zonetool_path();
-  if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
-  auto run = [&](const std::string& args, const std::string& input, int& status) {
-    const zt::test::CommandRun r = zt::test::run_command("printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null");
-    status = r.status;
-    return r.out;
-  };
-  int status = -1;
-  EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),
-            "0 0\n2.5 0\n\n1 1\n");
-  EXPECT_EQ(status, 0);
-  run("--tolerance 0.01", "1 2 3\\n", status);
-  EXPECT_EQ(status, 2);
-  run("--tolerance -1", "", status);
-  EXPECT_EQ(status, 2);
-}
