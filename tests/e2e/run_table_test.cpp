@@ -78,10 +78,11 @@ void set_up(ProgramRun& r, const std::string& setup) {
   }
 }
 
-void check(const ProgramRun& r, const std::string& c) {
+void check(const ProgramRun& r, const std::vector<Contour>& zones, const std::string& c) {
   SCOPED_TRACE(c);
   const std::string arg = c.substr(c.find(' ') + 1);
   if (c.rfind("out=", 0) == 0) EXPECT_EQ(r.out, unescape(c.substr(4)));
+  else if (c.rfind("out~", 0) == 0) EXPECT_NE(r.out.find(unescape(c.substr(4))), std::string::npos) << r.out;
   else if (c.rfind("err~", 0) == 0) EXPECT_NE(r.err.find(c.substr(4)), std::string::npos) << r.err;
   else if (c == "banner") EXPECT_EQ(r.out.rfind(banner_and_scale(), 0), 0u) << r.out;
   else if (c == "no stars") EXPECT_EQ(r.out.find('*'), std::string::npos) << r.out;
@@ -90,7 +91,17 @@ void check(const ProgramRun& r, const std::string& c) {
   else if (c.rfind("no ", 0) == 0) EXPECT_FALSE(r.has(arg));
   else if (c.ends_with(" empty")) EXPECT_EQ(r.bytes(c.substr(0, c.find(' '))).size(), 0u);
   else if (c.ends_with(" filled")) EXPECT_GT(r.bytes(c.substr(0, c.find(' '))).size(), 0u);
-  else ADD_FAILURE() << "unknown check";
+  else if (c.rfind("zones ", 0) == 0) {
+    std::vector<float> z;
+    for (const Contour& k : zones) z.push_back(k.z);
+    EXPECT_EQ(z, numbers(arg, ','));
+  } else if (c.rfind("inside ", 0) == 0) {
+    const std::vector<float> b = numbers(arg, ',');
+    for (const Contour& k : zones)
+      for (const Pt& p : k.points) EXPECT_TRUE(p.x >= b[0] && p.y >= b[1] && p.x <= b[2] && p.y <= b[3]);
+  } else {
+    ADD_FAILURE() << "unknown check";
+  }
 }
 
 // NAME | SETUP | END | CHECKS
@@ -112,6 +123,10 @@ TEST_P(RunTable, EndsAsListed) {
     EXPECT_EQ(status, 0);
     EXPECT_EQ(r.messages(), "");
     EXPECT_TRUE(read_result(r.bytes("stock2.bin"), zones)) << "incomplete result";
+    for (const Contour& k : zones) {  // closed contours
+      ASSERT_GE(k.points.size(), 4u);
+      EXPECT_TRUE(k.points.front().x == k.points.back().x && k.points.front().y == k.points.back().y);
+    }
   } else {
     EXPECT_FALSE(r.has("stock2.bin"));
     EXPECT_TRUE(!r.messages().empty() || !r.err.empty()) << "stopped without a message";
@@ -133,7 +148,7 @@ TEST_P(RunTable, EndsAsListed) {
     EXPECT_TRUE(status == 0 || (status >= 1 && status <= 2) || status == 255) << status;
   }
   for (const std::string& one : split_fields(c[3], ';'))
-    if (!one.empty()) check(r, one);
+    if (!one.empty()) check(r, zones, one);
 }
 
 INSTANTIATE_TEST_SUITE_P(Runs, RunTable, ::testing::ValuesIn(test::read_table("runs.txt", 4)), test::row_name);
