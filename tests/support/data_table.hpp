@@ -50,11 +50,22 @@ inline std::vector<Row> read_table(const std::string& name, std::size_t fields) 
 
 inline std::string row_name(const ::testing::TestParamInfo<Row>& i) { return i.param[0]; }
 
-// Numbers of a field ("nan", "inf" and hexadecimal included).
+// A number, or a sum of numbers written without spaces ("1+1e-8"); "nan",
+// "inf" and hexadecimal included.
+inline double number(const std::string& text) {
+  double sum = 0;
+  char* end = nullptr;
+  for (const char* s = text.c_str(); *s; s = end) {
+    sum += std::strtod(s, &end);
+    if (end == s) break;
+  }
+  return sum;
+}
+
 inline std::vector<double> numbers(const std::string& field, char sep = ' ') {
   std::vector<double> out;
   for (const std::string& n : split_fields(field, sep))
-    if (!n.empty()) out.push_back(std::strtod(n.c_str(), nullptr));
+    if (!n.empty()) out.push_back(number(n));
   return out;
 }
 

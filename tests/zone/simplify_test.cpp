@@ -172,8 +172,27 @@ std::vector<Point2d> points(const std::string& field) {
 
 class SimplifyExact : public testing::TestWithParam<zt::test::Row> {};
 
+// "x,y,tag ..." with S for a separator.
+void tagged(const std::string& field, TaggedPointList& l) {
+  for (const std::string& p : zt::test::split_fields(field, ' ')) {
+    const std::vector<double> v = zt::test::numbers(p, ',');
+    l.Add(p == "S" ? TaggedPoint::separator() : TaggedPoint(static_cast<std::int32_t>(v.at(2)), v.at(0), v.at(1)));
+  }
+}
+
 TEST_P(SimplifyExact, KeepsTheListedPoints) {
   const zt::test::Row& row = GetParam();
+  if (row[1] == "lists") {
+    TaggedPointList in, out, want;
+    tagged(row[2], in);
+    tagged(row[3], want);
+    out.Add({5, 1, 1});
+    zt::simplify_polylines(in, out, 0.005);
+    ASSERT_EQ(out.count(), want.count());
+    for (int k = 0; k < out.count(); ++k)
+      EXPECT_TRUE(out[k].tag == want[k].tag && out[k].x == want[k].x && out[k].y == want[k].y) << k;
+    return;
+  }
   const std::vector<double> a = zt::test::numbers(row[1].substr(row[1].find(' ')));
   const std::vector<Point2d> in = points(row[2]);
   const bool vector = row[1].rfind("vector", 0) == 0;
@@ -208,45 +227,6 @@ TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
   Array<Point2d> out;
   ps.simplify(line.data(), 5, 0.01, out, true);
   EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()), line));
-}
-
-// Fills `l` and returns it, so a case reads as one line.
-const TaggedPointList& list_of(TaggedPointList& l, const std::vector<TaggedPoint>& pts) {
-  l.Clear();
-  for (const TaggedPoint& p : pts) l.Add(p);
-  return l;
-}
-
-TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
-  const TaggedPoint sep = TaggedPoint::separator();
-  TaggedPointList in, out;
-  out.Add({5, 1, 1});
-  zt::simplify_polylines(list_of(in, {sep, sep, {7, 99995, 0}}), out, 0.005);
-  EXPECT_EQ(out.count(), 0);
-  zt::simplify_polylines(list_of(in, {sep, {3, 1, 1}, sep}), out, 0.005);
-  EXPECT_EQ(out.count(), 0);
-
-  // Two polylines, no leading separator, one trailing; a one-point polyline
-  // between them vanishes; a collinear point goes; every tag becomes 1.
-  zt::simplify_polylines(
-      list_of(in, {{9, 0, 0}, {9, 1, 0}, {9, 2, 0}, sep, {4, 8, 8}, sep, {2, 5, 5}, {2, 6, 6}, sep}), out,
-      0.005);
-  const std::vector<TaggedPoint> want{sep, {1, 0, 0}, {1, 2, 0}, sep, {1, 5, 5}, {1, 6, 6}};
-  ASSERT_EQ(out.count(), static_cast<int>(want.size()));
-  for (int k = 0; k < out.count(); ++k) {
-    EXPECT_EQ(out[k].tag, want[k].tag) << k;
-    EXPECT_EQ(out[k].x, want[k].x) << k;
-    EXPECT_EQ(out[k].y, want[k].y) << k;
-  }
-
-  // x exactly at the threshold starts no polyline but continues one.
-  zt::simplify_polylines(list_of(in, {{0, 99990, 0}, {0, 1, 1}, {0, 99990, 0}, {0, 1, 9}}), out, 0.005);
-  ASSERT_EQ(out.count(), 4);
-  EXPECT_EQ(out[2].x, 99990.0);
-  // Two points closer than the single-precision epsilon: the second remains.
-  zt::simplify_polylines(list_of(in, {{0, 1, 1}, {0, 1 + 1e-8, 1}}), out, 0.005);
-  ASSERT_EQ(out.count(), 2);
-  EXPECT_EQ(out[1].x, 1 + 1e-8);
 }
 
 }  // namespace
