@@ -2,6 +2,7 @@
 // one even-odd path per input and level, the legend, and refusals.
 #include <gtest/gtest.h>
 
+#include <cmath>
 
 #include "e2e/e2e_support.hpp"
 
