@@ -1,8 +1,12 @@
 // restzones run as the suite runs it: the bundled example run again and
-// elsewhere, and what an interrupted result write leaves behind. Its stops,
-// faults and plain ends are rows of data/runs.txt.
+// elsewhere, and what an interrupted result write leaves behind (and the
+// guard that removes it). Its stops, faults and plain ends are rows of
+// data/runs.txt.
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+
+#include "driver/detail/result_guard.hpp"
 #include "e2e/e2e_support.hpp"
 
 namespace zt::e2e {
@@ -54,6 +58,26 @@ TEST(MainFlowFaults, InterruptedResultWriteLeavesNoResult) {
   EXPECT_NE(r.err.find("stock2.bin"), std::string::npos) << r.err;
   EXPECT_TRUE(r.marker_left());
   EXPECT_FALSE(r.has("stock2.bin"));
+}
+
+// The result guard underneath: a result being written disappears with any
+// end of the process (fatal reports exit with statuses 1, 2 and 255), and
+// stays once released.
+TEST(ResultGuardDeathTest, AnExitWhileWritingRemovesTheResultAReleasedOneStays) {
+  for (int status : {1, 2, 255, 0}) {
+    const bool released = status == 0;
+    test::ScratchDir dir;
+    const std::string result = dir.file("stock2.bin");
+    test::write_text(result, "K half");
+    EXPECT_EXIT(
+        {
+          detail::guard_result(result);
+          if (released) detail::release_result();
+          std::exit(status);
+        },
+        ::testing::ExitedWithCode(status), "");
+    EXPECT_EQ(std::filesystem::exists(result), released) << status;
+  }
 }
 
 }  // namespace
