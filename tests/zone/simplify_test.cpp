@@ -13,14 +13,8 @@
 
 #include "support/data_table.hpp"
 
+namespace zt {
 namespace {
-
-using zt::Array;
-using zt::Point2d;
-using zt::PolylineSimplifier;
-using zt::TaggedPoint;
-using zt::TaggedPointList;
-using zt::VectorSimplifier;
 
 // Slack for the triangle-inequality bound: sqrt and the projection round.
 constexpr double kBoundSlack = 1e-12;
@@ -36,11 +30,11 @@ double seg_dist2(Point2d p, Point2d a, Point2d b) {
   return dist2(p, {a.x + t * dx, a.y + t * dy});
 }
 
-testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
+::testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
   bool same = got.size() == want.size();
   for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
-  if (same) return testing::AssertionSuccess();
-  testing::AssertionResult r = testing::AssertionFailure();
+  if (same) return ::testing::AssertionSuccess();
+  ::testing::AssertionResult r = ::testing::AssertionFailure();
   r << "got";
   for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
   return r;
@@ -131,10 +125,10 @@ TEST(SimplifyRandom, BothFormsStayWithinToleranceAndMatchReference) {
     ps.simplify(in.data(), n, tol, result, true);
     std::vector<Point2d> a(result.begin(), result.end());
     check_bound(in, a, tol);
-    const double rho = tol * zt::kRadialFactor;
+    const double rho = tol * kRadialFactor;
     ASSERT_TRUE(Same(a, reference(in, rho, tol - rho))) << "round " << round;
 
-    const double eps = round % 3 ? tol * 0.2 : zt::kPolylineRadialEps;
+    const double eps = round % 3 ? tol * 0.2 : kPolylineRadialEps;
     std::vector<Point2d> b = in;
     b.resize(vs.simplify(b.data(), n, eps, tol));
     check_bound(in, b, std::max(eps + tol, 2 * eps));
@@ -165,42 +159,42 @@ std::vector<Point2d> points(const std::string& field) {
     return up ? std::nextafter(v, INFINITY) : v;
   };
   std::vector<Point2d> out;
-  for (const std::string& p : zt::test::split_fields(field, ' '))
+  for (const std::string& p : test::split_fields(field, ' '))
     out.push_back({num(p.substr(0, p.find(','))), num(p.substr(p.find(',') + 1))});
   return out;
 }
 
-class SimplifyExact : public testing::TestWithParam<zt::test::Row> {};
+class SimplifyExact : public ::testing::TestWithParam<test::Row> {};
 
 // "x,y,tag ..." with S for a separator.
 void tagged(const std::string& field, TaggedPointList& l) {
-  for (const std::string& p : zt::test::split_fields(field, ' ')) {
-    const std::vector<double> v = zt::test::numbers(p, ',');
+  for (const std::string& p : test::split_fields(field, ' ')) {
+    const std::vector<double> v = test::numbers(p, ',');
     l.Add(p == "S" ? TaggedPoint::separator() : TaggedPoint(static_cast<std::int32_t>(v.at(2)), v.at(0), v.at(1)));
   }
 }
 
 TEST_P(SimplifyExact, KeepsTheListedPoints) {
-  const zt::test::Row& row = GetParam();
+  const test::Row& row = GetParam();
   if (row[1] == "lists") {
     TaggedPointList in, out, want;
     tagged(row[2], in);
     tagged(row[3], want);
     out.Add({5, 1, 1});
-    zt::simplify_polylines(in, out, 0.005);
+    simplify_polylines(in, out, 0.005);
     ASSERT_EQ(out.count(), want.count());
     for (int k = 0; k < out.count(); ++k)
       EXPECT_TRUE(out[k].tag == want[k].tag && out[k].x == want[k].x && out[k].y == want[k].y) << k;
     return;
   }
-  const std::vector<double> a = zt::test::numbers(row[1].substr(row[1].find(' ')));
+  const std::vector<double> a = test::numbers(row[1].substr(row[1].find(' ')));
   const std::vector<Point2d> in = points(row[2]);
   const bool vector = row[1].rfind("vector", 0) == 0;
   EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(row[3])));
 }
 
-INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, testing::ValuesIn(zt::test::read_table("simplify.txt", 4)),
-                         zt::test::row_name);
+INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, ::testing::ValuesIn(test::read_table("simplify.txt", 4)),
+                         test::row_name);
 
 TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   PolylineSimplifier ps;
@@ -230,3 +224,4 @@ TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
 }
 
 }  // namespace
+}  // namespace zt
