@@ -4,10 +4,14 @@
 // finishing region; then from the deepest level up each level's zones grown
 // by the merge radius + 0.04, united with those carried from below, and the
 // union shrunk by the merge radius. Levels follow the driver's rules: a
-// level reaches the zone builder only with more than 4 records.
+// level reaches the zone builder only with more than 4 records. Also the
+// generated pockets that the zone builder's and the program's oracles share.
 #pragma once
 
+#include <algorithm>
+#include <cmath>
 #include <map>
+#include <random>
 #include <vector>
 
 #include "tests/support/clipper_paths.hpp"
@@ -52,16 +56,22 @@ inline std::size_t level_records(const RefLevel& l) {
   return l.rest.empty() ? 0 : n + l.rest.size() - 1;
 }
 
-// Final zones per level z (levels below the deepest one with zones absent).
+// A level's own zones: its rest material grown and cut to its finishing region.
+inline cl::Paths level_zones(const RefLevel& l, double offsetDistance) {
+  return clip(to_paths(l.finishing), round_offset(to_paths(l.rest), offsetDistance), cl::ctIntersection);
+}
+
+// Final zones per level z (levels below the deepest one with zones absent);
+// a level counts from `minRecords` records on (the driver's 5; the zone
+// builder, called directly, takes any).
 inline std::map<float, cl::Paths> reference_zones(const std::vector<RefLevel>& levels, double offsetDistance,
-                                                  double mergeRadius) {
+                                                  double mergeRadius, std::size_t minRecords = 5) {
   std::map<float, cl::Paths> finals;
   cl::Paths carried, last;
   bool any = false;
   for (auto it = levels.rbegin(); it != levels.rend(); ++it) {
-    if (level_records(*it) > 4) {
-      const cl::Paths zones =
-          clip(to_paths(it->finishing), round_offset(to_paths(it->rest), offsetDistance), cl::ctIntersection);
+    if (level_records(*it) >= minRecords) {
+      const cl::Paths zones = level_zones(*it, offsetDistance);
       if (!zones.empty()) {
         carried = clip(carried, round_offset(zones, mergeRadius + kMergeMargin), cl::ctUnion);
         last = round_offset(carried, -mergeRadius);
@@ -71,6 +81,66 @@ inline std::map<float, cl::Paths> reference_zones(const std::vector<RefLevel>& l
     if (any) finals[it->z] = last;
   }
   return finals;
+}
+
+inline RefPoly rectangle_poly(float x0, float y0, float x1, float y1, bool cw = false) {
+  RefPoly p{{x0, y0}, {x1, y0}, {x1, y1}, {x0, y1}, {x0, y0}};
+  if (cw) std::reverse(p.begin(), p.end());
+  return p;
+}
+
+// The shape of a generated pocket: its smallest side, where its rectangular
+// island sits (fractions of the sides), how many levels beyond two it may
+// have, and whether it has a round island and material along its top wall.
+struct PocketShape {
+  float minSide, islandX, islandY;
+  int extraLevels;
+  bool roundIsland, wallBand;
+};
+
+// A pocket [0, w] x [0, h] with its islands, the same on levels 10, 5, 0...,
+// and on each level rest material in some of its corners and around the
+// island's lower left corner (float coordinates, as the record files hold).
+inline std::vector<RefLevel> pocket_case(std::mt19937& rng, const PocketShape& s) {
+  std::uniform_real_distribution<float> side(s.minSide, 110), fillet(2, 7), coin(0, 1);
+  const float w = std::round(side(rng)), h = std::round(side(rng));
+  const float ix = std::round(w * s.islandX), iy = std::round(h * s.islandY);
+  std::vector<RefPoly> finishing{rectangle_poly(0, 0, w, h), rectangle_poly(ix, iy, ix + 15, iy + 12, true)};
+  if (s.roundIsland) {
+    RefPoly boss;  // clockwise, 48 sides
+    const float cx = w * 0.25f, cy = h * 0.3f;
+    for (int i = 0; i < 48; ++i) {
+      const double a = 2 * 3.14159265358979323846 * i / 48;
+      boss.push_back({static_cast<float>(cx + 8 * std::cos(a)), static_cast<float>(cy + 8 * std::sin(a))});
+    }
+    boss.push_back(boss.front());
+    std::reverse(boss.begin(), boss.end());
+    finishing.push_back(boss);
+  }
+  std::vector<RefLevel> levels;
+  const int count = 2 + static_cast<int>(coin(rng) * static_cast<float>(s.extraLevels + 1));
+  for (int k = 0; k < count; ++k) {
+    RefLevel level{10.0f - 5.0f * static_cast<float>(k), finishing, {}};
+    auto corner = [&](float cx, float cy, float sx, float sy) {
+      if (coin(rng) < 0.4f) return;
+      const float r = fillet(rng);
+      RefPoly t = {{cx, cy}, {cx + sx * r, cy}, {cx, cy + sy * r}, {cx, cy}};
+      if (sx * sy < 0) std::reverse(t.begin(), t.end());
+      level.rest.push_back(t);
+    };
+    corner(0, 0, 1, 1);
+    corner(w, 0, -1, 1);
+    corner(w, h, -1, -1);
+    corner(0, h, 1, -1);
+    if (coin(rng) < 0.5f) {
+      const float r = fillet(rng);
+      level.rest.push_back({{ix - r, iy - r}, {ix + 4, iy - r}, {ix + 4, iy}, {ix, iy},
+                            {ix, iy + 4}, {ix - r, iy + 4}, {ix - r, iy - r}});
+    }
+    if (s.wallBand && coin(rng) < 0.4f) level.rest.push_back(rectangle_poly(20, h - 0.3f, w - 20, h));
+    levels.push_back(level);
+  }
+  return levels;
 }
 
 }  // namespace zt::e2e

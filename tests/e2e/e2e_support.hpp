@@ -6,7 +6,6 @@
 
 #include <sys/wait.h>
 
-#include <cmath>
 #include <cstdint>
 #include <cstdlib>
 #include <filesystem>
@@ -53,18 +52,15 @@ inline std::vector<Pt> rectangle(float x0, float y0, float x1, float y1, bool cw
   return p;
 }
 
-// The pocket 0..100 x 0..100 on the given levels, and a square of rest
-// material 40..60 on each.
-inline Bytes pocket(const std::vector<float>& levels) {
+// The square lo..hi on each of the given levels: the pocket 0..100, and a
+// square of rest material 40..60.
+inline Bytes squares(const std::vector<float>& levels, float lo, float hi) {
   std::vector<Contour> c;
-  for (float z : levels) c.push_back({z, rectangle(0, 0, 100, 100)});
+  for (float z : levels) c.push_back({z, rectangle(lo, lo, hi, hi)});
   return records(c);
 }
-inline Bytes rest(const std::vector<float>& levels) {
-  std::vector<Contour> c;
-  for (float z : levels) c.push_back({z, rectangle(40, 40, 60, 60)});
-  return records(c);
-}
+inline Bytes pocket(const std::vector<float>& levels) { return squares(levels, 0, 100); }
+inline Bytes rest(const std::vector<float>& levels) { return squares(levels, 40, 60); }
 
 // The closed contours of a result file, as read back byte by byte; false
 // when the file is not a complete record file of 18-byte point records.

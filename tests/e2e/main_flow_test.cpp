@@ -1,156 +1,16 @@
-// restzones run as the suite runs it: every stop of its main sequence, the
-// stock levels that reach the zone builder, the normal end, and what a
-// record fault or an interrupted result write leave behind.
+// restzones run as the suite runs it: the bundled example run again and
+// elsewhere, and what an interrupted result write leaves behind (and the
+// guard that removes it). Its stops, faults and plain ends are rows of
+// data/runs.txt.
 #include <gtest/gtest.h>
 
+#include <cstdlib>
+
+#include "driver/detail/result_guard.hpp"
 #include "e2e/e2e_support.hpp"
 
 namespace zt::e2e {
 namespace {
-
-// A stop: exit status 0, the message alone on its console line and in the
-// message file, the status marker left, no result.
-void expect_stop(const ProgramRun& r, int status, const std::string& message) {
-  EXPECT_EQ(status, 0) << r.err;
-  EXPECT_NE(r.out.find(message + "\n"), std::string::npos) << r.out;
-  EXPECT_EQ(r.messages(), message);
-  EXPECT_TRUE(r.marker_left());
-  EXPECT_FALSE(r.has("stock2.bin"));
-}
-
-TEST(MainFlowStops, NoContourFile) {
-  ProgramRun r;
-  r.put("stock1.bin", rest({0}));
-  expect_stop(r, r.run(), "Pas de Finition en Z");
-  EXPECT_EQ(r.out, "Pas de Finition en Z\n");  // before the banner
-  EXPECT_FALSE(r.has("temp1"));
-}
-
-TEST(MainFlowStops, ZoneBuilderCannotStart) {
-  ProgramRun r;
-  r.put("contour.bin", pocket({0}));
-  r.put("stock1.bin", rest({0}));
-  std::filesystem::create_directory(r.path("temp1"));  // its scratch file cannot be created
-  expect_stop(r, r.run(), "Erreur dans wf_init_czone");
-  EXPECT_EQ(r.out, "Erreur dans wf_init_czone\n");
-}
-
-TEST(MainFlowStops, NoStockFile) {
-  ProgramRun r;
-  r.put("contour.bin", pocket({0}));
-  expect_stop(r, r.run(), "Pas de Zones de Reprise");
-  EXPECT_EQ(r.out, "Pas de Zones de Reprise\n");
-  EXPECT_TRUE(r.has("temp1"));  // the zone builder had started
-}
-
-TEST(MainFlowStops, StockLevelWithoutFinishingLevel) {
-  ProgramRun r;
-  r.parameters();
-  r.put("contour.bin", pocket({10}));
-  r.put("stock1.bin", rest({5}));
-  expect_stop(r, r.run(), "Erreur dans wf_add_level");
-  EXPECT_EQ(r.out.rfind(banner_and_scale(), 0), 0u) << r.out;
-}
-
-TEST(MainFlowStops, AssemblyFailsWithoutGridFileAndLeavesNoResult) {
-  ProgramRun r;
-  r.put("contour.bin", pocket({0}));
-  r.put("stock1.bin", rest({0}));
-  r.put("stock2.bin", std::string("result of an earlier run"));
-  expect_stop(r, r.run(), "Erreur dans wf_fin_czone");
-  EXPECT_GT(r.bytes("temp1").size(), 0u);  // the level was computed
-}
-
-TEST(MainFlowStops, LevelsNotFromTheTopDown) {
-  {
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({0, 5, 10}));
-    r.put("stock1.bin", rest({10, 5, 0}));
-    expect_stop(r, r.run(), "Niveaux de Finition non ordonnes en Z");
-    EXPECT_FALSE(r.has("temp1"));
-  }
-  {
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({10, 5, 0}));
-    r.put("stock1.bin", rest({0, 5, 10}));
-    expect_stop(r, r.run(), "Niveaux de Zones de Reprise non ordonnes en Z");
-    EXPECT_EQ(r.out, "Niveaux de Zones de Reprise non ordonnes en Z\n");
-  }
-}
-
-// A stock level whose finishing level is missing fails in wf_add_level: so a
-// normal end shows the level never reached it.
-TEST(MainFlowLevels, FourRecordsNeverReachTheZoneBuilderFiveDo) {
-  const std::vector<std::vector<Contour>> four = {
-      {{5, {{40, 40}, {60, 40}, {50, 60}, {40, 40}}}},       // a closed triangle
-      {{5, {{40, 40}, {60, 40}}}, {5, {{50, 60}}}},           // 2 + separator + 1
-  };
-  const std::vector<std::vector<Contour>> five = {
-      {{5, rectangle(40, 40, 60, 60)}},
-      {{5, {{40, 40}, {60, 40}}}, {5, {{50, 60}, {45, 50}}}},  // 2 + separator + 2
-  };
-  for (const auto& stock : four) {
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({10}));
-    r.put("stock1.bin", records(stock));
-    EXPECT_EQ(r.run(), 0) << r.err;
-    EXPECT_FALSE(r.marker_left()) << r.out;
-    EXPECT_EQ(r.bytes("temp1").size(), 0u);
-  }
-  for (const auto& stock : five) {
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({10}));
-    r.put("stock1.bin", records(stock));
-    expect_stop(r, r.run(), "Erreur dans wf_add_level");
-  }
-}
-
-TEST(MainFlowLevels, NoStockLevelsStillAssemble) {
-  for (const Bytes& stock : {test::record_file({}), test::record_file({test::separator(), test::separator()})}) {
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({0}));
-    r.put("stock1.bin", stock);
-    ASSERT_EQ(r.run(), 0) << r.err;
-    EXPECT_EQ(r.out.rfind(banner_and_scale(), 0), 0u) << r.out;
-    EXPECT_EQ(r.out.find('*'), std::string::npos) << r.out;
-    EXPECT_FALSE(r.marker_left());
-    EXPECT_TRUE(r.has("temp2"));  // wf_fin_czone ran
-    EXPECT_EQ(r.bytes("stock2.bin"), (Bytes{kRecordFileMarker, kRecordEndMarker}));
-  }
-}
-
-TEST(MainFlowEnd, ZonesWrittenMarkerRemoved) {
-  ProgramRun r;
-  r.parameters();
-  r.put("contour.bin", pocket({10, 5, 0}));
-  r.put("stock1.bin", rest({5}));
-  ASSERT_EQ(r.run(), 0) << r.err;
-  EXPECT_EQ(r.out.rfind(banner_and_scale(), 0), 0u) << r.out;
-  EXPECT_NE(r.out.find("******************************\r\n\n"), std::string::npos);
-  EXPECT_FALSE(r.marker_left());
-  EXPECT_EQ(r.messages(), "");
-  std::vector<Contour> zones;
-  ASSERT_TRUE(read_result(r.bytes("stock2.bin"), zones));
-  // Level 5 has zones; level 0 below has none and is left out; level 10
-  // above gets a copy of level 5's. Top first.
-  ASSERT_EQ(zones.size(), 2u);
-  EXPECT_EQ(zones[0].z, 10.0f);
-  EXPECT_EQ(zones[1].z, 5.0f);
-  for (const Contour& c : zones) {
-    ASSERT_GE(c.points.size(), 4u);
-    EXPECT_EQ(c.points.front().x, c.points.back().x);
-    EXPECT_EQ(c.points.front().y, c.points.back().y);
-    for (const Pt& p : c.points) {  // the grown square stays inside the pocket
-      EXPECT_GE(p.x, 0.0f);
-      EXPECT_LE(p.x, 100.0f);
-    }
-  }
-}
 
 void copy_example(const ProgramRun& r) {
   for (const auto& e : std::filesystem::directory_iterator(std::string(ZT_SOURCE_DIR) + "/examples/pocket"))
@@ -184,33 +44,6 @@ TEST(MainFlowEnd, ExampleGivesTheSameResultEveryRun) {
   EXPECT_EQ(fresh.bytes("stock2.bin"), result);
 }
 
-TEST(MainFlowFaults, NonFiniteCoordinateEndsLikeARecordFault) {
-  const float nan = std::nanf(""), inf = INFINITY;
-  struct Case {
-    const char* file;
-    Bytes bytes;
-    const char* record;
-  };
-  const Case cases[] = {
-      {"stock1.bin", records({{0, {{40, 40}, {nan, 40}, {60, 60}, {40, 60}, {40, 40}}}}), "record 3"},
-      {"contour.bin", records({{0, {{0, 0}, {100, inf}, {100, 100}, {0, 100}, {0, 0}}}}), "record 3"},
-      {"contour.bin", records({{0, rectangle(0, 0, 100, 100)}, {-inf, rectangle(0, 0, 100, 100)}}), "record 8"},
-  };
-  for (const Case& c : cases) {
-    SCOPED_TRACE(c.file);
-    ProgramRun r;
-    r.parameters();
-    r.put("contour.bin", pocket({0}));
-    r.put("stock1.bin", rest({0}));
-    r.put(c.file, c.bytes);
-    EXPECT_EQ(r.run(), 16);
-    EXPECT_NE(r.err.find(c.file), std::string::npos) << r.err;
-    EXPECT_NE(r.err.find(c.record), std::string::npos) << r.err;
-    EXPECT_TRUE(r.marker_left());
-    EXPECT_FALSE(r.has("stock2.bin"));
-  }
-}
-
 // The result file grows beyond what the process may write: the record layer
 // stops the program, and the half-written result goes with it. The example's
 // scratch files stay below the limit, its result does not.
@@ -225,6 +58,26 @@ TEST(MainFlowFaults, InterruptedResultWriteLeavesNoResult) {
   EXPECT_NE(r.err.find("stock2.bin"), std::string::npos) << r.err;
   EXPECT_TRUE(r.marker_left());
   EXPECT_FALSE(r.has("stock2.bin"));
+}
+
+// The result guard underneath: a result being written disappears with any
+// end of the process (fatal reports exit with statuses 1, 2 and 255), and
+// stays once released.
+TEST(ResultGuardDeathTest, AnExitWhileWritingRemovesTheResultAReleasedOneStays) {
+  for (int status : {1, 2, 255, 0}) {
+    const bool released = status == 0;
+    test::ScratchDir dir;
+    const std::string result = dir.file("stock2.bin");
+    test::write_text(result, "K half");
+    EXPECT_EXIT(
+        {
+          detail::guard_result(result);
+          if (released) detail::release_result();
+          std::exit(status);
+        },
+        ::testing::ExitedWithCode(status), "");
+    EXPECT_EQ(std::filesystem::exists(result), released) << status;
+  }
 }
 
 }  // namespace

@@ -1,7 +1,7 @@
 // zonetool svg, run as the built tool: panels per level with equal scales,
-// one even-odd path per input and level, the legend, and refusals.
+// one even-odd path per input and level, the legend. Its refusals are rows
+// of data/zonetool.txt.
 #include <gtest/gtest.h>
-
 
 #include "e2e/e2e_support.hpp"
 
@@ -70,25 +70,6 @@ TEST_F(ZonetoolSvg, PanelsPerLevelEqualScalesHolesAsHoles) {
   EXPECT_NE(out.find(">z = 5</text>"), std::string::npos);
   // The scale fits what is drawn: the square 10..20 fills the panel.
   EXPECT_EQ(count(out, "width=\"420.00\" height=\"420.00\" fill=\"none\""), 1);
-}
-
-TEST_F(ZonetoolSvg, Refusals) {
-  test::write_bytes(dir.file("a.bin"), records({{10, rectangle(0, 0, 100, 50)}}));
-  test::write_text(dir.file("bad.txt"), "1 2 3 4\n");
-  test::write_text(dir.file("nan.txt"), "1 nan\n");
-  test::write_bytes(dir.file("nan.bin"), records({{10, {{0, 0}, {std::nanf(""), 1}}}}));
-  const std::string o = " -o " + q(dir.file("out.svg"));
-  EXPECT_EQ(svg(q(dir.file("a.bin"))), 2);                        // no -o
-  EXPECT_EQ(svg(o), 2);                                                    // no input
-  EXPECT_EQ(svg(q(dir.file("missing.bin")) + o), 2);
-  EXPECT_EQ(svg(q(dir.file("bad.txt")) + o), 2);
-  EXPECT_NE(err.find("polyline 1"), std::string::npos) << err;
-  EXPECT_EQ(svg(q(dir.file("nan.txt")) + o), 2);
-  EXPECT_EQ(svg(q(dir.file("a.bin")) + " --level 3" + o), 2);
-  EXPECT_NE(err.find("no level at z 3"), std::string::npos) << err;
-  EXPECT_EQ(svg(q(dir.file("a.bin")) + " --level x" + o), 2);
-  EXPECT_EQ(svg(q(dir.file("nan.bin")) + o), 16);
-  EXPECT_EQ(svg(q(dir.file("a.bin")) + " -o " + q(dir.file("no/such/dir.svg"))), 2);
 }
 
 }  // namespace

@@ -218,24 +218,29 @@ Region random_grid(std::mt19937_64& rng) {
   }
 }
 
-TEST(ClipperOracle, GeneralPositionWithHoles) {
-  std::mt19937_64 rng(20261206);
-  const int n = case_count();
-  for (int i = 0; i < n; ++i) {
-    const Region a = random_general(rng), b = random_general(rng);
-    check_case(a, b, "general case " + std::to_string(i));
-    if (HasFatalFailure()) return;
+// case_count() cases of a family, each drawn as (A, B) by `make`; stops at
+// the first failing case.
+template <class Make>
+void run_family(std::uint64_t seed, const std::string& family, Make make) {
+  std::mt19937_64 rng(seed);
+  for (int i = 0, n = case_count(); i < n && !::testing::Test::HasFatalFailure(); ++i) {
+    const std::pair<Region, Region> ab = make(rng);
+    check_case(ab.first, ab.second, family + " case " + std::to_string(i));
   }
 }
 
+TEST(ClipperOracle, GeneralPositionWithHoles) {
+  run_family(20261206, "general", [](std::mt19937_64& rng) {
+    Region a = random_general(rng);
+    return std::pair{a, random_general(rng)};
+  });
+}
+
 TEST(ClipperOracle, DegenerateOnIntegerGrid) {
-  std::mt19937_64 rng(16161616);
-  const int n = case_count();
-  for (int i = 0; i < n; ++i) {
-    const Region a = random_grid(rng), b = random_grid(rng);
-    check_case(a, b, "grid case " + std::to_string(i));
-    if (HasFatalFailure()) return;
-  }
+  run_family(16161616, "grid", [](std::mt19937_64& rng) {
+    Region a = random_grid(rng);
+    return std::pair{a, random_grid(rng)};
+  });
 }
 
 // Sixteen wedges of A meet at the origin, a corner of B: a star of more than
@@ -267,18 +272,14 @@ TEST(ClipperOracle, CombAcrossOneLongEdge) {
 // B is A moved by a small lattice step (or not at all): long collinear
 // overlaps, shared edges and vertices in the same direction.
 TEST(ClipperOracle, ShiftedCopiesOnIntegerGrid) {
-  std::mt19937_64 rng(31415926);
-  std::uniform_int_distribution<int> step(-2, 2);
-  const int n = case_count();
-  for (int i = 0; i < n; ++i) {
-    const Region a = random_grid(rng);
-    Region b = a;
+  run_family(31415926, "shifted", [](std::mt19937_64& rng) {
+    std::uniform_int_distribution<int> step(-2, 2);
+    Region a = random_grid(rng), b = a;
     const int dx = step(rng), dy = step(rng);
     for (Contour& c : b)
       for (Pt& p : c) p.x += dx, p.y += dy;
-    check_case(a, b, "shifted case " + std::to_string(i));
-    if (HasFatalFailure()) return;
-  }
+    return std::pair{a, b};
+  });
 }
 
 }  // namespace

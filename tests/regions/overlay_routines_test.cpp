@@ -1,6 +1,6 @@
-// The overlay's numeric routines and small structures: segment intersection
-// (each case, the retry with exchanged roles, the clamped crossing), ray
-// crossing, split lists, pseudo-angles, snapping.
+// The overlay's numeric routines and small structures: segment intersection,
+// ray crossing and snapping case by case (the rows of data/overlay.txt), the
+// clamped crossing, split lists, pseudo-angles, the output collector.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -9,50 +9,53 @@
 
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
+#include "regions/detail/output_collector.hpp"
+#include "support/data_table.hpp"
 
 namespace zt::detail {
 namespace {
 
 constexpr double kEps = kEngineEpsilon;
 
-struct Case {
-  Point2d p0, p1, q0, q1;
-  int k;
-  Point2d r1, r2;
-};
+// A sum of numbers; a term ending in "eps" is a multiple of kEps.
+double value(const std::string& t) {
+  double sum = 0;
+  for (const char* s = t.c_str(); *s;) {
+    char* end = nullptr;
+    double v = std::strtod(s, &end);
+    if (end == s) break;
+    if (std::string(end).starts_with("eps")) v *= kEps, end += 3;
+    sum += v, s = end;
+  }
+  return sum;
+}
+Point2d point(const std::string& t) { return {value(t.substr(0, t.find(','))), value(t.substr(t.find(',') + 1))}; }
 
-TEST(SegmentIntersection, EveryCase) {
-  const double d = 1.2 * kEps;  // Q1 off the first line; P0, P1 within eps of the second
-  const Case cases[] = {
-      {{0, 0}, {2, 2}, {0, 2}, {2, 0}, 1, {1, 1}, {}},             // proper crossing
-      {{0, 0}, {1, 0}, {0, 1}, {1, 2}, 0, {}, {}},                 // same side
-      {{0, 0}, {1, 0}, {2, -1}, {2, 1}, 0, {}, {}},                // crosses the line beyond
-      {{0, 0}, {2, 0}, {1, 0}, {1, 1}, 1, {1, 0}, {}},             // Q0 inside the first
-      {{0, 0}, {2, 0}, {1, 1}, {2, 0}, 1, {2, 0}, {}},             // Q1 at P1
-      {{1, 0}, {1, 1}, {0, 0}, {2, 0}, 1, {1, 0}, {}},             // P0 on the second
-      {{0, 0}, {4, 0}, {1, 0}, {6, 0}, 2, {1, 0}, {4, 0}},         // collinear overlap
-      {{0, 0}, {4, 0}, {3, 0}, {-2, 0}, 2, {0, 0}, {3, 0}},        // reversed second
-      {{0, 0}, {4, 0}, {4, 0}, {6, 0}, 2, {4, 0}, {4, 0}},         // touching ends
-      {{0, 0}, {4, 0}, {5, 0}, {6, 0}, 0, {}, {}},                 // collinear, apart
-      {{0, 0}, {1, 0}, {-1, 0}, {-2, 1}, kRetryReversed, {}, {}},  // Q0 on the line, beyond
-      {{0, 0}, {1, 0}, {-2, 1}, {3, 0}, kRetryReversed, {}, {}},   // Q1 on the line, beyond
-      {{0, 0}, {0.5, 0}, {0.75, 0}, {-0.25, d}, kRetryReversed, {}, {}},
-      {{0.75, 0}, {-0.25, d}, {0, 0}, {0.5, 0}, 1, {0, 0}, {}},  // ... and exchanged
-  };
-  for (const Case& c : cases) {
+class OverlayRoutines : public ::testing::TestWithParam<test::Row> {};
+
+TEST_P(OverlayRoutines, AsListed) {
+  const std::vector<std::string> call = test::split_fields(GetParam()[1], ' ');
+  const std::vector<std::string> want = test::split_fields(GetParam()[2], ' ');
+  if (call[0] == "segment") {
     Point2d r1{-9, -9}, r2{-9, -9};
     SegmentDirection a, b;
-    const int k = segment_intersection(c.p0, c.p1, c.q0, c.q1, r1, r2, a, b, kEps);
-    SCOPED_TRACE(::testing::Message() << c.p0.x << "," << c.p0.y << " " << c.q0.x << "," << c.q0.y);
-    ASSERT_EQ(k, c.k);
-    if (k >= 1) {
-      EXPECT_TRUE(r1.x == c.r1.x && r1.y == c.r1.y) << r1.x << " " << r1.y;
+    const int k = segment_intersection(point(call[1]), point(call[2]), point(call[3]), point(call[4]), r1, r2, a, b, kEps);
+    ASSERT_EQ(k, want[0] == "retry" ? kRetryReversed : std::stoi(want[0]));
+    for (int i = 1; i <= k; ++i) {
+      const Point2d got = i == 1 ? r1 : r2, w = point(want.at(i));
+      EXPECT_TRUE(got.x == w.x && got.y == w.y) << got.x << " " << got.y;
     }
-    if (k == 2) {
-      EXPECT_TRUE(r2.x == c.r2.x && r2.y == c.r2.y) << r2.x << " " << r2.y;
-    }
+  } else if (call[0] == "ray") {
+    const Point2d p = point(call[1]), a = point(call[2]), b = point(call[3]);
+    EXPECT_EQ(ray_crossing(p.x, p.y, a.x, a.y, b.x, b.y, kEps), std::stoi(want[0]));
+  } else {
+    ASSERT_EQ(call[0], "snap");
+    EXPECT_EQ(snap_coordinate(value(call[1])), value(want[0]));
   }
 }
+
+INSTANTIATE_TEST_SUITE_P(Rows, OverlayRoutines, ::testing::ValuesIn(test::read_table("overlay.txt", 3)),
+                         test::row_name);
 
 // Nearly parallel crossings near an end: the point found always lies on the
 // first segment (its parameter held to 0..1), never off both edges.
@@ -76,15 +79,6 @@ TEST(SegmentIntersection, NearlyParallelCrossingStaysOnTheEdges) {
     ASSERT_TRUE(r1.y >= std::fmin(p0.y, p1.y) - kEps && r1.y <= std::fmax(p0.y, p1.y) + kEps);
   }
   EXPECT_GT(crossings, 1000);
-}
-
-TEST(RayCrossing, VerticesCountAsJustAboveTheRay) {
-  EXPECT_EQ(ray_crossing(0, 0, 1, -1, 1, 1, kEps), 1);
-  EXPECT_EQ(ray_crossing(0, 0, -1, -1, -1, 1, kEps), 0);  // left of the point
-  EXPECT_EQ(ray_crossing(0, 0, 1, 0, 3, 0, kEps), 0);     // along the ray
-  EXPECT_EQ(ray_crossing(0, 0, 1, 0, 1, 1, kEps), 0);     // from the ray upwards
-  EXPECT_EQ(ray_crossing(0, 0, 1, 0, 1, -1, kEps), 1);    // from the ray downwards
-  EXPECT_EQ(ray_crossing(0, 0, 1, -1, 1, 1e-16, kEps), 1);
 }
 
 // Settled split lists against the plain rule: each crossing, in the order
@@ -137,11 +131,36 @@ TEST(PseudoAngle, IncreasesCounterClockwiseFromZeroToEight) {
   EXPECT_EQ(pseudo_angle(-1, 0), 4.0);
 }
 
-TEST(Snapping, FractionFlooredToTheQuantumWithTheSignOfTheValue) {
-  EXPECT_EQ(snap_coordinate(1.5), 1.5);
-  EXPECT_EQ(snap_coordinate(3.0 + 0x1p-50), 3.0);
-  EXPECT_EQ(snap_coordinate(-3.0 - 0x1p-50), -3.0 - 0x1p-48);
-  EXPECT_EQ(snap_coordinate(-1e15 + 0.25), -1e15 + 0.25);
+// The output collector: duplicates within the tolerance, the stored point
+// moved at a change of tag, separators passed unmapped and collapsed.
+TEST(OutputCollector, DuplicateAndTagRules) {
+  TaggedPointList out;
+  collector_set_tolerance(kDuplicateTolerance);
+  collector_reset(&out, 10.0, 20.0, 2.0, 4.0);
+  emit_point(1, 1, 5);
+  emit_point(1, 1, 5);  // same point, same tag: stored once
+  emit_point(1 + 2e-8, 1, 5);
+  emit_point(1 + 4e-8, 1 - 2e-8, 5);  // a run within 1e-7 keeps the first position...
+  ASSERT_EQ(out.count(), 1);
+  EXPECT_EQ(out[0].x, 12.0);
+  emit_point(2, 2, 6);  // ...until the tag changes: then it moves to the run's last point
+  ASSERT_EQ(out.count(), 2);
+  EXPECT_EQ(out[0].x, (1 + 4e-8) * 2 + 10);
+  EXPECT_EQ(out[0].y, (1 - 2e-8) * 4 + 20);
+  EXPECT_EQ(out[0].tag, 5);
+  emit_point(2, 2, 7);  // same point, another tag: stored twice
+  ASSERT_EQ(out.count(), 3);
+  EXPECT_EQ(out[1].tag, 6);
+  EXPECT_EQ(out[2].tag, 7);
+  emit_separator();
+  emit_separator();  // collapses
+  ASSERT_EQ(out.count(), 4);
+  EXPECT_EQ(out[3].x, kSeparatorCoord);
+  EXPECT_EQ(out[3].tag, kSeparatorTag);
+  emit_point(0, 0, 3);
+  ASSERT_EQ(out.count(), 5);
+  EXPECT_EQ(out[3].x, kSeparatorCoord);  // the separator stays
+  EXPECT_EQ(out[4].x, 10.0);
 }
 
 }  // namespace

@@ -3,65 +3,23 @@
 #include "zone/contour_store.hpp"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cmath>
-#include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <string>
-#include <vector>
 
-#include "support/scratch_dir.hpp"
+#include "zone_test_support.hpp"
 
+namespace zt::testing {
 namespace {
 
-using zt::ContourStore;
-using zt::TaggedPointList;
-
-struct Rec {
-  float x, y, z;
-  std::int16_t flag = 1;
-};
-constexpr float S = 99999.0f;
-const Rec kSep{S, S, S, 1};
-
-// One record file of `width`-byte point records (12, 16 or 18), optionally
-// behind an 8-byte header record; the segmented layout written by hand.
-std::string contour_file(const std::vector<Rec>& recs, int width, bool header = false) {
-  auto put = [](std::string& s, const void* p, size_t n) { s.append(static_cast<const char*>(p), n); };
-  std::string out = "K";
-  if (header) {
-    out += '\x08';
-    const float v = 1.0f;
-    const std::int32_t c = 2;
-    put(out, &v, 4);
-    put(out, &c, 4);
-    out += '\x08';
-  }
-  for (const Rec& r : recs) {
-    out += static_cast<char>(width);
-    put(out, &r.x, 4);
-    put(out, &r.y, 4);
-    put(out, &r.z, 4);
-    const std::int32_t code = r.x >= 90000 ? -1001 : -1003;
-    if (width >= 16) put(out, &code, 4);
-    if (width >= 18) put(out, &r.flag, 2);
-    out += static_cast<char>(width);
-  }
-  return out + '\x82';
-}
-
-class ContourStoreTest : public testing::Test {
+class ContourStoreTest : public ZoneTmpTest {
  protected:
   // Writes the file, opens it as wf_add_level does and scans it.
   int load(const std::string& bytes) {
-    path_ = dir_ + "/contour.bin";
-    std::ofstream(path_, std::ios::binary) << bytes;
+    write_file("contour.bin", bytes);
     store_ = ContourStore{};
-    store_.reader = std::make_unique<zt::CKvlBinaryResFileReader>(false);
-    if (store_.reader->openPoints(path_.c_str()) != 0) return -100;
-    return zt::load_contours(store_, zt::read_contour_record);
+    store_.reader = std::make_unique<CKvlBinaryResFileReader>(false);
+    if (store_.reader->openPoints(path("contour.bin").c_str()) != 0) return -100;
+    return load_contours(store_, read_contour_record);
   }
   void expect_level(int i, std::int64_t first, std::int64_t last, float z) {
     ASSERT_LT(i, store_.levelCount);
@@ -70,9 +28,6 @@ class ContourStoreTest : public testing::Test {
     EXPECT_EQ(store_.levels[i].z, z) << "level " << i;
   }
 
-  zt::test::ScratchDir scratch_;
-  const std::string dir_ = scratch_.path().string();
-  std::string path_;
   ContourStore store_;
 };
 
@@ -81,30 +36,30 @@ TEST_F(ContourStoreTest, LevelsSpanTheirSeparatorsAndReadBackWithTags) {
                               {5, 6, 10},  {7, 8, 10},  kSep,          {1, 1, 5},      {2, 2, 5},
                               kSep};
   for (bool header : {false, true}) {
-    ASSERT_EQ(load(contour_file(recs, 18, header)), 0);
+    ASSERT_EQ(load(record_bytes(recs, 18, header)), 0);
     ASSERT_EQ(store_.levelCount, 2);
     expect_level(0, 3, 8, 10.0f);
     expect_level(1, 9, 11, 5.0f);
     EXPECT_EQ(store_.recordIndex, 0);
 
     TaggedPointList list;
-    ASSERT_EQ(zt::read_contour_level(store_, 0, list), 0);
+    ASSERT_EQ(read_contour_level(store_, 0, list), 0);
     ASSERT_EQ(list.count(), 6);
-    const std::int32_t tags[] = {3, -2, zt::kSeparatorTag, 1, 1, zt::kSeparatorTag};
+    const std::int32_t tags[] = {3, -2, kSeparatorTag, 1, 1, kSeparatorTag};
     for (int k = 0; k < 6; ++k) EXPECT_EQ(list[k].tag, tags[k]) << k;
     EXPECT_EQ(list[0].x, 1.0);
     EXPECT_EQ(list[2].x, 99999.0);  // separators keep their coordinates
     EXPECT_EQ(list[4].y, 8.0);
     list.Clear();
-    ASSERT_EQ(zt::read_contour_level(store_, 1, list), 0);
+    ASSERT_EQ(read_contour_level(store_, 1, list), 0);
     EXPECT_EQ(list.count(), 3);
-    EXPECT_EQ(zt::read_contour_level(store_, 2, list), -1);
-    EXPECT_EQ(zt::read_contour_level(store_, -1, list), -1);
+    EXPECT_EQ(read_contour_level(store_, 2, list), -1);
+    EXPECT_EQ(read_contour_level(store_, -1, list), -1);
   }
 }
 
 TEST_F(ContourStoreTest, OnlyADropBeyondTheToleranceOpensALevel) {
-  ASSERT_EQ(load(contour_file({{0, 0, 10}, {1, 0, 12}, {2, 0, 10}, {3, 0, 9.9995f}, {4, 0, 9.998f},
+  ASSERT_EQ(load(record_bytes({{0, 0, 10}, {1, 0, 12}, {2, 0, 10}, {3, 0, 9.9995f}, {4, 0, 9.998f},
                                kSep, {5, 0, 9.9975f}},
                               12)),
             0);
@@ -116,32 +71,32 @@ TEST_F(ContourStoreTest, OnlyADropBeyondTheToleranceOpensALevel) {
 }
 
 TEST_F(ContourStoreTest, LookupCursorOnlyMovesForward) {
-  ASSERT_EQ(load(contour_file({{0, 0, 10}, {0, 0, 5}, {0, 0, 0}}, 12)), 0);
+  ASSERT_EQ(load(record_bytes({{0, 0, 10}, {0, 0, 5}, {0, 0, 0}}, 12)), 0);
   ASSERT_EQ(store_.levelCount, 3);
-  EXPECT_EQ(zt::find_contour_level(store_, 10.00005), 0);
-  EXPECT_EQ(zt::find_contour_level(store_, 10.0), 0);  // the same z twice
+  EXPECT_EQ(find_contour_level(store_, 10.00005), 0);
+  EXPECT_EQ(find_contour_level(store_, 10.0), 0);  // the same z twice
   EXPECT_EQ(store_.levelCursor, 0);
-  EXPECT_EQ(zt::find_contour_level(store_, 7.0), -1);  // between 10 and 5
+  EXPECT_EQ(find_contour_level(store_, 7.0), -1);  // between 10 and 5
   EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(zt::find_contour_level(store_, 10.0), -1);  // above the cursor's level
+  EXPECT_EQ(find_contour_level(store_, 10.0), -1);  // above the cursor's level
   EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(zt::find_contour_level(store_, std::nan("")), -1);
-  EXPECT_EQ(zt::find_contour_level(store_, 1e300), -1);
+  EXPECT_EQ(find_contour_level(store_, std::nan("")), -1);
+  EXPECT_EQ(find_contour_level(store_, 1e300), -1);
   EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(zt::find_contour_level(store_, 4.99995), 1);
-  EXPECT_EQ(zt::find_contour_level(store_, -3.0), -1);  // below everything
+  EXPECT_EQ(find_contour_level(store_, 4.99995), 1);
+  EXPECT_EQ(find_contour_level(store_, -3.0), -1);  // below everything
   EXPECT_EQ(store_.levelCursor, 3);
-  EXPECT_EQ(zt::find_contour_level(store_, 0.0), -1);
+  EXPECT_EQ(find_contour_level(store_, 0.0), -1);
 }
 
 TEST_F(ContourStoreTest, FilesWithoutPointRecords) {
   for (const std::vector<Rec>& recs : {std::vector<Rec>{}, std::vector<Rec>{kSep, kSep}}) {
-    ASSERT_EQ(load(contour_file(recs, 18)), 0);
+    ASSERT_EQ(load(record_bytes(recs, 18)), 0);
     ASSERT_EQ(store_.levelCount, 1);
     EXPECT_EQ(store_.levels[0].z, 99999.0f);
-    EXPECT_EQ(zt::find_contour_level(store_, 0.0), -1);
+    EXPECT_EQ(find_contour_level(store_, 0.0), -1);
     TaggedPointList list;
-    EXPECT_EQ(zt::read_contour_level(store_, 0, list), 0);
+    EXPECT_EQ(read_contour_level(store_, 0, list), 0);
     EXPECT_EQ(list.count(), 0);
   }
 }
@@ -150,35 +105,36 @@ TEST_F(ContourStoreTest, FilesWithoutPointRecords) {
 // the previous read had left; they carry the suite's flag 1.
 TEST_F(ContourStoreTest, ShortRecordsGetTagOne) {
   for (int width : {12, 16}) {
-    ASSERT_EQ(load(contour_file({{1, 1, 3, 7}, {2, 2, 3, 7}, kSep}, width)), 0);
+    ASSERT_EQ(load(record_bytes({{1, 1, 3, 7}, {2, 2, 3, 7}, kSep}, width)), 0);
     TaggedPointList list;
-    ASSERT_EQ(zt::read_contour_level(store_, 0, list), 0);
+    ASSERT_EQ(read_contour_level(store_, 0, list), 0);
     ASSERT_EQ(list.count(), 3);
     EXPECT_EQ(list[0].tag, 1) << width;
     EXPECT_EQ(list[1].tag, 1) << width;
-    EXPECT_EQ(list[2].tag, zt::kSeparatorTag) << width;
+    EXPECT_EQ(list[2].tag, kSeparatorTag) << width;
   }
 }
 
 TEST_F(ContourStoreTest, RefusesATooLongFileAndAnUnreadableLevel) {
   std::vector<Rec> recs;
-  for (int i = 0; i <= zt::kMaxContourLevels; ++i) recs.push_back({0, 0, -0.01f * i});
-  EXPECT_EQ(load(contour_file(recs, 12)), -1);
+  for (int i = 0; i <= kMaxContourLevels; ++i) recs.push_back({0, 0, -0.01f * i});
+  EXPECT_EQ(load(record_bytes(recs, 12)), -1);
   recs.pop_back();
-  EXPECT_EQ(load(contour_file(recs, 12)), 0);
-  EXPECT_EQ(store_.levelCount, zt::kMaxContourLevels);
+  EXPECT_EQ(load(record_bytes(recs, 12)), 0);
+  EXPECT_EQ(store_.levelCount, kMaxContourLevels);
 
   // A level range that runs past the records the file holds (as after the
   // file lost its tail) cannot be read whole: the level fails.
-  ASSERT_EQ(load(contour_file({{0, 0, 1}, {1, 0, 1}, {1, 1, 1}, {0, 0, 1}, kSep}, 18)), 0);
+  ASSERT_EQ(load(record_bytes({{0, 0, 1}, {1, 0, 1}, {1, 1, 1}, {0, 0, 1}, kSep}, 18)), 0);
   store_.levels[0].last += 1;
   TaggedPointList list;
-  EXPECT_EQ(zt::read_contour_level(store_, 0, list), -1);
+  EXPECT_EQ(read_contour_level(store_, 0, list), -1);
   store_.levels[0] = {7, 7, 1.0f};
-  EXPECT_EQ(zt::read_contour_level(store_, 0, list), -1);
+  EXPECT_EQ(read_contour_level(store_, 0, list), -1);
 
   ContourStore none;
-  EXPECT_EQ(zt::load_contours(none, zt::read_contour_record), -1);
+  EXPECT_EQ(load_contours(none, read_contour_record), -1);
 }
 
 }  // namespace
+}  // namespace zt::testing

@@ -1,9 +1,9 @@
 // Polyline simplification: a brute-force bound on random polylines, a
-// reference implementation of both passes, and the exact boundary cases.
+// reference implementation of both passes, and the exact boundary cases
+// (the rows of data/simplify.txt).
 #include "zone/simplify.hpp"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cmath>
@@ -11,16 +11,10 @@
 #include <string>
 #include <vector>
 
-#include "support/subprocess.hpp"
+#include "support/data_table.hpp"
 
+namespace zt {
 namespace {
-
-using zt::Array;
-using zt::Point2d;
-using zt::PolylineSimplifier;
-using zt::TaggedPoint;
-using zt::TaggedPointList;
-using zt::VectorSimplifier;
 
 // Slack for the triangle-inequality bound: sqrt and the projection round.
 constexpr double kBoundSlack = 1e-12;
@@ -36,11 +30,11 @@ double seg_dist2(Point2d p, Point2d a, Point2d b) {
   return dist2(p, {a.x + t * dx, a.y + t * dy});
 }
 
-testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
+::testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
   bool same = got.size() == want.size();
   for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
-  if (same) return testing::AssertionSuccess();
-  testing::AssertionResult r = testing::AssertionFailure();
+  if (same) return ::testing::AssertionSuccess();
+  ::testing::AssertionResult r = ::testing::AssertionFailure();
   r << "got";
   for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
   return r;
@@ -131,10 +125,10 @@ TEST(SimplifyRandom, BothFormsStayWithinToleranceAndMatchReference) {
     ps.simplify(in.data(), n, tol, result, true);
     std::vector<Point2d> a(result.begin(), result.end());
     check_bound(in, a, tol);
-    const double rho = tol * zt::kRadialFactor;
+    const double rho = tol * kRadialFactor;
     ASSERT_TRUE(Same(a, reference(in, rho, tol - rho))) << "round " << round;
 
-    const double eps = round % 3 ? tol * 0.2 : zt::kPolylineRadialEps;
+    const double eps = round % 3 ? tol * 0.2 : kPolylineRadialEps;
     std::vector<Point2d> b = in;
     b.resize(vs.simplify(b.data(), n, eps, tol));
     check_bound(in, b, std::max(eps + tol, 2 * eps));
@@ -156,51 +150,51 @@ std::vector<Point2d> run_polyline(const std::vector<Point2d>& p, double tol) {
 }
 
 
-TEST(SimplifyExact, PointAtToleranceDroppedJustBeyondKept) {
-  const double tol = 0.005;
-  const double beyond = std::nextafter(tol, 1.0);
-  std::vector<Point2d> at{{0, 0}, {1, tol}, {2, 0}}, past{{0, 0}, {1, beyond}, {2, 0}};
-  EXPECT_EQ(run_vector(at, 0, tol).size(), 2u);
-  EXPECT_EQ(run_vector(past, 0, tol).size(), 3u);
-  // PolylineSimplifier: the Douglas-Peucker part is what the radial part leaves.
-  const double tau = tol - tol * zt::kRadialFactor;
-  at[1].y = tau;
-  past[1].y = std::nextafter(tau, 1.0);
-  EXPECT_EQ(run_polyline(at, tol).size(), 2u);
-  EXPECT_EQ(run_polyline(past, tol).size(), 3u);
-  // Radial pass: a point exactly at rho from the last kept one is dropped.
-  const std::vector<Point2d> radial{{0, 0}, {0.5, 0}, {0.5, 3}};
-  EXPECT_TRUE(Same(run_vector(radial, 0.5, 0), std::vector<Point2d>{{0, 0}, {0.5, 3}}));
+// "x,y x,y ..."; a number ending in '+' is the next double above it.
+std::vector<Point2d> points(const std::string& field) {
+  auto num = [](std::string s) {
+    const bool up = s.ends_with('+');
+    if (up) s.pop_back();
+    const double v = std::strtod(s.c_str(), nullptr);
+    return up ? std::nextafter(v, INFINITY) : v;
+  };
+  std::vector<Point2d> out;
+  for (const std::string& p : test::split_fields(field, ' '))
+    out.push_back({num(p.substr(0, p.find(','))), num(p.substr(p.find(',') + 1))});
+  return out;
 }
 
-TEST(SimplifyExact, TwoAndOnePointPolylines) {
-  const std::vector<Point2d> two{{0, 0}, {0.003, 0}};
-  EXPECT_TRUE(Same(run_polyline(two, 0.01), std::vector<Point2d>{{0.003, 0}}));
-  EXPECT_TRUE(Same(run_vector(two, 0.005, 0.005), std::vector<Point2d>{{0.003, 0}}));
-  EXPECT_TRUE(Same(run_polyline(two, 0.001), two));
-  EXPECT_TRUE(Same(run_vector(two, 0.001, 0.001), two));
-  const std::vector<Point2d> one{{4, 5}};
-  EXPECT_TRUE(Same(run_polyline(one, 1), one));
-  EXPECT_TRUE(Same(run_vector(one, 1, 1), one));
-  VectorSimplifier vs;
-  EXPECT_EQ(vs.simplify(nullptr, 3, 1, 1), 0);
-  // The first point too gives way to the last when everything lies within rho.
-  EXPECT_TRUE(Same(run_vector({{0, 0}, {0.1, 0}, {0.2, 0}}, 0.5, 1), std::vector<Point2d>{{0.2, 0}}));
+class SimplifyExact : public ::testing::TestWithParam<test::Row> {};
+
+// "x,y,tag ..." with S for a separator.
+void tagged(const std::string& field, TaggedPointList& l) {
+  for (const std::string& p : test::split_fields(field, ' ')) {
+    const std::vector<double> v = test::numbers(p, ',');
+    l.Add(p == "S" ? TaggedPoint::separator() : TaggedPoint(static_cast<std::int32_t>(v.at(2)), v.at(0), v.at(1)));
+  }
 }
 
-TEST(SimplifyExact, FirstOfEqualMaximaAndStartPointRepeats) {
-  const std::vector<Point2d> twin{{0, 0}, {1, 1}, {2, 1}, {3, 0}};
-  const std::vector<Point2d> first{{0, 0}, {1, 1}, {3, 0}};
-  EXPECT_TRUE(Same(run_vector(twin, 0, 0.95), first));
-  EXPECT_TRUE(Same(run_polyline(twin, 1.9), first));
-  // An offset curve's start point arrives first, second and last.
-  const std::vector<Point2d> curve{{0, 0}, {0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}};
-  EXPECT_TRUE(Same(run_polyline(curve, 0.001),
-                   std::vector<Point2d>{{0, 0}, {5, 0}, {5, 5}, {0, 5}, {0, 0}}));
-  std::vector<Point2d> line;
-  for (int i = 0; i <= 50; ++i) line.push_back({i * 0.25, i * 0.5});
-  EXPECT_TRUE(Same(run_polyline(line, 0.001), std::vector<Point2d>{{0, 0}, {12.5, 25}}));
+TEST_P(SimplifyExact, KeepsTheListedPoints) {
+  const test::Row& row = GetParam();
+  if (row[1] == "lists") {
+    TaggedPointList in, out, want;
+    tagged(row[2], in);
+    tagged(row[3], want);
+    out.Add({5, 1, 1});
+    simplify_polylines(in, out, 0.005);
+    ASSERT_EQ(out.count(), want.count());
+    for (int k = 0; k < out.count(); ++k)
+      EXPECT_TRUE(out[k].tag == want[k].tag && out[k].x == want[k].x && out[k].y == want[k].y) << k;
+    return;
+  }
+  const std::vector<double> a = test::numbers(row[1].substr(row[1].find(' ')));
+  const std::vector<Point2d> in = points(row[2]);
+  const bool vector = row[1].rfind("vector", 0) == 0;
+  EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(row[3])));
 }
+
+INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, ::testing::ValuesIn(test::read_table("simplify.txt", 4)),
+                         test::row_name);
 
 TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   PolylineSimplifier ps;
@@ -216,6 +210,8 @@ TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   Array<Point2d>* list = ps.resultList(100);
   EXPECT_TRUE(list->capacity() == 5000 && list->growBy() == 1000 && ps.resultList(9000) == list);
   EXPECT_EQ(PolylineSimplifier().resultList(6000)->capacity(), 6010);
+  VectorSimplifier vs;
+  EXPECT_EQ(vs.simplify(nullptr, 3, 1, 1), 0);
 }
 
 TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
@@ -227,63 +223,5 @@ TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
   EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()), line));
 }
 
-// Fills `l` and returns it, so a case reads as one line.
-const TaggedPointList& list_of(TaggedPointList& l, const std::vector<TaggedPoint>& pts) {
-  l.Clear();
-  for (const TaggedPoint& p : pts) l.Add(p);
-  return l;
-}
-
-TEST(SimplifyPolylines, SeparatorsTagsAndShortPolylines) {
-  const TaggedPoint sep = TaggedPoint::separator();
-  TaggedPointList in, out;
-  out.Add({5, 1, 1});
-  zt::simplify_polylines(list_of(in, {sep, sep, {7, 99995, 0}}), out, 0.005);
-  EXPECT_EQ(out.count(), 0);
-  zt::simplify_polylines(list_of(in, {sep, {3, 1, 1}, sep}), out, 0.005);
-  EXPECT_EQ(out.count(), 0);
-
-  // Two polylines, no leading separator, one trailing; a one-point polyline
-  // between them vanishes; a collinear point goes; every tag becomes 1.
-  zt::simplify_polylines(
-      list_of(in, {{9, 0, 0}, {9, 1, 0}, {9, 2, 0}, sep, {4, 8, 8}, sep, {2, 5, 5}, {2, 6, 6}, sep}), out,
-      0.005);
-  const std::vector<TaggedPoint> want{sep, {1, 0, 0}, {1, 2, 0}, sep, {1, 5, 5}, {1, 6, 6}};
-  ASSERT_EQ(out.count(), static_cast<int>(want.size()));
-  for (int k = 0; k < out.count(); ++k) {
-    EXPECT_EQ(out[k].tag, want[k].tag) << k;
-    EXPECT_EQ(out[k].x, want[k].x) << k;
-    EXPECT_EQ(out[k].y, want[k].y) << k;
-  }
-
-  // x exactly at the threshold starts no polyline but continues one.
-  zt::simplify_polylines(list_of(in, {{0, 99990, 0}, {0, 1, 1}, {0, 99990, 0}, {0, 1, 9}}), out, 0.005);
-  ASSERT_EQ(out.count(), 4);
-  EXPECT_EQ(out[2].x, 99990.0);
-  // Two points closer than the single-precision epsilon: the second remains.
-  zt::simplify_polylines(list_of(in, {{0, 1, 1}, {0, 1 + 1e-8, 1}}), out, 0.005);
-  ASSERT_EQ(out.count(), 2);
-  EXPECT_EQ(out[1].x, 1 + 1e-8);
-}
-
 }  // namespace
-
-// zonetool simplify's text form: blank lines only between polylines, shortest
-// numbers, bad input refused with status 2.
-TEST(ZonetoolSimplify, TextRoundTrip) {
-  const std::string tool = zt::test::zonetool_path();
-  if (access(tool.c_str(), X_OK) != 0) GTEST_SKIP() << "zonetool not built";
-  auto run = [&](const std::string& args, const std::string& input, int& status) {
-    const zt::test::CommandRun r = zt::test::run_command("printf '" + input + "' | " + tool + " simplify " + args + " 2>/dev/null");
-    status = r.status;
-    return r.out;
-  };
-  int status = -1;
-  EXPECT_EQ(run("--tolerance 0.01", "# c\\n0 0\\n1 0.001\\n2.50 0\\n\\n\\n5 5\\n\\n1 1\\n1 1\\n", status),
-            "0 0\n2.5 0\n\n1 1\n");
-  EXPECT_EQ(status, 0);
-  run("--tolerance 0.01", "1 2 3\\n", status);
-  EXPECT_EQ(status, 2);
-  run("--tolerance -1", "", status);
-  EXPECT_EQ(status, 2);
-}
+}  // namespace zt

@@ -1,7 +1,7 @@
-// Oracle: the zone builder's final zones against a reference built with
-// Clipper (round offsets at the same arc tolerance, intersection, then the
-// grow / unite / shrink over the levels), on generated pockets with islands
-// and rest material in their corners, on the real engines.
+// Oracle: the zone builder's zones, per level and final, against the Clipper
+// reference (round offsets at the same arc tolerance, intersection, then the
+// grow / unite / shrink over the levels), on generated pockets with an
+// island and rest material in their corners, on the real engines.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -9,91 +9,28 @@
 #include <random>
 
 #include "zone/entry_points.hpp"
-#include "support/clipper_paths.hpp"
+#include "e2e/clipper_reference.hpp"
 #include "zone_test_support.hpp"
 
 namespace zt::testing {
 namespace {
 
-namespace cl = ClipperLib;
-using test::boundary_distance;
-using test::to_path;
+using e2e::RefLevel;
+using e2e::RefPoly;
 
-constexpr double kArcTolerance = 0.005;
 constexpr double kBoundaryDistance = 0.02;
 constexpr double kMergeRadius = 2.0;
 constexpr double kOffsetDistance = 1.0;
 
 using Poly = std::vector<Point2f>;  // closed: first point repeated
 
-cl::Paths offset(const cl::Paths& in, double delta) { return test::round_offset(in, delta, kArcTolerance); }
-
-struct Level {
-  float z;
-  std::vector<Poly> pocket;  // outer counter-clockwise, islands clockwise
-  std::vector<Poly> rest;    // counter-clockwise
-};
-
-Poly reversed(Poly p) {
-  std::reverse(p.begin(), p.end());
-  return p;
-}
-
-// A pocket [0, w] x [0, h] with a rectangular island, the same on every
-// level, and rest material in some of its corners and the island's.
-std::vector<Level> make_case(std::mt19937& rng) {
-  std::uniform_real_distribution<float> size(60, 110), fillet(2, 7), coin(0, 1);
-  const float w = std::round(size(rng)), h = std::round(size(rng));
-  const Poly outer = rectangle(0, 0, w, h);
-  const float ix = std::round(w * 0.4f), iy = std::round(h * 0.4f);
-  const Poly island = reversed(rectangle(ix, iy, ix + 15, iy + 12));
-  std::vector<Level> levels;
-  const int count = 2 + static_cast<int>(coin(rng) * 3);
-  for (int k = 0; k < count; ++k) {
-    Level level{10.0f - 5.0f * k, {outer, island}, {}};
-    auto fill = [&](float cx, float cy, float sx, float sy) {
-      if (coin(rng) < 0.4f) return;
-      const float r = fillet(rng);
-      Poly t = {{cx, cy}, {cx + sx * r, cy}, {cx, cy + sy * r}, {cx, cy}};
-      if (sx * sy < 0) t = reversed(t);
-      level.rest.push_back(t);
-    };
-    fill(0, 0, 1, 1);
-    fill(w, 0, -1, 1);
-    fill(w, h, -1, -1);
-    fill(0, h, 1, -1);
-    // A ring of material around the island's lower left corner.
-    if (coin(rng) < 0.5f) {
-      const float r = fillet(rng);
-      level.rest.push_back({{ix - r, iy - r}, {ix + 4, iy - r}, {ix + 4, iy}, {ix, iy},
-                            {ix, iy + 4}, {ix - r, iy + 4}, {ix - r, iy - r}});
-    }
-    levels.push_back(level);
+std::vector<Poly> to_float(const std::vector<RefPoly>& polys) {
+  std::vector<Poly> out;
+  for (const RefPoly& p : polys) {
+    out.emplace_back();
+    for (const auto& q : p) out.back().push_back({static_cast<float>(q.x), static_cast<float>(q.y)});
   }
-  return levels;
-}
-
-// Final zones per level, from the bottom up, as the zone builder means them.
-std::map<float, cl::Paths> reference(const std::vector<Level>& levels) {
-  std::map<float, cl::Paths> finals;
-  cl::Paths carried, last;
-  bool any = false;
-  for (auto it = levels.rbegin(); it != levels.rend(); ++it) {
-    cl::Paths pocket, rest;
-    for (const Poly& p : it->pocket) pocket.push_back(to_path(p));
-    for (const Poly& p : it->rest) rest.push_back(to_path(p));
-    const bool hasRest = !rest.empty();
-    if (hasRest) {
-      const cl::Paths zones = test::clip(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
-      if (!zones.empty()) {
-        carried = test::clip(carried, offset(zones, kMergeRadius + 0.04), cl::ctUnion);
-        last = offset(carried, -kMergeRadius);
-        any = true;
-      }
-    }
-    if (any) finals[it->z] = last;
-  }
-  return finals;
+  return out;
 }
 
 std::map<float, std::vector<Poly>> g_written;
@@ -114,11 +51,11 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
     TearDown();
     SetUp();
     g_written.clear();
-    const std::vector<Level> levels = make_case(rng);
+    const std::vector<RefLevel> levels = e2e::pocket_case(rng, {60, 0.4f, 0.4f, 2, false, false});
     std::vector<LevelContours> file;
     std::vector<float> zs;
-    for (const Level& l : levels) {
-      file.push_back({l.z, l.pocket});
+    for (const RefLevel& l : levels) {
+      file.push_back({l.z, to_float(l.finishing)});
       zs.push_back(l.z);
     }
     write_file("contour.bin", record_file(file));
@@ -126,16 +63,13 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
     std::int32_t ierr = -1;
     wf_init_czone(zs.data(), static_cast<std::int32_t>(zs.size()), ierr);
     ASSERT_EQ(ierr, 0);
-    for (const Level& l : levels) {
-      const std::vector<Point2f> pts = stock_points(l.rest);
+    for (const RefLevel& l : levels) {
+      const std::vector<Point2f> pts = stock_points(to_float(l.rest));
       if (pts.size() <= 4) continue;  // the driver's rule
       wf_add_level(l.z, pts.data(), static_cast<std::int32_t>(pts.size()), ierr);
       ASSERT_EQ(ierr, 0) << "level " << l.z;
       // The level's own zones before the merge.
-      cl::Paths pocket, rest;
-      for (const Poly& p : l.pocket) pocket.push_back(to_path(p));
-      for (const Poly& p : l.rest) rest.push_back(to_path(p));
-      const cl::Paths want = test::clip(pocket, offset(rest, kOffsetDistance), cl::ctIntersection);
+      const auto want = e2e::level_zones(l, kOffsetDistance);
       std::vector<Poly> got(1);
       for (const Point2f& p : zone_builder().context->levelResult) {
         if (p.x < 99990.0f) got.back().push_back(p);
@@ -143,7 +77,7 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
       }
       if (got.back().empty()) got.pop_back();
       EXPECT_EQ(got.size(), want.size()) << "level " << l.z;
-      const double d = boundary_distance(got, want);
+      const double d = test::boundary_distance(got, want);
       EXPECT_LE(d, kBoundaryDistance) << "zones of level " << l.z;
       worstLevel = std::max(worstLevel, d);
       ++compared;
@@ -153,14 +87,14 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
     wf_fin_czone(buffer, 3, ierr, keep_contour);
     ::testing::internal::GetCapturedStdout();
     ASSERT_EQ(ierr, 0);
-    const auto ref = reference(levels);
-    for (const Level& l : levels) {
+    const auto ref = e2e::reference_zones(levels, kOffsetDistance, kMergeRadius, 1);
+    for (const RefLevel& l : levels) {
       const auto r = ref.find(l.z);
       const auto o = g_written.find(l.z);
       ASSERT_EQ(r != ref.end() && !r->second.empty(), o != g_written.end()) << "level " << l.z;
       if (o == g_written.end()) continue;
       EXPECT_EQ(o->second.size(), r->second.size()) << "level " << l.z;
-      const double d = boundary_distance(o->second, r->second);
+      const double d = test::boundary_distance(o->second, r->second);
       EXPECT_LE(d, kBoundaryDistance) << "level " << l.z;
       worst = std::max(worst, d);
       ++finals;

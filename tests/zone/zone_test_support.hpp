@@ -161,32 +161,51 @@ class ZoneTmpTest : public ::testing::Test {
   const std::string dir_ = scratch_.path().string();
 };
 
-// A record file of 18-byte point records: per level its contours, each
-// behind a separator record.
+// A record file of `width`-byte point records (12, 16 or 18: x, y, z, then
+// the code, then the flag), optionally behind an 8-byte header record.
+struct Rec {
+  float x, y, z;
+  std::int16_t flag = 1;
+};
+inline constexpr Rec kSep{99999.0f, 99999.0f, 99999.0f, 1};
+inline std::string record_bytes(const std::vector<Rec>& recs, int width = 18, bool header = false) {
+  auto put = [](std::string& s, const void* p, size_t n) { s.append(static_cast<const char*>(p), n); };
+  std::string out = "K";
+  if (header) {
+    const float v = 1.0f;
+    const std::int32_t c = 2;
+    out += '\x08';
+    put(out, &v, 4);
+    put(out, &c, 4);
+    out += '\x08';
+  }
+  for (const Rec& r : recs) {
+    const std::int32_t code = r.x >= 90000 ? -1001 : -1003;
+    out += static_cast<char>(width);
+    put(out, &r.x, 4);
+    put(out, &r.y, 4);
+    put(out, &r.z, 4);
+    if (width >= 16) put(out, &code, 4);
+    if (width >= 18) put(out, &r.flag, 2);
+    out += static_cast<char>(width);
+  }
+  return out + '\x82';
+}
+
+// Per level its contours, each behind a separator record.
 struct LevelContours {
   float z;
   std::vector<std::vector<Point2f>> contours;
 };
 inline std::string record_file(const std::vector<LevelContours>& levels) {
-  std::string out = "K";
-  auto record = [&out](float x, float y, float z, std::int32_t code) {
-    const std::int16_t flag = 1;
-    char r[20] = {18};
-    std::memcpy(r + 1, &x, 4);
-    std::memcpy(r + 5, &y, 4);
-    std::memcpy(r + 9, &z, 4);
-    std::memcpy(r + 13, &code, 4);
-    std::memcpy(r + 17, &flag, 2);
-    r[19] = 18;
-    out.append(r, 20);
-  };
+  std::vector<Rec> recs;
   for (const LevelContours& level : levels) {
     for (const auto& contour : level.contours) {
-      record(99999.0f, 99999.0f, 99999.0f, -1001);
-      for (const Point2f& p : contour) record(p.x, p.y, level.z, -1003);
+      recs.push_back(kSep);
+      for (const Point2f& p : contour) recs.push_back({p.x, p.y, level.z});
     }
   }
-  return out + '\x82';
+  return record_bytes(recs);
 }
 
 // A closed counter-clockwise axis-parallel rectangle.
