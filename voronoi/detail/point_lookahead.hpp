@@ -6,9 +6,11 @@
 // order a few entries ahead and moves each drawn point through stages, one
 // insertion apart, so that its loads are requested long before they are
 // needed (slot i is inserted i insertions from now):
-//   slot 5: drawn, its point record requested;
-//   slot 4: the heads of the grid cells around it requested (with the
-//           quadtree: a walk down the path a search for it takes started);
+//   slot 7: drawn, its point record requested;
+//   slot 6: the heads of the grid cells around it requested (with the
+//           quadtree: a walk down the path a search for it takes started,
+//           which goes on from checkpoints until the search; a quadtree
+//           is deep, so the walk starts early);
 //   slot 3: the first entries of those cells requested;
 //   slot 2: its nearest point looked up (which enters it into the search)
 //           and a walk of that point's region started;
@@ -51,10 +53,10 @@ class PointLookahead {
 
  private:
   enum Stage { kDrawn, kCellsRequested, kEntriesRequested, kSearched };
-  static constexpr int kSlots = 6;
+  static constexpr int kSlots = 8;
   static constexpr int kSearchedSlots = 3;  // slots 0..2
   static constexpr int kEntriesSlot = 3;
-  static constexpr int kCellsSlot = 4;
+  static constexpr int kCellsSlot = 6;
   static_assert(kSlots - 1 <= OrderRandom::kMaxGivenBack);
 
   struct Slot {
