@@ -80,20 +80,9 @@ void VD_Reset() {
   g.frameSet = false;
   g.dummiesAdded = false;
   g.arcsApproximated = 0;
-  g.nodes.count = 0;
-  g.edges.count = 0;
-  g.freeNodes.count = 0;
-  g.freeEdges.count = 0;
-  g.degree2.count = 0;
-  g.nodeRadiiSquared = true;
-  g.bisectorsSplit = false;
-  g.upToDate = false;
+  ClearDiagram();  // no site left whose fields it would reset
   g.computing = false;
   g.restartPending = false;
-  g.insertionOrder.count = 0;
-  g.orderRemaining = 0;
-  g.markedSites.count = 0;
-  g.checkedNodes.count = 0;
   g.offsetNewRequest = true;
   ResetOffsetState();
   g.offsetCurves.count = 0;

@@ -18,16 +18,26 @@ bool SegmentEndsAt(std::int32_t seg, std::int32_t point) {
   return s.i1 == point || s.i2 == point;
 }
 
+// The end nodes of an edge by increasing clearance.
+struct Ends {
+  const NodeRecord& lo;
+  const NodeRecord& hi;
+};
+Ends EndsOf(const EdgeRecord& r) {
+  const NodeRecord& a = Vd().nodes[r.n1];
+  const NodeRecord& b = Vd().nodes[r.n2];
+  return a.r < b.r ? Ends{a, b} : Ends{b, a};
+}
+// An edge whose clearance does not vary (within kOffsetZero) has no
+// crossing formula: its data is marked degenerate.
+bool FlatClearance(const NodeRecord& lo, const NodeRecord& hi) { return std::fabs(hi.r - lo.r) <= kOffsetZero; }
+
 void LineData(const EdgeRecord& r, OffsetEdgeData& d) {
-  const Engine& g = Vd();
-  const NodeRecord& a = g.nodes[r.n1];
-  const NodeRecord& b = g.nodes[r.n2];
-  if (std::fabs(a.r - b.r) <= kOffsetZero) {
+  const auto [lo, hi] = EndsOf(r);
+  if (FlatClearance(lo, hi)) {
     d.degenerate = 1;
     return;
   }
-  const NodeRecord& lo = a.r < b.r ? a : b;
-  const NodeRecord& hi = a.r < b.r ? b : a;
   d.v0 = hi.x - lo.x;
   d.v1 = hi.y - lo.y;
 }
@@ -39,15 +49,8 @@ void LineData(const EdgeRecord& r, OffsetEdgeData& d) {
 // node's radius is close to h and sqrt(r^2 - h^2) would amplify its error.
 void PointPointData(const EdgeRecord& r, OffsetEdgeData& d) {
   const Engine& g = Vd();
-  const NodeRecord& a = g.nodes[r.n1];
-  const NodeRecord& b = g.nodes[r.n2];
-  if (std::fabs(a.r - b.r) <= kOffsetZero) {
-    d.degenerate = 1;
-    return;
-  }
-  const NodeRecord& lo = a.r < b.r ? a : b;
-  const NodeRecord& hi = a.r < b.r ? b : a;
-  if (std::hypot(hi.x - lo.x, hi.y - lo.y) <= kOffsetZero) {
+  const auto [lo, hi] = EndsOf(r);
+  if (FlatClearance(lo, hi) || std::hypot(hi.x - lo.x, hi.y - lo.y) <= kOffsetZero) {
     d.degenerate = 1;
     return;
   }
@@ -84,13 +87,11 @@ void ParabolaData(const EdgeRecord& r, OffsetEdgeData& d) {
     }
     std::swap(seg, pnt);
   }
-  const NodeRecord& a = g.nodes[r.n1];
-  const NodeRecord& b = g.nodes[r.n2];
-  if (std::fabs(a.r - b.r) <= kOffsetZero) {
+  const auto [lo, hi] = EndsOf(r);
+  if (FlatClearance(lo, hi)) {
     d.degenerate = 1;
     return;
   }
-  const NodeRecord& hi = a.r < b.r ? b : a;
   const SegmentRecord& s = g.segments[seg];
   const PointRecord& p = g.points[pnt];
   const double dist = s.a * p.x + s.b * p.y + s.c;
