@@ -29,6 +29,7 @@ constexpr double kClusteredDensity = 10.0;
 constexpr double kMinCellFactor = 2.0;
 constexpr double kMaxCellFactor = 4.0;
 constexpr std::int32_t kEntryGrowth = 32768;
+constexpr std::int64_t kMaxCells = std::int64_t{1} << 30;
 // Prefetch hints cover the cells within this many rings of a query's cell
 // (two rings measured no faster: the first ring mostly holds the answer).
 constexpr std::int32_t kPrefetchRing = 1;
@@ -90,7 +91,10 @@ class NearestPointSearch {
   // Grid.
   std::int32_t cols_ = 0, rows_ = 0;
   std::vector<double> xb_, yb_;  // cols_+1 and rows_+1 cell boundaries
-  std::vector<std::int32_t> heads_;
+  // Engine storage, not a vector: a grid of millions of cells then gets
+  // the large pages the engine's arrays get, and its random reads do not
+  // each miss the address translation cache.
+  RecordArray<std::int32_t> heads_;
   RecordArray<Entry> entries_;
   std::int64_t nonEmpty_ = 0;
   // Sampling.
@@ -109,7 +113,10 @@ class NearestPointSearch {
   std::vector<Candidate> heap_;
 
  public:
-  ~NearestPointSearch() { entries_.Free(); }
+  ~NearestPointSearch() {
+    heads_.Free();
+    entries_.Free();
+  }
 };
 
 void NearestPointSearch::Build(std::int32_t total, double minX, double minY, double maxX,
@@ -131,7 +138,10 @@ void NearestPointSearch::Build(std::int32_t total, double minX, double minY, dou
 }
 
 void NearestPointSearch::BuildGrid(std::int64_t cells) {
-  const double root = std::sqrt(static_cast<double>(std::max<std::int64_t>(cells, 1)));
+  // Columns times rows never exceed the cells asked for, and the cells are
+  // counted in 32 bits.
+  cells = std::clamp<std::int64_t>(cells, 1, kMaxCells);
+  const double root = std::sqrt(static_cast<double>(cells));
   cols_ = static_cast<std::int32_t>(std::clamp(aspect_ * root, 1.0, 1e8));
   rows_ = static_cast<std::int32_t>(std::clamp(root / aspect_, 1.0, 1e8));
   xb_.resize(cols_ + 1);
@@ -140,7 +150,11 @@ void NearestPointSearch::BuildGrid(std::int64_t cells) {
   for (std::int32_t j = 0; j <= rows_; ++j) yb_[j] = box_.y0 + (box_.y1 - box_.y0) * j / rows_;
   xb_[cols_] = box_.x1;
   yb_[rows_] = box_.y1;
-  heads_.assign(static_cast<std::size_t>(cols_) * rows_, -1);
+  const std::int64_t gridCells = std::int64_t{cols_} * rows_;
+  heads_.count = 0;
+  heads_.Reserve(gridCells);
+  std::fill_n(heads_.data, gridCells, -1);
+  heads_.count = static_cast<std::int32_t>(gridCells);
   entries_.count = 0;
   nonEmpty_ = 0;
 }
@@ -221,7 +235,7 @@ void NearestPointSearch::PrefetchCells(double x, double y, bool entries) const {
   const std::int32_t cx = Column(x), cy = Row(y);
   const std::int32_t i0 = std::max(cx - kPrefetchRing, 0), i1 = std::min(cx + kPrefetchRing, cols_ - 1);
   for (std::int32_t j = std::max(cy - kPrefetchRing, 0); j <= std::min(cy + kPrefetchRing, rows_ - 1); ++j) {
-    const std::int32_t* row = heads_.data() + static_cast<std::size_t>(j) * cols_;
+    const std::int32_t* row = heads_.data + static_cast<std::size_t>(j) * cols_;
     if (!entries) {
       __builtin_prefetch(row + i0);
       __builtin_prefetch(row + i1);
@@ -260,8 +274,7 @@ void NearestPointSearch::Record(std::int32_t p) {
 void NearestPointSearch::SwitchToQuadtree() {
   quadtree_ = true;
   Vd().usedQuadtree = true;
-  heads_.clear();
-  heads_.shrink_to_fit();
+  heads_.Free();
   entries_.Free();
   quad_.clear();
   quad_.reserve(static_cast<std::size_t>(total_));
