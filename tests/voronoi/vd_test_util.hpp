@@ -102,4 +102,21 @@ inline std::string FinalCheck(bool bruteForce = true) {
   return vd::CheckDiagram(o);
 }
 
+// Computes the stored sites with the checker after insertions (every
+// `every`-th, each of the first `allUpTo`) and in full at the end: "" or the
+// first error.
+inline std::string CheckedCompute(bool pointsOnly = true, int every = 1, bool bruteForce = true, int allUpTo = 0) {
+  CheckingObserver obs;
+  obs.every = every;
+  obs.allUpTo = allUpTo;
+  obs.Attach();
+  if (!VD_ComputeDiagram(false, 1, pointsOnly, false, 0, 0, 0.0, 0.0, true)) return "not computed";
+  return obs.firstError.empty() ? FinalCheck(bruteForce) : obs.firstError;
+}
+
+inline std::string CheckedRun(const std::vector<Pt>& pts) {
+  Store(pts);
+  return CheckedCompute();
+}
+
 }  // namespace zt::vdtest
