@@ -12,47 +12,6 @@
 namespace zt::vdtest {
 namespace {
 
-// The points of a generator list (see the data file).
-std::vector<Pt> Generate(const std::string& spec) {
-  std::vector<Pt> pts, more;
-  std::istringstream s(spec);
-  for (std::string part; std::getline(s, part, ';');) {
-    std::vector<std::string> w = Words(part);
-    if (w.empty()) continue;
-    const std::string kind = w[0];
-    w.erase(w.begin());
-    std::vector<double> a;
-    for (const std::string& x : w) a.push_back(Num(x));
-    const auto arg = [&](std::size_t i) { return static_cast<int>(a.at(i)); };
-    more.clear();
-    if (kind == "points") {
-      for (std::size_t i = 0; i + 1 < a.size(); i += 2) more.push_back({a[i], a[i + 1]});
-    } else if (kind == "uniform") {
-      more = UniformPoints(arg(0), arg(1), a.at(2));
-    } else if (kind == "clustered") {
-      more = ClusteredPoints(arg(0), arg(1));
-    } else if (kind == "lattice") {
-      more = LatticePoints(arg(0), a.at(1));
-    } else if (kind == "collinear") {
-      more = CollinearPoints(arg(0), arg(1));
-    } else if (kind == "ring") {
-      for (int i = 0; i < arg(0); ++i)
-        more.push_back({a[1] * std::cos(i * M_PI / (arg(0) / 2)), a[1] * std::sin(i * M_PI / (arg(0) / 2))});
-    } else if (kind == "jitter") {
-      std::mt19937 rng(arg(0));
-      std::uniform_int_distribution<int> ulp(-arg(1), arg(1));
-      for (Pt& p : pts) {
-        for (int k = ulp(rng); k != 0; k += k > 0 ? -1 : 1) p.x = std::nextafter(p.x, k > 0 ? 10.0 : -10.0);
-        for (int k = ulp(rng); k != 0; k += k > 0 ? -1 : 1) p.y = std::nextafter(p.y, k > 0 ? 10.0 : -10.0);
-      }
-    } else {
-      ADD_FAILURE() << "unknown generator " << kind;
-    }
-    pts.insert(pts.end(), more.begin(), more.end());
-  }
-  return pts;
-}
-
 class PointSets : public CaseRows {};
 
 TEST_P(PointSets, KeepTheInvariantsAndTheExpectations) {

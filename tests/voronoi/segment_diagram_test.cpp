@@ -7,35 +7,11 @@
 #include <random>
 #include <vector>
 
-#include "tests/voronoi/vd_test_util.hpp"
+#include "vd_test_util.hpp"
 #include "voronoi/detail/segment_checks.hpp"
 
 namespace zt::vdtest {
 namespace {
-
-using Contour = std::vector<Pt>;
-
-// Stores closed contours as points and segments between consecutive points.
-void StoreContours(const std::vector<Contour>& contours) {
-  VD_Initialize();
-  VD_Reset();
-  std::int32_t tag = 0;
-  for (const Contour& c : contours) {
-    std::vector<std::int32_t> idx;
-    for (const Pt& p : c) idx.push_back(API_AddPoint(p.x, p.y, tag++));
-    for (std::size_t i = 0; i < idx.size(); ++i) API_AddSegment(idx[i], idx[(i + 1) % idx.size()], tag++);
-  }
-}
-
-bool ComputeSegments() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
-
-TEST(SegmentDiagram, Square) {
-  StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_EQ(VD_GetRestartCount(), 0);
-  EXPECT_FALSE(VD_InRecoveryMode());
-}
 
 // A star-shaped simple polygon: sorted random angles, random radii.
 Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rmin = 0.2, double rmax = 0.45) {
@@ -92,15 +68,11 @@ Contour DenseSquare(int k, double size, double at = 0.0) {
   return c;
 }
 
-// Computes with the checker after every insertion; returns the first error.
+// Computes with the checker after every `every`-th insertion; "" or the
+// first error, of the diagram or of its segment edges.
 std::string RunChecked(const std::vector<Contour>& contours, int every = 1, bool bruteForce = true) {
   StoreContours(contours);
-  CheckingObserver obs;
-  obs.every = every;
-  obs.Attach();
-  if (!ComputeSegments()) return "not computed";
-  if (!obs.firstError.empty()) return obs.firstError;
-  const std::string error = FinalCheck(bruteForce);
+  const std::string error = CheckedCompute(false, every, bruteForce);
   return error.empty() ? vd::CheckSegmentEdges() : error;
 }
 
@@ -162,6 +134,7 @@ TEST(SegmentDiagram, NestedContoursWithHoles) {
 }
 
 TEST(SegmentDiagram, AxisAlignedAndCollinearContours) {
+  ExpectClean({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}}, "square");
   ExpectClean({Staircase(20, 1.0)}, "staircase");
   ExpectClean({DenseSquare(10, 1.0)}, "dense square");
   ExpectClean({DenseSquare(7, 3.0), Reversed(DenseSquare(3, 1.0, 1.0))}, "dense squares nested");

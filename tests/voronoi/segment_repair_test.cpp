@@ -5,7 +5,7 @@
 #include <cmath>
 #include <vector>
 
-#include "tests/voronoi/vd_test_util.hpp"
+#include "vd_test_util.hpp"
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/preprocess.hpp"
 #include "voronoi/detail/segment_repair.hpp"
@@ -126,23 +126,11 @@ TEST(SegmentRepair, SuspectPairIsTestedFirstAndCleared) {
 
 // ---- Whole computations on defective input.
 
-void StoreClosed(const std::vector<std::vector<Pt>>& contours) {
-  VD_Initialize();
-  VD_Reset();
-  for (const auto& c : contours) {
-    std::vector<std::int32_t> idx;
-    for (const Pt& p : c) idx.push_back(API_AddPoint(p.x, p.y, 1));
-    for (std::size_t i = 0; i < idx.size(); ++i) API_AddSegment(idx[i], idx[(i + 1) % idx.size()], 2);
-  }
-}
-
-bool Compute() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
-
 TEST(SegmentRepairComputation, CrossingContoursAreSplitAndComplete) {
   // Two overlapping squares: eight crossings... of which the computation
   // needs every one repaired to finish with a sound diagram.
-  StoreClosed({{{0, 0}, {2, 0}, {2, 2}, {0, 2}}, {{1, 1}, {3, 1.2}, {3.1, 3}, {0.9, 3.2}}});
-  ASSERT_TRUE(Compute());
+  StoreContours({{{0, 0}, {2, 0}, {2, 2}, {0, 2}}, {{1, 1}, {3, 1.2}, {3.1, 3}, {0.9, 3.2}}}, 1);
+  ASSERT_TRUE(ComputeSegments());
   EXPECT_EQ(FinalCheck(), "");
   EXPECT_GT(VD_GetRestartCount(), 0);
   // A star crossed by a long segment through its middle.
@@ -154,18 +142,18 @@ TEST(SegmentRepairComputation, CrossingContoursAreSplitAndComplete) {
   }
   for (int i = 0; i < 12; ++i) API_AddSegment(idx[i], idx[(i + 1) % 12], 0);
   API_AddSegment(API_AddPoint(-2, 0.1, 0), API_AddPoint(2, -0.05, 0), 0);
-  ASSERT_TRUE(Compute());
+  ASSERT_TRUE(ComputeSegments());
   EXPECT_EQ(FinalCheck(), "");
 }
 
 TEST(SegmentRepairComputation, NearDuplicatePointsAndPointsOnSegments) {
   // Internal units: the square spans 1, so 1e-8 is far below the repair
   // distance of 1e-6.
-  StoreClosed({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
+  StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}}, 1);
   API_AddPoint(0.5, 1e-8, 3);        // on the bottom edge
   API_AddPoint(1 + 1e-8, 1 - 1e-8, 3);  // at a corner
   API_AddPoint(0.25, 0.75, 3);       // an honest point inside
-  ASSERT_TRUE(Compute());
+  ASSERT_TRUE(ComputeSegments());
   EXPECT_EQ(FinalCheck(), "");
   EXPECT_GT(VD_GetRestartCount(), 0);
 }
@@ -179,7 +167,7 @@ TEST(SegmentRepairComputation, DuplicateSegmentsInEitherOrientation) {
   API_AddSegment(c, a, 0);
   API_AddSegment(b, a, 0);
   API_AddSegment(c, b, 0);
-  ASSERT_TRUE(Compute());
+  ASSERT_TRUE(ComputeSegments());
   EXPECT_EQ(FinalCheck(), "");
   EXPECT_EQ(vd::Vd().segments.count, 3);
 }
