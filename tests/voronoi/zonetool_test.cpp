@@ -1,0 +1,107 @@
+// zonetool voronoi and zonetool offset as subprocesses: the cases of
+// data/zonetool.txt (exit status, exact or partial output), the layout of
+// the diagram and of the raw offset store, and the separation of curves.
+#include <gtest/gtest.h>
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <fstream>
+#include <sstream>
+#include <string>
+
+#include "case_rows.hpp"
+#include "support/subprocess.hpp"
+
+namespace zt::vdtest {
+namespace {
+
+using ToolRun = test::CommandRun;
+
+std::string Unescape(const std::string& s) {
+  std::string out;
+  for (std::size_t i = 0; i < s.size(); ++i) {
+    const bool escape = s[i] == '\\' && i + 1 < s.size() && s[i + 1] == 'n';
+    out += escape ? '\n' : s[i];
+    i += escape;
+  }
+  return out;
+}
+
+// Runs `zonetool <subcommand> <input file> <args>`; one input file per test
+// and process, as ctest runs the cases side by side.
+ToolRun Zonetool(const std::string& subcommand, const std::string& text, const std::string& args = "") {
+  std::string name = testing::UnitTest::GetInstance()->current_test_info()->name();
+  std::replace(name.begin(), name.end(), '/', '_');
+  std::ostringstream file, command;
+  file << testing::TempDir() << "zt_" << subcommand << "_" << name << "_" << getpid() << ".txt";
+  std::ofstream(file.str()) << text;
+  command << test::zonetool_path() << " " << subcommand << " " << file.str() << " " << args << " 2>&1";
+  return test::run_command(command.str());
+}
+
+class ZonetoolCases : public CaseRows {};
+
+TEST_P(ZonetoolCases, AnswerWithTheirStatusAndOutput) {
+  const std::string command = row().field(0), want = row().field(3);
+  const std::string subcommand = command.substr(0, command.find(' '));
+  const ToolRun r = Zonetool(subcommand, Unescape(row().field(1)), command.substr(subcommand.size()));
+  EXPECT_EQ(r.status, std::stoi(row().field(2))) << r.out;
+  const std::string text = want.empty() ? "" : Unescape(Trim(want.substr(1)));
+  EXPECT_TRUE(want.empty() || want[0] != '=' || r.out == text) << r.out;
+  EXPECT_TRUE(want.empty() || want[0] != '~' || r.out.find(text) != std::string::npos) << r.out;
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, ZonetoolCases, RowsOf("zonetool.txt"), RowName);
+
+TEST(ZonetoolVoronoi, PrintsNodesEdgesAndFigures) {
+  const ToolRun r = Zonetool("voronoi", "# a triangle\np 0 0\np 4 0\n\np 0 3\n");
+  ASSERT_EQ(r.status, 0) << r.out;
+  std::istringstream in(r.out);
+  int nodes = 0, edges = 0;
+  bool circumcentre = false;
+  std::string line, last;
+  while (std::getline(in, line)) {
+    last = line;
+    nodes += line.rfind("node ", 0) == 0;
+    edges += line.rfind("edge ", 0) == 0;
+    // The circumcentre of the right triangle: the hypotenuse's midpoint.
+    circumcentre |= line.find(" 2 1.5 2.5") != std::string::npos;
+  }
+  EXPECT_TRUE(circumcentre) << r.out;
+  EXPECT_EQ(last, "restarts 0 recovery 0");
+  // Euler with 7 sites (three points, four corners) and the outer face.
+  EXPECT_EQ(nodes - edges + 8, 2);
+  // An edge between points 0 and 1, in one direction or the other.
+  EXPECT_TRUE(r.out.find(" 0 2 1 2\n") != std::string::npos || r.out.find(" 1 2 0 2\n") != std::string::npos)
+      << r.out;
+}
+
+TEST(ZonetoolOffset, RawStoreListsCurvesAndElements) {
+  const ToolRun r = Zonetool("offset", "0 0\n1 0\n1 1\n0 1\n0 0\n", "--side 2 --distance 0.1 --raw");
+  ASSERT_EQ(r.status, 0) << r.out;
+  std::istringstream in(r.out);
+  std::string line;
+  std::getline(in, line);
+  EXPECT_EQ(line, "curve 0.1");
+  int lines = 0, arcs = 0;
+  while (std::getline(in, line)) {
+    std::istringstream w(line);
+    int kind, site;
+    double x, y;
+    ASSERT_TRUE(w >> kind >> site >> x >> y) << line;
+    (kind == 0 ? lines : arcs)++;
+  }
+  EXPECT_EQ(lines, 4);
+  EXPECT_EQ(arcs, 4);
+}
+
+TEST(ZonetoolOffset, TwoContoursAreSeparatedByABlankLine) {
+  const ToolRun r = Zonetool("offset", "0 0\n1 0\n1 1\n0 1\n0 0\n\n5 0\n6 0\n6 1\n5 1\n5 0\n", "--distance 0.1 --side 1");
+  ASSERT_EQ(r.status, 0) << r.out;
+  EXPECT_NE(r.out.find("\n\n"), std::string::npos);
+  EXPECT_EQ(r.out.find("\n\n"), r.out.rfind("\n\n"));
+}
+
+}  // namespace
+}  // namespace zt::vdtest
