@@ -12,6 +12,7 @@
 #include <random>
 #include <vector>
 
+#include "offset_check.hpp"
 #include "voronoi/engine.hpp"
 #include "zone/slope_domain.hpp"
 
@@ -28,18 +29,6 @@ constexpr double kBoundaryTolerance = 0.01;
 // the arc, as ours are: both results then stay within 0.005 of the exact
 // offset and within 0.01 of each other.
 constexpr double kClipperJoinOvershoot = 2.25;
-
-Ring Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
-  std::uniform_real_distribution<double> radius(rmin, rmax), jitter(-0.3, 0.3);
-  Ring c;
-  for (int i = 0; i < n; ++i) {
-    const double a = 2 * std::numbers::pi * (i + 0.5 + jitter(rng)) / n;
-    const double r = radius(rng);
-    c.push_back({cx + r * std::cos(a), cy + r * std::sin(a)});
-  }
-  if (clockwise) std::reverse(c.begin(), c.end());
-  return c;
-}
 
 // The curves SlopeDomain collects (closed rings, repeated points dropped).
 std::vector<Ring> OursOffset(const std::vector<Ring>& rings, double t, std::int32_t side) {
@@ -111,12 +100,12 @@ double OneWay(const std::vector<Ring>& from, const std::vector<Ring>& to) {
 TEST(ClipperOffsetOracle, PocketsWithIslandsInsideAndOutside) {
   std::mt19937 rng(23);
   for (int trial = 0; trial < 40; ++trial) {
-    std::vector<Ring> rings{Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
+    std::vector<Ring> rings{vdtest::Star<Point2d>(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
     const int islands = trial % 4;
     for (int h = 0; h < islands; ++h) {
       const double a = 2 * std::numbers::pi * h / std::max(islands, 1);
       const double off = islands == 1 ? 0.0 : 35.0;
-      rings.push_back(Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
+      rings.push_back(vdtest::Star<Point2d>(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
     }
     std::uniform_real_distribution<double> td(0.5, 12.0);
     const double t = td(rng);
