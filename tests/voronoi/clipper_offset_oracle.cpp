@@ -19,7 +19,8 @@
 namespace zt {
 namespace {
 
-using Ring = std::vector<Point2d>;
+using vdtest::Pt;
+using Ring = std::vector<Pt>;
 
 constexpr double kClipperScale = 1e6;  // user units to Clipper's integers
 constexpr double kBoundaryTolerance = 0.01;
@@ -34,7 +35,7 @@ constexpr double kClipperJoinOvershoot = 2.25;
 std::vector<Ring> OursOffset(const std::vector<Ring>& rings, double t, std::int32_t side) {
   TaggedPointList list;
   for (const Ring& r : rings) {
-    for (const Point2d& p : r) list.AddDoubling({0, p.x, p.y});
+    for (const Pt& p : r) list.AddDoubling({0, p.x, p.y});
     list.AddDoubling({0, r[0].x, r[0].y});
     list.AddDoubling(TaggedPoint::separator());
   }
@@ -59,7 +60,7 @@ std::vector<Ring> ClipperOffsetOf(const std::vector<Ring>& rings, double delta) 
   ClipperLib::Paths in;
   for (const Ring& r : rings) {
     ClipperLib::Path p;
-    for (const Point2d& q : r)
+    for (const Pt& q : r)
       p.push_back({static_cast<ClipperLib::cInt>(std::llround(q.x * kClipperScale)),
                    static_cast<ClipperLib::cInt>(std::llround(q.y * kClipperScale))});
     in.push_back(p);
@@ -77,35 +78,29 @@ std::vector<Ring> ClipperOffsetOf(const std::vector<Ring>& rings, double delta) 
   return rs;
 }
 
-double DistToRings(const Point2d& p, const std::vector<Ring>& rings) {
+double DistToRings(const Pt& p, const std::vector<Ring>& rings) {
   double m = INFINITY;
   for (const Ring& r : rings)
-    for (std::size_t i = 0; i < r.size(); ++i) {
-      const Point2d& a = r[i];
-      const Point2d& b = r[(i + 1) % r.size()];
-      const double dx = b.x - a.x, dy = b.y - a.y, l2 = dx * dx + dy * dy;
-      const double u = l2 > 0 ? std::clamp(((p.x - a.x) * dx + (p.y - a.y) * dy) / l2, 0.0, 1.0) : 0.0;
-      m = std::min(m, std::hypot(p.x - a.x - u * dx, p.y - a.y - u * dy));
-    }
+    for (std::size_t i = 0; i < r.size(); ++i) m = std::min(m, vdtest::DistToSegment(p, {r[i], r[(i + 1) % r.size()]}));
   return m;
 }
 
 double OneWay(const std::vector<Ring>& from, const std::vector<Ring>& to) {
   double m = 0;
   for (const Ring& r : from)
-    for (const Point2d& p : r) m = std::max(m, DistToRings(p, to));
+    for (const Pt& p : r) m = std::max(m, DistToRings(p, to));
   return m;
 }
 
 TEST(ClipperOffsetOracle, PocketsWithIslandsInsideAndOutside) {
   std::mt19937 rng(23);
   for (int trial = 0; trial < 40; ++trial) {
-    std::vector<Ring> rings{vdtest::Star<Point2d>(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
+    std::vector<Ring> rings{vdtest::Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
     const int islands = trial % 4;
     for (int h = 0; h < islands; ++h) {
       const double a = 2 * std::numbers::pi * h / std::max(islands, 1);
       const double off = islands == 1 ? 0.0 : 35.0;
-      rings.push_back(vdtest::Star<Point2d>(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
+      rings.push_back(vdtest::Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
     }
     std::uniform_real_distribution<double> td(0.5, 12.0);
     const double t = td(rng);

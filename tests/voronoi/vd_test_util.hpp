@@ -31,80 +31,57 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
   return pts;
 }
 
-// Tight clusters far apart: the nearest-point search must leave the grid.
-inline std::vector<Pt> ClusteredPoints(int n, std::uint32_t seed) {
-  std::mt19937 rng(seed);
-  std::uniform_real_distribution<double> u(0.0, 1000.0);
-  std::normal_distribution<double> spread(0.0, 0.01);
-  std::vector<Pt> centres(5);
-  for (Pt& c : centres) c = {u(rng), u(rng)};
-  std::vector<Pt> pts(n);
-  for (int i = 0; i < n; ++i) pts[i] = {centres[i % 5].x + spread(rng), centres[i % 5].y + spread(rng)};
-  return pts;
-}
-
-inline std::vector<Pt> LatticePoints(int side, double step = 1.0) {
-  std::vector<Pt> pts;
-  for (int i = 0; i < side; ++i)
-    for (int j = 0; j < side; ++j) pts.push_back({i * step, j * step});
-  return pts;
-}
-
-inline std::vector<Pt> CollinearPoints(int n, std::uint32_t seed) {
-  std::mt19937 rng(seed);
-  std::uniform_int_distribution<int> u(0, 1 << 20);
-  std::vector<Pt> pts(n);
-  for (Pt& p : pts) {
-    const double t = u(rng);
-    p = {3.0 * t + 7.0, 2.0 * t - 5.0};
-  }
-  return pts;
-}
-
 // The points of a generator list, parts separated by ';':
 //   points x y x y ...     the given points
 //   uniform n seed scale   UniformPoints
-//   clustered n seed       ClusteredPoints
-//   lattice side step      LatticePoints
-//   collinear n seed       CollinearPoints
+//   clustered n seed       tight clusters far apart: the nearest-point search
+//                          must leave the grid
+//   lattice side step      a side x side lattice
+//   collinear n seed       points on one line
 //   ring n r               n points evenly on the circle of radius r about the origin
 //   jitter seed k          moves every coordinate so far by up to k ulps
 inline std::vector<Pt> Generate(const std::string& spec) {
-  std::vector<Pt> pts, more;
+  std::vector<Pt> pts;
   std::istringstream s(spec);
   for (std::string part; std::getline(s, part, ';');) {
-    std::vector<std::string> w = Words(part);
-    if (w.empty()) continue;
-    const std::string kind = w[0];
-    w.erase(w.begin());
+    const std::vector<std::string> w = Words(part);
     std::vector<double> a;
-    for (const std::string& x : w) a.push_back(Num(x));
-    const auto arg = [&](std::size_t i) { return static_cast<int>(a.at(i)); };
-    more.clear();
-    if (kind == "points") {
-      for (std::size_t i = 0; i + 1 < a.size(); i += 2) more.push_back({a[i], a[i + 1]});
-    } else if (kind == "uniform") {
-      more = UniformPoints(arg(0), arg(1), a.at(2));
-    } else if (kind == "clustered") {
-      more = ClusteredPoints(arg(0), arg(1));
-    } else if (kind == "lattice") {
-      more = LatticePoints(arg(0), a.at(1));
-    } else if (kind == "collinear") {
-      more = CollinearPoints(arg(0), arg(1));
-    } else if (kind == "ring") {
-      for (int i = 0; i < arg(0); ++i)
-        more.push_back({a[1] * std::cos(i * M_PI / (arg(0) / 2)), a[1] * std::sin(i * M_PI / (arg(0) / 2))});
-    } else if (kind == "jitter") {
-      std::mt19937 rng(arg(0));
-      std::uniform_int_distribution<int> ulp(-arg(1), arg(1));
+    for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
+    const int n = a.empty() ? 0 : static_cast<int>(a[0]);
+    std::mt19937 rng(a.size() > 1 ? static_cast<std::uint32_t>(a[1]) : 0);
+    if (w.empty()) continue;
+    if (w[0] == "points") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) pts.push_back({a[i], a[i + 1]});
+    } else if (w[0] == "uniform") {
+      const std::vector<Pt> more = UniformPoints(n, static_cast<std::uint32_t>(a.at(1)), a.at(2));
+      pts.insert(pts.end(), more.begin(), more.end());
+    } else if (w[0] == "clustered") {
+      std::uniform_real_distribution<double> u(0.0, 1000.0);
+      std::normal_distribution<double> spread(0.0, 0.01);
+      Pt centres[5];
+      for (Pt& c : centres) c = {u(rng), u(rng)};
+      for (int i = 0; i < n; ++i) pts.push_back({centres[i % 5].x + spread(rng), centres[i % 5].y + spread(rng)});
+    } else if (w[0] == "lattice") {
+      for (int i = 0; i < n; ++i)
+        for (int j = 0; j < n; ++j) pts.push_back({i * a.at(1), j * a.at(1)});
+    } else if (w[0] == "collinear") {
+      std::uniform_int_distribution<int> u(0, 1 << 20);
+      for (int i = 0; i < n; ++i) {
+        const double t = u(rng);
+        pts.push_back({3.0 * t + 7.0, 2.0 * t - 5.0});
+      }
+    } else if (w[0] == "ring") {
+      for (int i = 0; i < n; ++i) pts.push_back({a[1] * std::cos(i * M_PI / (n / 2)), a[1] * std::sin(i * M_PI / (n / 2))});
+    } else if (w[0] == "jitter") {
+      std::mt19937 jitter(static_cast<std::uint32_t>(n));
+      std::uniform_int_distribution<int> ulp(-static_cast<int>(a.at(1)), static_cast<int>(a.at(1)));
       for (Pt& p : pts) {
-        for (int k = ulp(rng); k != 0; k += k > 0 ? -1 : 1) p.x = std::nextafter(p.x, k > 0 ? 10.0 : -10.0);
-        for (int k = ulp(rng); k != 0; k += k > 0 ? -1 : 1) p.y = std::nextafter(p.y, k > 0 ? 10.0 : -10.0);
+        for (int k = ulp(jitter); k != 0; k += k > 0 ? -1 : 1) p.x = std::nextafter(p.x, k > 0 ? 10.0 : -10.0);
+        for (int k = ulp(jitter); k != 0; k += k > 0 ? -1 : 1) p.y = std::nextafter(p.y, k > 0 ? 10.0 : -10.0);
       }
     } else {
-      ADD_FAILURE() << "unknown generator " << kind;
+      ADD_FAILURE() << "unknown generator " << w[0];
     }
-    pts.insert(pts.end(), more.begin(), more.end());
   }
   return pts;
 }
