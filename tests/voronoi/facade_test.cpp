@@ -2,8 +2,6 @@
 // coordinates are rows of data/point_sets.txt).
 #include <gtest/gtest.h>
 
-#include <cmath>
-
 #include "vd_test_util.hpp"
 
 namespace zt {

@@ -34,8 +34,6 @@ double claim_dist(const SiteRef& s, Point2d q) {
   return t < -1e-12 || t > 1 + 1e-12 ? HUGE_VAL : site_dist(s, q);
 }
 
-enum class Shape { PointOn, Tangent, TangentFromPoint, CornerPair };
-
 struct Builder {
   std::mt19937_64 rng;
   Point2d x;
