@@ -2,6 +2,7 @@
 // circle (points on it, segments touching it), an edge of two of them cut
 // around the circle's centre, and the third as the new site. The computed
 // node must be the centre, with the radius as clearance, by true distances.
+// The configurations are the rows of data/node_random.txt.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -9,6 +10,7 @@
 #include <sstream>
 #include <string>
 
+#include "case_rows.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 
@@ -95,20 +97,12 @@ bool bisector_point(const SiteRef& a, const SiteRef& b, Point2d x, double h, Poi
   return true;
 }
 
-// A configuration: the sites a and b of the edge and the new site, each
-// "P<k>" a point on the circle at angle k, "T<k>" a segment touching it at
-// angle k, or "F" a segment touching it at the first point made; "corner"
-// is a corner of two segments outside the circle and a new segment elsewhere.
-struct Case {
-  const char* name;
-  int kind;  // seeds the configuration's generator
-  const char* sites;
-};
-
-void make_sites(Builder& B, const Case& c, SiteRef& a, SiteRef& b, SiteRef& fresh) {
+// Sites a and b of the edge and the new site for a configuration of
+// data/node_random.txt.
+void make_sites(Builder& B, const std::string& sites, SiteRef& a, SiteRef& b, SiteRef& fresh) {
   const double base = B.uni(0, 2 * M_PI);
   const double th[3] = {base, base + B.uni(0.8, 2.0), base + B.uni(0.8, 2.0) + 2.2};
-  if (std::string(c.sites) == "corner") {
+  if (sites == "corner") {
     const double t1 = th[0], t2 = th[0] + B.uni(0.6, 2.4);
     const double mid = 0.5 * (t1 + t2), half = 0.5 * (t2 - t1);
     const PointSite v{B.next_point++, add(B.x, mul(Point2d{std::cos(mid), std::sin(mid)}, B.r / std::cos(half)))};
@@ -122,7 +116,7 @@ void make_sites(Builder& B, const Case& c, SiteRef& a, SiteRef& b, SiteRef& fres
     fresh = SiteRef::segment(B.tangent_seg(t2 + B.uni(1.0, 2 * M_PI - (t2 - t1) - 1.0)));
     return;
   }
-  std::istringstream words(c.sites);
+  std::istringstream words(sites);
   PointSite first{-1, {}};
   for (SiteRef* s : {&a, &b, &fresh}) {
     std::string w;
@@ -138,10 +132,10 @@ void make_sites(Builder& B, const Case& c, SiteRef& a, SiteRef& b, SiteRef& fres
   }
 }
 
-class NodeRandom : public ::testing::TestWithParam<Case> {};
+class NodeRandom : public vdtest::CaseRows {};
 
 TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
-  Builder B{std::mt19937_64(1234 + GetParam().kind), {}, 0};
+  Builder B{std::mt19937_64(1234 + std::stoi(row().field(0))), {}, 0};
   int used = 0;
   for (int trial = 0; trial < 3000; ++trial) {
     B.x = {B.uni(0.25, 0.75), B.uni(0.25, 0.75)};
@@ -149,7 +143,7 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
     // coefficient scaling of the solver.
     B.r = 0.2 * std::pow(10.0, -B.uni(0, 5));
     SiteRef a, b, fresh;
-    make_sites(B, GetParam(), a, b, fresh);
+    make_sites(B, row().field(1), a, b, fresh);
     const double h1 = B.r * B.uni(1e-3, 0.25), h2 = -B.r * B.uni(1e-3, 0.25);
     Point2d y1, y2;
     if (!bisector_point(a, b, B.x, h1, y1) || !bisector_point(a, b, B.x, h2, y2)) continue;
@@ -199,16 +193,7 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
   EXPECT_GT(used, 1500);
 }
 
-INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom,
-                         ::testing::Values(Case{"PointsNewSegment", 0, "P0 P1 T2"},
-                                           Case{"PointsNewSegmentFromPoint", 1, "P0 P1 F"},
-                                           Case{"PointSegmentNewSegment", 2, "P0 T1 T2"},
-                                           Case{"PointSegmentNewFromPoint", 3, "P0 T1 F"},
-                                           Case{"SegmentOwnEndNewSegment", 4, "P0 F T1"},
-                                           Case{"ThreeSegments", 5, "T0 T1 T2"}, Case{"CornerNewSegment", 6, "corner"},
-                                           Case{"PointSegmentNewPoint", 7, "P0 T1 P2"},
-                                           Case{"SegmentsNewPoint", 8, "T0 T1 P2"}),
-                         [](const auto& info) { return std::string(info.param.name); });
+INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom, vdtest::RowsOf("node_random.txt"), vdtest::RowName);
 
 }  // namespace
 }  // namespace zt::vd::geo
