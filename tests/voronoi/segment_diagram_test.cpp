@@ -1,5 +1,6 @@
-// Diagrams of points and segments through the facade: invariants after the
-// whole computation, restarts and recovery mode on clean and defective input.
+// Diagrams of points and segments through the facade: the clean polygons of
+// data/segment_diagrams.txt checked after every insertion and in full, and
+// the orientation memory of the constructions.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -7,6 +8,7 @@
 #include <random>
 #include <vector>
 
+#include "case_rows.hpp"
 #include "vd_test_util.hpp"
 #include "voronoi/detail/segment_checks.hpp"
 
@@ -76,21 +78,6 @@ std::string RunChecked(const std::vector<Contour>& contours, int every = 1, bool
   return error.empty() ? vd::CheckSegmentEdges() : error;
 }
 
-void ExpectClean(const std::vector<Contour>& contours, const std::string& what, int every = 1, bool bruteForce = true) {
-  EXPECT_EQ(RunChecked(contours, every, bruteForce), "") << what;
-  EXPECT_EQ(VD_GetRestartCount(), 0) << what;
-  EXPECT_FALSE(VD_InRecoveryMode()) << what;
-}
-
-TEST(SegmentDiagram, StarPolygons) {
-  for (int n : {4, 5, 10, 30, 100}) {
-    for (std::uint32_t seed = 1; seed <= 6; ++seed) {
-      ExpectClean({StarPolygon(n, seed * 7919 + n)}, "star " + std::to_string(n) + " seed " + std::to_string(seed));
-    }
-  }
-  ExpectClean({StarPolygon(5000, 5)}, "star 5000", 2500, false);
-}
-
 bool Cross(Pt a, Pt b, Pt c, Pt d) {
   const auto o = [](Pt p, Pt q, Pt r) { return (q.x - p.x) * (r.y - p.y) - (q.y - p.y) * (r.x - p.x); };
   return o(a, b, c) * o(a, b, d) < 0 && o(c, d, a) * o(c, d, b) < 0;
@@ -117,33 +104,48 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
   return c;
 }
 
-TEST(SegmentDiagram, RandomSimplePolygons) {
-  for (int n : {10, 40, 150}) {
-    for (std::uint32_t seed = 1; seed <= 4; ++seed) {
-      ExpectClean({RandomSimplePolygon(n, seed * 31 + n)}, "polygon " + std::to_string(n) + " seed " + std::to_string(seed));
+// The contours of a generator list (see data/segment_diagrams.txt).
+std::vector<Contour> Contours(const std::string& spec) {
+  std::vector<Contour> out;
+  std::istringstream s(spec);
+  for (std::string part; std::getline(s, part, ';');) {
+    std::vector<std::string> w = Words(part);
+    const bool reversed = w.at(0) == "rev";
+    if (reversed) w.erase(w.begin());
+    std::vector<double> a;
+    for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
+    const auto arg = [&](std::size_t i, double fallback) { return i < a.size() ? a[i] : fallback; };
+    Contour c;
+    if (w[0] == "poly") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) c.push_back({a[i], a[i + 1]});
+    } else if (w[0] == "star") {
+      c = StarPolygon(int(a.at(0)), std::uint32_t(a.at(1)), {arg(2, 0.5), arg(3, 0.5)}, arg(4, 0.2), arg(5, 0.45));
+    } else if (w[0] == "simple") {
+      c = RandomSimplePolygon(int(a.at(0)), std::uint32_t(a.at(1)));
+    } else if (w[0] == "circle") {
+      c = Circle(int(a.at(0)), {a.at(1), a.at(2)}, a.at(3), arg(4, 0.1));
+    } else if (w[0] == "staircase") {
+      c = Staircase(int(a.at(0)), a.at(1));
+    } else if (w[0] == "dense") {
+      c = DenseSquare(int(a.at(0)), a.at(1), arg(2, 0.0));
+    } else {
+      ADD_FAILURE() << "unknown contour " << w[0];
     }
+    out.push_back(reversed ? Reversed(c) : c);
   }
+  return out;
 }
 
-TEST(SegmentDiagram, NestedContoursWithHoles) {
-  for (std::uint32_t seed = 1; seed <= 5; ++seed) {
-    ExpectClean({StarPolygon(40, seed, {0.5, 0.5}, 0.4, 0.48), Reversed(StarPolygon(12, seed + 100, {0.5, 0.5}, 0.1, 0.2)),
-                 Reversed(Circle(16, {0.5, 0.5}, 0.3, 0.05 * seed))},
-                "nested " + std::to_string(seed));
-  }
+class SegmentDiagrams : public CaseRows {};
+
+TEST_P(SegmentDiagrams, AreCleanAndSound) {
+  const Keys k(row().field(1));
+  EXPECT_EQ(RunChecked(Contours(row().field(0)), int(k.num("every", 1)), k.num("brute", 1) != 0), "");
+  EXPECT_EQ(VD_GetRestartCount(), 0);
+  EXPECT_FALSE(VD_InRecoveryMode());
 }
 
-TEST(SegmentDiagram, AxisAlignedAndCollinearContours) {
-  ExpectClean({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}}, "square");
-  ExpectClean({Staircase(20, 1.0)}, "staircase");
-  ExpectClean({DenseSquare(10, 1.0)}, "dense square");
-  ExpectClean({DenseSquare(7, 3.0), Reversed(DenseSquare(3, 1.0, 1.0))}, "dense squares nested");
-}
-
-TEST(SegmentDiagram, ChordPointsOfArcs) {
-  ExpectClean({Circle(64, {0, 0}, 10.0)}, "circle 64");
-  ExpectClean({Circle(200, {5, 5}, 1.0), Reversed(Circle(50, {5, 5}, 0.5))}, "annulus");
-}
+INSTANTIATE_TEST_SUITE_P(Data, SegmentDiagrams, RowsOf("segment_diagrams.txt"), RowName);
 
 // The orientation memory of the point-segment-segment construction is reset
 // by every segment insertion: a memory left set by anything before gives
