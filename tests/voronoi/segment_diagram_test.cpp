@@ -105,9 +105,9 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
 }
 
 // The contours of a generator list (see data/segment_diagrams.txt).
-std::vector<Contour> Contours(const std::string& spec) {
+std::vector<Contour> Contours(const std::string& list) {
   std::vector<Contour> out;
-  std::istringstream s(spec);
+  std::istringstream s(list);
   for (std::string part; std::getline(s, part, ';');) {
     std::vector<std::string> w = Words(part);
     const bool reversed = w.at(0) == "rev";

@@ -40,9 +40,9 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
 //   collinear n seed       points on one line
 //   ring n r               n points evenly on the circle of radius r about the origin
 //   jitter seed k          moves every coordinate so far by up to k ulps
-inline std::vector<Pt> Generate(const std::string& spec) {
+inline std::vector<Pt> Generate(const std::string& list) {
   std::vector<Pt> pts;
-  std::istringstream s(spec);
+  std::istringstream s(list);
   for (std::string part; std::getline(s, part, ';');) {
     const std::vector<std::string> w = Words(part);
     std::vector<double> a;
