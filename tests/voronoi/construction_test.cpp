@@ -72,16 +72,6 @@ TEST(PointDiagram, PairsJustAboveAndBelowTheMergeDistance) {
   EXPECT_EQ(vd::Vd().points.count, 2 + 2 + 19 + 10 + 2);  // slots, corners, points kept
 }
 
-TEST(PointDiagram, ManyDuplicates) {
-  std::vector<Pt> pts;
-  std::mt19937 rng(6);
-  std::uniform_int_distribution<int> u(0, 9);
-  for (int i = 0; i < 1000; ++i) pts.push_back({double(u(rng)), double(u(rng))});
-  EXPECT_EQ(CheckedRun(pts), "");
-  EXPECT_EQ(VD_GetDuplicateCount(), 1000 - 100);
-  EXPECT_EQ(VD_GetRestartCount(), 0);
-}
-
 TEST(PointDiagram, RepeatedComputationIsReproducible) {
   const std::vector<Pt> pts = UniformPoints(500, 11, 10.0);
   auto snapshot = [] {

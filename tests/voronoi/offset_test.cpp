@@ -64,7 +64,8 @@ TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
   if (want.has("api")) {
     EXPECT_EQ(API_ComputeOff(false, nullptr, false, false, t, step, false, false, false), want.num("ok", 1) != 0);
   }
-  const std::vector<Curve> curves = ReadStore();
+  std::vector<Curve> curves = ReadStore();
+  std::erase_if(curves, [&](const Curve& c) { return want.has("below") && c.offset >= want.num("below"); });
   if (want.has("curves")) {
     const std::string n = want.str("curves");
     EXPECT_TRUE(n.ends_with("+") ? curves.size() >= Num(n) : curves.size() == Num(n)) << curves.size();
@@ -161,23 +162,6 @@ TEST(IsolatedPoints, SinglePointGivesCirclesOfTwoHalves) {
   double x, y;
   GetOffsetElement(0, kind, site, x, y, tag);
   EXPECT_EQ(tag, -1);
-}
-
-// 1, 2, 3, 4 stay inside the regions (half the spacing is 5); 5 touches the
-// bisectors and is traced there as well.
-TEST(IsolatedPoints, FamilyOfFarApartPointsGivesOneCircleEachPerDistance) {
-  const std::vector<Pt> pts{{0, 0}, {10, 0}, {0, 10}, {10, 10}};
-  Store(pts);
-  ASSERT_TRUE(ComputePoints());
-  ASSERT_TRUE(VD_ComputeOffsets(3, 1.0, 1.0));
-  int circles = 0;
-  for (const Curve& c : ReadStore()) {
-    if (c.offset >= 4.5) continue;
-    ++circles;
-    EXPECT_EQ(c.elements.size(), 2u);
-    EXPECT_EQ(CheckAtDistance(AsSites(pts), {c}, c.offset, kTol), "");
-  }
-  EXPECT_EQ(circles, 16);
 }
 
 // Random points at distances where the circles overlap: the traced curves

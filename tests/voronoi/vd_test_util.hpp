@@ -38,6 +38,7 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
 //                          must leave the grid
 //   lattice side step      a side x side lattice
 //   collinear n seed       points on one line
+//   dice n seed max        n points of integer coordinates 0 to max
 //   ring n r               n points evenly on the circle of radius r about the origin
 //   jitter seed k          moves every coordinate so far by up to k ulps
 inline std::vector<Pt> Generate(const std::string& list) {
@@ -70,6 +71,9 @@ inline std::vector<Pt> Generate(const std::string& list) {
         const double t = u(rng);
         pts.push_back({3.0 * t + 7.0, 2.0 * t - 5.0});
       }
+    } else if (w[0] == "dice") {
+      std::uniform_int_distribution<int> u(0, static_cast<int>(a.at(2)));
+      for (int i = 0; i < n; ++i) pts.push_back({double(u(rng)), double(u(rng))});
     } else if (w[0] == "ring") {
       for (int i = 0; i < n; ++i) pts.push_back({a[1] * std::cos(i * M_PI / (n / 2)), a[1] * std::sin(i * M_PI / (n / 2))});
     } else if (w[0] == "jitter") {
