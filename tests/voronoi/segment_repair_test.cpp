@@ -1,5 +1,6 @@
 // Input repair with segments: the worked examples of data/segment_repair.txt
-// on a bare engine, and defective input repaired by whole computations.
+// on a bare engine (whole computations of defective input are rows of
+// data/segment_diagrams.txt).
 #include <gtest/gtest.h>
 
 #include <cfloat>
@@ -72,54 +73,6 @@ TEST_P(SegmentRepair, LeavesTheExpectedInput) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Data, SegmentRepair, RowsOf("segment_repair.txt"), RowName);
-
-// ---- Whole computations on defective input.
-
-TEST(SegmentRepairComputation, CrossingContoursAreSplitAndComplete) {
-  // Two overlapping squares: eight crossings... of which the computation
-  // needs every one repaired to finish with a sound diagram.
-  StoreContours({{{0, 0}, {2, 0}, {2, 2}, {0, 2}}, {{1, 1}, {3, 1.2}, {3.1, 3}, {0.9, 3.2}}}, 1);
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_GT(VD_GetRestartCount(), 0);
-  // A star crossed by a long segment through its middle.
-  VD_Reset();
-  std::vector<std::int32_t> idx;
-  for (int i = 0; i < 12; ++i) {
-    const double a = 2 * M_PI * i / 12, r = i % 2 ? 1.0 : 0.5;
-    idx.push_back(API_AddPoint(r * std::cos(a), r * std::sin(a), 0));
-  }
-  for (int i = 0; i < 12; ++i) API_AddSegment(idx[i], idx[(i + 1) % 12], 0);
-  API_AddSegment(API_AddPoint(-2, 0.1, 0), API_AddPoint(2, -0.05, 0), 0);
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-}
-
-TEST(SegmentRepairComputation, NearDuplicatePointsAndPointsOnSegments) {
-  // Internal units: the square spans 1, so 1e-8 is far below the repair
-  // distance of 1e-6.
-  StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}}, 1);
-  API_AddPoint(0.5, 1e-8, 3);        // on the bottom edge
-  API_AddPoint(1 + 1e-8, 1 - 1e-8, 3);  // at a corner
-  API_AddPoint(0.25, 0.75, 3);       // an honest point inside
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_GT(VD_GetRestartCount(), 0);
-}
-
-TEST(SegmentRepairComputation, DuplicateSegmentsInEitherOrientation) {
-  VD_Initialize();
-  VD_Reset();
-  const std::int32_t a = API_AddPoint(0, 0, 0), b = API_AddPoint(1, 0, 0), c = API_AddPoint(0.5, 1, 0);
-  API_AddSegment(a, b, 0);
-  API_AddSegment(b, c, 0);
-  API_AddSegment(c, a, 0);
-  API_AddSegment(b, a, 0);
-  API_AddSegment(c, b, 0);
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_EQ(vd::Vd().segments.count, 3);
-}
 
 }  // namespace
 }  // namespace zt::vdtest
