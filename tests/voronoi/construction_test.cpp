@@ -74,27 +74,15 @@ TEST(PointDiagram, PairsJustAboveAndBelowTheMergeDistance) {
 
 TEST(PointDiagram, RepeatedComputationIsReproducible) {
   const std::vector<Pt> pts = UniformPoints(500, 11, 10.0);
-  auto snapshot = [] {
-    std::vector<double> v;
-    for (std::int32_t i = 0; i < VD_GetNodeCount(); ++i) {
-      const VD_NodeInfo n = VD_GetNode(i);
-      v.insert(v.end(), {n.live ? 1.0 : 0.0, n.x, n.y, n.r});
-    }
-    for (std::int32_t i = 0; i < VD_GetEdgeCount(); ++i) {
-      const VD_EdgeInfo e = VD_GetEdge(i);
-      v.insert(v.end(), {double(e.n1), double(e.n2), double(e.lft), double(e.rgt)});
-    }
-    return v;
-  };
   Store(pts);
   ASSERT_TRUE(ComputePoints());
-  const auto first = snapshot();
+  const auto first = Snapshot();
   Store(pts);
   ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(snapshot(), first);
+  EXPECT_EQ(Snapshot(), first);
   // Computing again without a reset gives the same diagram too.
   ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(snapshot(), first);
+  EXPECT_EQ(Snapshot(), first);
 }
 
 TEST(PointDiagram, InsertionOrderDrawsLargePositionsDirectly) {

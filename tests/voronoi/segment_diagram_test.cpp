@@ -178,19 +178,12 @@ TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
   const std::vector<Contour> input{StarPolygon(60, 3), Reversed(Circle(9, {0.5, 0.5}, 0.1))};
   StoreContours(input);
   ASSERT_TRUE(ComputeSegments());
-  std::vector<VD_NodeInfo> first;
-  for (std::int32_t n = 0; n < VD_GetNodeCount(); ++n) first.push_back(VD_GetNode(n));
+  const std::vector<double> first = Snapshot();
   StoreContours(input);
   vd::Vd().pssOrientByKeptNode = true;
   ASSERT_TRUE(ComputeSegments());
   EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
-  ASSERT_EQ(VD_GetNodeCount(), static_cast<std::int32_t>(first.size()));
-  for (std::int32_t n = 0; n < VD_GetNodeCount(); ++n) {
-    const VD_NodeInfo b = VD_GetNode(n);
-    EXPECT_EQ(first[n].live, b.live);
-    EXPECT_EQ(first[n].x, b.x);
-    EXPECT_EQ(first[n].y, b.y);
-  }
+  EXPECT_EQ(Snapshot(), first);
 }
 
 }  // namespace

@@ -162,6 +162,21 @@ inline std::string CheckedCompute(bool pointsOnly = true, int every = 1, bool br
   return obs.firstError.empty() ? FinalCheck(bruteForce) : obs.firstError;
 }
 
+// The computed diagram as numbers: every node (live, x, y, r) and edge
+// (n1, n2, lft, rgt).
+inline std::vector<double> Snapshot() {
+  std::vector<double> v;
+  for (std::int32_t i = 0; i < VD_GetNodeCount(); ++i) {
+    const VD_NodeInfo n = VD_GetNode(i);
+    v.insert(v.end(), {n.live ? 1.0 : 0.0, n.x, n.y, n.r});
+  }
+  for (std::int32_t i = 0; i < VD_GetEdgeCount(); ++i) {
+    const VD_EdgeInfo e = VD_GetEdge(i);
+    v.insert(v.end(), {double(e.n1), double(e.n2), double(e.lft), double(e.rgt)});
+  }
+  return v;
+}
+
 inline std::string CheckedRun(const std::vector<Pt>& pts) {
   Store(pts);
   return CheckedCompute();
