@@ -18,12 +18,6 @@ namespace {
 
 constexpr double kTol = 1e-9;
 
-InputSites AsSites(const std::vector<Pt>& pts) {
-  InputSites in;
-  in.points = pts;
-  return in;
-}
-
 // Whether the kinds of c are `pattern` repeated, from some rotation on.
 bool KindsFollow(const Curve& c, const std::string& pattern) {
   for (std::size_t r = 0; r < pattern.size(); ++r) {
@@ -175,7 +169,7 @@ TEST(TracedOffsets, RandomPointsAgainstBruteForce) {
       ASSERT_TRUE(VD_ComputeOffsets(3, t, 0.0)) << "seed " << seed << " t " << t;
       const auto curves = ReadStore();
       ASSERT_FALSE(curves.empty());
-      EXPECT_EQ(CheckAtDistance(AsSites(pts), curves, t, kTol * 100.0), "") << "seed " << seed << " t " << t;
+      EXPECT_EQ(CheckAtDistance(InputSites{pts, {}, {}}, curves, t, kTol * 100.0), "") << "seed " << seed << " t " << t;
     }
   }
 }
@@ -194,7 +188,7 @@ TEST(TracedOffsets, FamilyOfDistances) {
     for (const auto& c : curves)
       if (std::fabs(c.offset - t) < 1e-9) at.push_back(c);
     EXPECT_FALSE(at.empty()) << t;
-    EXPECT_EQ(CheckAtDistance(AsSites(pts), at, t, 1e-7), "") << t;
+    EXPECT_EQ(CheckAtDistance(InputSites{pts, {}, {}}, at, t, 1e-7), "") << t;
   }
 }
 
