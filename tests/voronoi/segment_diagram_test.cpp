@@ -30,46 +30,6 @@ Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rm
   return c;
 }
 
-Contour Reversed(Contour c) {
-  std::reverse(c.begin(), c.end());
-  return c;
-}
-
-// A circle approximated by n chord points.
-Contour Circle(int n, Pt centre, double r, double phase = 0.1) {
-  Contour c;
-  for (int i = 0; i < n; ++i) {
-    const double a = phase + 2 * M_PI * i / n;
-    c.push_back({centre.x + r * std::cos(a), centre.y + r * std::sin(a)});
-  }
-  return c;
-}
-
-// A rectilinear staircase: axis-parallel edges only.
-Contour Staircase(int steps, double size) {
-  Contour c{{0, 0}};
-  const double h = size / steps;
-  for (int i = 0; i < steps; ++i) {
-    c.push_back({(i + 1) * h, i * h});
-    c.push_back({(i + 1) * h, (i + 1) * h});
-  }
-  c.push_back({0, size});
-  return c;
-}
-
-// A square with k collinear points on each side.
-Contour DenseSquare(int k, double size, double at = 0.0) {
-  Contour c;
-  for (int side = 0; side < 4; ++side) {
-    for (int i = 0; i < k; ++i) {
-      const double t = size * i / k;
-      const Pt p = side == 0 ? Pt{t, 0} : side == 1 ? Pt{size, t} : side == 2 ? Pt{size - t, size} : Pt{0, size - t};
-      c.push_back({p.x + at, p.y + at});
-    }
-  }
-  return c;
-}
-
 // Stores the sites of a generator list (see data/segment_diagrams.txt): its
 // contours first, then its loose points, open segments and links.
 void StoreList(const std::string& list);
@@ -132,16 +92,33 @@ void StoreList(const std::string& list) {
     } else if (w[0] == "simple") {
       c = RandomSimplePolygon(int(a.at(0)), std::uint32_t(a.at(1)));
     } else if (w[0] == "circle") {
-      c = Circle(int(a.at(0)), {a.at(1), a.at(2)}, a.at(3), arg(4, 0.1));
+      for (int i = 0; i < int(a.at(0)); ++i) {
+        const double angle = arg(4, 0.1) + 2 * M_PI * i / int(a[0]);
+        c.push_back({a.at(1) + a.at(3) * std::cos(angle), a.at(2) + a.at(3) * std::sin(angle)});
+      }
     } else if (w[0] == "staircase") {
-      c = Staircase(int(a.at(0)), a.at(1));
+      const double h = a.at(1) / int(a.at(0));
+      c.push_back({0, 0});
+      for (int i = 0; i < int(a[0]); ++i) {
+        c.push_back({(i + 1) * h, i * h});
+        c.push_back({(i + 1) * h, (i + 1) * h});
+      }
+      c.push_back({0, a[1]});
     } else if (w[0] == "dense") {
-      c = DenseSquare(int(a.at(0)), a.at(1), arg(2, 0.0));
+      const double size = a.at(1), at = arg(2, 0.0);
+      for (int side = 0; side < 4; ++side) {
+        for (int i = 0; i < int(a[0]); ++i) {
+          const double t = size * i / int(a[0]);
+          const Pt p = side == 0 ? Pt{t, 0} : side == 1 ? Pt{size, t} : side == 2 ? Pt{size - t, size} : Pt{0, size - t};
+          c.push_back({p.x + at, p.y + at});
+        }
+      }
     } else {
       extras.emplace_back(w[0], a);
       continue;
     }
-    contours.push_back(reversed ? Reversed(c) : c);
+    if (reversed) std::reverse(c.begin(), c.end());
+    contours.push_back(c);
   }
   StoreContours(contours);
   for (const auto& [kind, a] : extras) {
@@ -175,11 +152,11 @@ INSTANTIATE_TEST_SUITE_P(Data, SegmentDiagrams, RowsOf("segment_diagrams.txt"), 
 // by every segment insertion: a memory left set by anything before gives
 // the same diagram.
 TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
-  const std::vector<Contour> input{StarPolygon(60, 3), Reversed(Circle(9, {0.5, 0.5}, 0.1))};
-  StoreContours(input);
+  const std::string input = "star 60 3; rev circle 9 0.5 0.5 0.1";
+  StoreList(input);
   ASSERT_TRUE(ComputeSegments());
   const std::vector<double> first = Snapshot();
-  StoreContours(input);
+  StoreList(input);
   vd::Vd().pssOrientByKeptNode = true;
   ASSERT_TRUE(ComputeSegments());
   EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
