@@ -10,8 +10,10 @@
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/fatal.hpp"
 #include "voronoi/detail/initial_diagram.hpp"
+#include "voronoi/detail/insertion_order.hpp"
 #include "voronoi/detail/nearest_search.hpp"
 #include "voronoi/detail/point_insertion.hpp"
+#include "voronoi/detail/point_lookahead.hpp"
 #include "voronoi/detail/preprocess.hpp"
 #include "voronoi/detail/segment_phase.hpp"
 
@@ -25,26 +27,6 @@ void EmptyInsertionLists() {
   g.orderRemaining = 0;
   g.markedSites.count = 0;
   g.checkedNodes.count = 0;
-}
-
-void BuildOrder(std::int32_t first, std::int32_t end) {
-  Engine& g = Vd();
-  g.insertionOrder.count = 0;
-  g.insertionOrder.Reserve(std::max<std::int64_t>(end - first, 1));
-  for (std::int32_t i = first; i < end; ++i) g.insertionOrder.data[g.insertionOrder.count++] = i;
-  g.orderRemaining = g.insertionOrder.count;
-}
-
-// Draws the next entry: a uniformly drawn position (the generator gives 32
-// bits a draw, so every position of any order can be drawn), replaced by
-// the last remaining entry.
-std::int32_t DrawNext() {
-  Engine& g = Vd();
-  const std::uint32_t r = static_cast<std::uint32_t>(g.random());
-  const std::int32_t at = static_cast<std::int32_t>(r % static_cast<std::uint32_t>(g.orderRemaining));
-  const std::int32_t v = g.insertionOrder[at];
-  g.insertionOrder[at] = g.insertionOrder[--g.orderRemaining];
-  return v;
 }
 
 void SquareRootRadii() {
@@ -64,11 +46,17 @@ bool PointPhase() {
     BuildInitialDiagram();
     BuildOrder(3, end);
   }
-  while (g.orderRemaining > 0) {
-    const std::int32_t p = DrawNext();
-    InsertPoint(p);
-    if (g.restartPending) return false;
-    if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, p);
+  {
+    PointLookahead ahead;
+    Nearest nearest;
+    for (std::int32_t p = ahead.Next(nearest); p >= 0; p = ahead.Next(nearest)) {
+      InsertPoint(p, nearest, ahead);
+      if (g.restartPending) {
+        ahead.Abandon();
+        return false;
+      }
+      if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, p);
+    }
   }
   ReleaseNearestSearch();
   ReleaseCrossReference();
@@ -88,7 +76,7 @@ bool SegmentPhase() {
     BuildOrder(0, g.segments.count);
   }
   while (g.orderRemaining > 0) {
-    const std::int32_t s = DrawNext();
+    const std::int32_t s = DrawNext().entry;
     InsertSegment(s);
     if (g.restartPending) return false;
     // Segments reach the test hook as -1 - index.

@@ -8,6 +8,7 @@
 // scaling transform in place; nodes are always in internal coordinates.
 #pragma once
 
+#include <cassert>
 #include <cstdint>
 #include <random>
 
@@ -36,6 +37,32 @@ struct SuspectPair {
   std::int32_t kind1 = -1;
   std::int32_t site2 = -1;
   std::int32_t kind2 = -1;
+};
+
+// The generator of the insertion orders. The point phase draws a few
+// entries ahead of its insertions; values drawn but not used when a restart
+// ends the phase are given back, so the next draws repeat them in their
+// order and the sequence of values is that of drawing one at a time.
+struct OrderRandom {
+  static constexpr int kMaxGivenBack = 8;
+
+  std::mt19937 gen{0};
+  std::uint32_t givenBack[kMaxGivenBack] = {};
+  int givenBackCount = 0;  // a stack: the value given back last comes first
+
+  void seed(std::uint32_t s) {
+    gen.seed(s);
+    givenBackCount = 0;
+  }
+  std::uint32_t operator()() {
+    if (givenBackCount > 0) return givenBack[--givenBackCount];
+    return static_cast<std::uint32_t>(gen());
+  }
+  // Values are given back newest first.
+  void GiveBack(std::uint32_t v) {
+    assert(givenBackCount < kMaxGivenBack);
+    givenBack[givenBackCount++] = v;
+  }
 };
 
 struct Engine {
@@ -89,7 +116,7 @@ struct Engine {
   bool isolatedPoints = false;
   bool medialAxisComputed = false;
   std::int32_t arcsApproximated = 0;
-  std::mt19937 random{0};
+  OrderRandom random;
 
   // Statistics of the last computation.
   std::int32_t duplicatePoints = 0;

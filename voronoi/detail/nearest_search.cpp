@@ -29,6 +29,9 @@ constexpr double kClusteredDensity = 10.0;
 constexpr double kMinCellFactor = 2.0;
 constexpr double kMaxCellFactor = 4.0;
 constexpr std::int32_t kEntryGrowth = 32768;
+// Prefetch hints cover the cells within this many rings of a query's cell
+// (two rings measured no faster: the first ring mostly holds the answer).
+constexpr std::int32_t kPrefetchRing = 1;
 
 // A bucket entry carries its point's coordinates, so scanning a cell never
 // leaves the entry array.
@@ -65,6 +68,9 @@ class NearestPointSearch {
   void Insert(std::int32_t p);
   std::int32_t FindAndInsert(std::int32_t p, double& dist2);
   SearchStats Stats() const { return {quadtree_, cols_, rows_}; }
+  void PrefetchCells(double x, double y, bool entries) const;
+  std::int32_t PathStart() const { return quadtree_ && !quad_.empty() ? 0 : -1; }
+  std::int32_t PathStep(std::int32_t node, double x, double y) const;
 
  private:
   void BuildGrid(std::int64_t cells);
@@ -208,6 +214,32 @@ std::int32_t NearestPointSearch::GridNearest(double x, double y, double& bestD2)
   return best;
 }
 
+// The block of cells around (x, y) that a grid search scans first: each of
+// its rows is contiguous in heads_.
+void NearestPointSearch::PrefetchCells(double x, double y, bool entries) const {
+  if (quadtree_ || !(x >= box_.x0 && x <= box_.x1 && y >= box_.y0 && y <= box_.y1)) return;
+  const std::int32_t cx = Column(x), cy = Row(y);
+  const std::int32_t i0 = std::max(cx - kPrefetchRing, 0), i1 = std::min(cx + kPrefetchRing, cols_ - 1);
+  for (std::int32_t j = std::max(cy - kPrefetchRing, 0); j <= std::min(cy + kPrefetchRing, rows_ - 1); ++j) {
+    const std::int32_t* row = heads_.data() + static_cast<std::size_t>(j) * cols_;
+    if (!entries) {
+      __builtin_prefetch(row + i0);
+      __builtin_prefetch(row + i1);
+      continue;
+    }
+    for (std::int32_t i = i0; i <= i1; ++i) entries_.Prefetch(row[i]);
+  }
+}
+
+std::int32_t NearestPointSearch::PathStep(std::int32_t node, double x, double y) const {
+  if (node < 0 || node >= static_cast<std::int32_t>(quad_.size())) return -1;
+  const QuadNode& qn = quad_[node];
+  for (const std::int32_t ch : qn.child) {
+    if (ch >= 0) __builtin_prefetch(quad_.data() + ch);
+  }
+  return qn.child[(x >= qn.x ? 1 : 0) + (y >= qn.y ? 2 : 0)];
+}
+
 void NearestPointSearch::Record(std::int32_t p) {
   if (!sampling_) return;
   sample_.push_back(p);
@@ -327,8 +359,21 @@ void BuildNearestSearch(std::int32_t totalPoints, double minX, double minY, doub
 
 void InsertNearest(std::int32_t p) { Vd().search->Insert(p); }
 
-std::int32_t FindAndInsertNearest(std::int32_t p, double& dist2) {
-  return Vd().search->FindAndInsert(p, dist2);
+Nearest FindAndInsertNearest(std::int32_t p) {
+  Engine& g = Vd();
+  Nearest found;
+  if (!g.points[p].deleted) found.point = g.search->FindAndInsert(p, found.dist2);
+  return found;
+}
+
+void PrefetchNearestCells(double x, double y) { Vd().search->PrefetchCells(x, y, false); }
+
+void PrefetchNearestEntries(double x, double y) { Vd().search->PrefetchCells(x, y, true); }
+
+std::int32_t NearestPathStart() { return Vd().search->PathStart(); }
+
+std::int32_t NearestPathStep(std::int32_t node, double x, double y) {
+  return Vd().search->PathStep(node, x, y);
 }
 
 void ReleaseNearestSearch() {

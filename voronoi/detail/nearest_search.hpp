@@ -27,8 +27,24 @@ void BuildNearestSearch(std::int32_t totalPoints, double minX, double minY, doub
 // Enters point p (an index of the engine's point array) without a query.
 void InsertNearest(std::int32_t p);
 // The nearest inserted point to p and its squared distance; p is entered
-// unless it coincides with the result. -1 when nothing is inserted yet.
-std::int32_t FindAndInsertNearest(std::int32_t p, double& dist2);
+// unless it coincides with the result. Point -1 when nothing is inserted
+// yet, and for a point merged away (deleted), which is not searched.
+struct Nearest {
+  std::int32_t point = -1;
+  double dist2 = 0.0;
+};
+Nearest FindAndInsertNearest(std::int32_t p);
+// Hints that a search near (x, y) comes soon: the heads of the cells a
+// search looks at first, then (once those have arrived) their first
+// entries. No effect on results.
+void PrefetchNearestCells(double x, double y);
+void PrefetchNearestEntries(double x, double y);
+// With the point quadtree, the cells are nodes on a path from the root:
+// NearestPathStart gives the root (-1 on a grid), and each NearestPathStep
+// reads one node of the path a search near (x, y) descends, requests its
+// children, and gives the next node (-1 at the end).
+std::int32_t NearestPathStart();
+std::int32_t NearestPathStep(std::int32_t node, double x, double y);
 void ReleaseNearestSearch();
 SearchStats NearestSearchStats();
 

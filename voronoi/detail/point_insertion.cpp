@@ -8,6 +8,7 @@
 #include "voronoi/detail/diagram.hpp"
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/point_lookahead.hpp"
 #include "voronoi/detail/preprocess.hpp"
 
 namespace zt::vd {
@@ -46,7 +47,7 @@ void ClearMarks() {
 
 // The seed: among the nodes of q's region whose circle contains p, the one
 // with the largest r^2/d^2 (compared by cross-multiplication); -1 if none.
-std::int32_t FindSeed(std::int32_t q, std::int32_t p) {
+std::int32_t FindSeed(std::int32_t q, std::int32_t p, PointLookahead& ahead) {
   Engine& g = Vd();
   const PointRecord& pt = g.points[p];
   std::int32_t best = -1;
@@ -56,6 +57,7 @@ std::int32_t FindSeed(std::int32_t q, std::int32_t p) {
   for (std::int32_t steps = 0; e >= 0 && steps <= g.edges.count; ++steps) {
     const std::int32_t n = RegionExitNode(e, q, PNT);
     if (n < 0) break;
+    ahead.Step(g);
     const NodeRecord& node = g.nodes[n];
     const double d2 = Dist2(node, pt);
     if (node.r > d2 && (best < 0 || node.r * bestD2 > bestR2 * d2)) {
@@ -126,7 +128,7 @@ struct Frame {
 RecordArray<Frame> gFrames;  // reused by every insertion
 
 void GrowTree(std::int32_t seed, const PointRecord& pt, RecordArray<Leaving>& leaving,
-              RecordArray<std::int32_t>& treeEdges) {
+              RecordArray<std::int32_t>& treeEdges, PointLookahead& ahead) {
   Engine& g = Vd();
   RecordArray<Frame>& stack = gFrames;
   stack.count = 0;
@@ -140,6 +142,7 @@ void GrowTree(std::int32_t seed, const PointRecord& pt, RecordArray<Leaving>& le
       continue;
     }
     if (fr.arrival < 0) seedStarted = true;
+    ahead.Step(g);
     const std::int32_t f = fr.next;
     const std::int32_t u = fr.node;
     fr.next = CcwAt(g.edges[f], u);
@@ -175,12 +178,12 @@ void ReleaseInsertionScratch() {
   gFrames.Free();
 }
 
-void InsertPoint(std::int32_t p) {
+void InsertPoint(std::int32_t p, const Nearest& nearest, PointLookahead& ahead) {
   Engine& g = Vd();
   PointRecord& pt = g.points[p];
   if (pt.deleted) return;
-  double d2 = 0.0;
-  const std::int32_t q = FindAndInsertNearest(p, d2);
+  const std::int32_t q = nearest.point;
+  const double d2 = nearest.dist2;
   assert(q >= 0);
   if (d2 <= kCoincidentDist2) {
     PointRecord& other = g.points[q];
@@ -198,7 +201,7 @@ void InsertPoint(std::int32_t p) {
     return;
   }
 
-  std::int32_t seed = FindSeed(q, p);
+  std::int32_t seed = FindSeed(q, p, ahead);
   if (seed < 0) {
     g.errorFlag = true;
     if (RepairInput(p, PNT, true)) return;
@@ -221,13 +224,14 @@ void InsertPoint(std::int32_t p) {
       e = CcwAt(g.edges[e], seed);
     } while (e != e0);
   }
-  GrowTree(seed, pt, gLeaving, gTreeEdges);
+  GrowTree(seed, pt, gLeaving, gTreeEdges, ahead);
   const std::int32_t k = gLeaving.count;
   assert(k >= 3);
 
   // Positions of the new nodes first, so a failure leaves the diagram as it was.
   gCuts.count = 0;
   for (std::int32_t i = 0; i < k; ++i) {
+    ahead.Step(g);
     const EdgeRecord& f = g.edges[gLeaving[i].edge];
     Cut c{};
     if (!Circumcentre(p, f.lft, f.rgt, c.x, c.y, c.r2)) {
@@ -258,6 +262,7 @@ void InsertPoint(std::int32_t p) {
   (void)firstNew;
   g.boundaryEdges.count = 0;
   for (std::int32_t i = 0; i < k; ++i) {
+    ahead.Step(g);
     const Leaving& l = gLeaving[i];
     const EdgeRecord& f = g.edges[l.edge];
     const std::int32_t site = LeftSiteFrom(f, l.treeNode);

@@ -12,11 +12,17 @@
 
 #include <cstdint>
 
+#include "voronoi/detail/nearest_search.hpp"
+
 namespace zt::vd {
 
-// Returns with the diagram extended, with the point merged as a duplicate,
-// or with a restart pending after an input repair.
-void InsertPoint(std::int32_t p);
+class PointLookahead;
+
+// Inserts p, whose nearest inserted point the search gave (see
+// point_lookahead.hpp). Returns with the diagram extended, with the point
+// merged as a duplicate, or with a restart pending after an input repair.
+// `ahead` is stepped at checkpoints along the way (hints only).
+void InsertPoint(std::int32_t p, const Nearest& nearest, PointLookahead& ahead);
 
 // Frees the scratch lists of the insertions (they are otherwise reused).
 void ReleaseInsertionScratch();

@@ -1,0 +1,50 @@
+// The point phase's lookahead (see point_lookahead.hpp).
+#include "voronoi/detail/point_lookahead.hpp"
+
+#include "voronoi/detail/insertion_order.hpp"
+
+namespace zt::vd {
+
+std::int32_t PointLookahead::Next(Nearest& nearest) {
+  Engine& g = Vd();
+  while (count_ < kSlots) {
+    const Draw d = DrawNext();
+    if (d.entry < 0) break;
+    At(count_++) = Slot{d.entry, d.value, kDrawn, Nearest{}, RegionPrefetch{}, kNone, 0.0, 0.0};
+    g.points.Prefetch(d.entry);
+  }
+  if (count_ == 0) return kNone;
+  // Slots advance in order, so the searches run in draw order.
+  for (int i = 0; i < count_; ++i) {
+    Slot& s = At(i);
+    if (i < kSearchedSlots) {
+      if (s.stage == kSearched) continue;
+      s.nearest = FindAndInsertNearest(s.point);
+      s.walk.Start(g, s.nearest.point);
+      s.pathNode = kNone;
+      s.stage = kSearched;
+    } else if (i <= kEntriesSlot && s.stage < kEntriesRequested) {
+      PrefetchNearestEntries(s.x, s.y);
+      s.stage = kEntriesRequested;
+    } else if (i <= kCellsSlot && s.stage < kCellsRequested) {
+      s.x = g.points[s.point].x;
+      s.y = g.points[s.point].y;
+      PrefetchNearestCells(s.x, s.y);
+      s.pathNode = NearestPathStart();
+      s.stage = kCellsRequested;
+    }
+  }
+  const Slot& front = At(0);
+  nearest = front.nearest;
+  const std::int32_t p = front.point;
+  first_ = (first_ + 1) % kSlots;
+  --count_;
+  return p;
+}
+
+void PointLookahead::Abandon() {
+  for (int i = count_ - 1; i >= 0; --i) Vd().random.GiveBack(At(i).value);
+  count_ = 0;
+}
+
+}  // namespace zt::vd
