@@ -24,7 +24,7 @@ struct Row {
 };
 
 inline std::string Trim(const std::string& s) {
-  const auto b = s.find_first_not_of(" \t"), e = s.find_last_not_of(" \t");
+  const auto b = s.find_first_not_of(" \t\r"), e = s.find_last_not_of(" \t\r");
   return b == std::string::npos ? "" : s.substr(b, e - b + 1);
 }
 
