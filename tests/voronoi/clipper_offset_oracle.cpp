@@ -4,8 +4,6 @@
 // result lies within 0.01 of the other's boundary.
 #include <gtest/gtest.h>
 
-#include <polyclipping/clipper.hpp>
-
 #include <algorithm>
 #include <cmath>
 #include <numbers>
@@ -13,6 +11,7 @@
 #include <vector>
 
 #include "offset_check.hpp"
+#include "support/clipper_paths.hpp"
 #include "voronoi/engine.hpp"
 #include "zone/slope_domain.hpp"
 
@@ -22,7 +21,6 @@ namespace {
 using vdtest::Pt;
 using Ring = std::vector<Pt>;
 
-constexpr double kClipperScale = 1e6;  // user units to Clipper's integers
 constexpr double kBoundaryTolerance = 0.01;
 // Clipper rounds the number of steps of a round join to the nearest integer,
 // so its chords may leave the arc by up to 1.5^2 = 2.25 times its arc
@@ -58,22 +56,14 @@ std::vector<Ring> OursOffset(const std::vector<Ring>& rings, double t, std::int3
 
 std::vector<Ring> ClipperOffsetOf(const std::vector<Ring>& rings, double delta) {
   ClipperLib::Paths in;
-  for (const Ring& r : rings) {
-    ClipperLib::Path p;
-    for (const Pt& q : r)
-      p.push_back({static_cast<ClipperLib::cInt>(std::llround(q.x * kClipperScale)),
-                   static_cast<ClipperLib::cInt>(std::llround(q.y * kClipperScale))});
-    in.push_back(p);
+  for (Ring r : rings) {
+    r.push_back(r.front());  // closed, as the shared conversion takes them
+    in.push_back(test::to_path(r));
   }
-  ClipperLib::ClipperOffset co(2.0, kArcTolerance / kClipperJoinOvershoot * kClipperScale);
-  co.AddPaths(in, ClipperLib::jtRound, ClipperLib::etClosedPolygon);
-  ClipperLib::Paths out;
-  co.Execute(out, delta * kClipperScale);
   std::vector<Ring> rs;
-  for (const auto& p : out) {
-    Ring r;
-    for (const auto& q : p) r.push_back({q.X / kClipperScale, q.Y / kClipperScale});
-    rs.push_back(r);
+  for (const ClipperLib::Path& p : test::round_offset(in, delta, kArcTolerance / kClipperJoinOvershoot)) {
+    rs.emplace_back();
+    for (const auto& q : p) rs.back().push_back({q.X / test::kClipperScale, q.Y / test::kClipperScale});
   }
   return rs;
 }
