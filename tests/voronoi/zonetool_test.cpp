@@ -1,6 +1,6 @@
 // zonetool voronoi and zonetool offset as subprocesses: the cases of
-// data/zonetool.txt (exit status, exact or partial output), the layout of
-// the diagram and of the raw offset store, and the separation of curves.
+// data/zonetool.txt (exit status, exact or partial output: curves, the raw
+// offset store, messages) and the figures of a printed diagram.
 #include <gtest/gtest.h>
 
 #include <unistd.h>
@@ -75,32 +75,6 @@ TEST(ZonetoolVoronoi, PrintsNodesEdgesAndFigures) {
   // An edge between points 0 and 1, in one direction or the other.
   EXPECT_TRUE(r.out.find(" 0 2 1 2\n") != std::string::npos || r.out.find(" 1 2 0 2\n") != std::string::npos)
       << r.out;
-}
-
-TEST(ZonetoolOffset, RawStoreListsCurvesAndElements) {
-  const ToolRun r = Zonetool("offset", "0 0\n1 0\n1 1\n0 1\n0 0\n", "--side 2 --distance 0.1 --raw");
-  ASSERT_EQ(r.status, 0) << r.out;
-  std::istringstream in(r.out);
-  std::string line;
-  std::getline(in, line);
-  EXPECT_EQ(line, "curve 0.1");
-  int lines = 0, arcs = 0;
-  while (std::getline(in, line)) {
-    std::istringstream w(line);
-    int kind, site;
-    double x, y;
-    ASSERT_TRUE(w >> kind >> site >> x >> y) << line;
-    (kind == 0 ? lines : arcs)++;
-  }
-  EXPECT_EQ(lines, 4);
-  EXPECT_EQ(arcs, 4);
-}
-
-TEST(ZonetoolOffset, TwoContoursAreSeparatedByABlankLine) {
-  const ToolRun r = Zonetool("offset", "0 0\n1 0\n1 1\n0 1\n0 0\n\n5 0\n6 0\n6 1\n5 1\n5 0\n", "--distance 0.1 --side 1");
-  ASSERT_EQ(r.status, 0) << r.out;
-  EXPECT_NE(r.out.find("\n\n"), std::string::npos);
-  EXPECT_EQ(r.out.find("\n\n"), r.out.rfind("\n\n"));
 }
 
 }  // namespace
