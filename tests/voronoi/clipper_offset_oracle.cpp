@@ -4,23 +4,23 @@
 // result lies within 0.01 of the other's boundary.
 #include <gtest/gtest.h>
 
-#include <polyclipping/clipper.hpp>
-
 #include <algorithm>
 #include <cmath>
 #include <numbers>
 #include <random>
 #include <vector>
 
+#include "offset_check.hpp"
+#include "support/clipper_paths.hpp"
 #include "voronoi/engine.hpp"
 #include "zone/slope_domain.hpp"
 
 namespace zt {
 namespace {
 
-using Ring = std::vector<Point2d>;
+using vdtest::Pt;
+using Ring = std::vector<Pt>;
 
-constexpr double kClipperScale = 1e6;  // user units to Clipper's integers
 constexpr double kBoundaryTolerance = 0.01;
 // Clipper rounds the number of steps of a round join to the nearest integer,
 // so its chords may leave the arc by up to 1.5^2 = 2.25 times its arc
@@ -29,23 +29,11 @@ constexpr double kBoundaryTolerance = 0.01;
 // offset and within 0.01 of each other.
 constexpr double kClipperJoinOvershoot = 2.25;
 
-Ring Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
-  std::uniform_real_distribution<double> radius(rmin, rmax), jitter(-0.3, 0.3);
-  Ring c;
-  for (int i = 0; i < n; ++i) {
-    const double a = 2 * std::numbers::pi * (i + 0.5 + jitter(rng)) / n;
-    const double r = radius(rng);
-    c.push_back({cx + r * std::cos(a), cy + r * std::sin(a)});
-  }
-  if (clockwise) std::reverse(c.begin(), c.end());
-  return c;
-}
-
 // The curves SlopeDomain collects (closed rings, repeated points dropped).
 std::vector<Ring> OursOffset(const std::vector<Ring>& rings, double t, std::int32_t side) {
   TaggedPointList list;
   for (const Ring& r : rings) {
-    for (const Point2d& p : r) list.AddDoubling({0, p.x, p.y});
+    for (const Pt& p : r) list.AddDoubling({0, p.x, p.y});
     list.AddDoubling({0, r[0].x, r[0].y});
     list.AddDoubling(TaggedPoint::separator());
   }
@@ -68,55 +56,41 @@ std::vector<Ring> OursOffset(const std::vector<Ring>& rings, double t, std::int3
 
 std::vector<Ring> ClipperOffsetOf(const std::vector<Ring>& rings, double delta) {
   ClipperLib::Paths in;
-  for (const Ring& r : rings) {
-    ClipperLib::Path p;
-    for (const Point2d& q : r)
-      p.push_back({static_cast<ClipperLib::cInt>(std::llround(q.x * kClipperScale)),
-                   static_cast<ClipperLib::cInt>(std::llround(q.y * kClipperScale))});
-    in.push_back(p);
+  for (Ring r : rings) {
+    r.push_back(r.front());  // closed, as the shared conversion takes them
+    in.push_back(test::to_path(r));
   }
-  ClipperLib::ClipperOffset co(2.0, kArcTolerance / kClipperJoinOvershoot * kClipperScale);
-  co.AddPaths(in, ClipperLib::jtRound, ClipperLib::etClosedPolygon);
-  ClipperLib::Paths out;
-  co.Execute(out, delta * kClipperScale);
   std::vector<Ring> rs;
-  for (const auto& p : out) {
-    Ring r;
-    for (const auto& q : p) r.push_back({q.X / kClipperScale, q.Y / kClipperScale});
-    rs.push_back(r);
+  for (const ClipperLib::Path& p : test::round_offset(in, delta, kArcTolerance / kClipperJoinOvershoot)) {
+    rs.emplace_back();
+    for (const auto& q : p) rs.back().push_back({q.X / test::kClipperScale, q.Y / test::kClipperScale});
   }
   return rs;
 }
 
-double DistToRings(const Point2d& p, const std::vector<Ring>& rings) {
+double DistToRings(const Pt& p, const std::vector<Ring>& rings) {
   double m = INFINITY;
   for (const Ring& r : rings)
-    for (std::size_t i = 0; i < r.size(); ++i) {
-      const Point2d& a = r[i];
-      const Point2d& b = r[(i + 1) % r.size()];
-      const double dx = b.x - a.x, dy = b.y - a.y, l2 = dx * dx + dy * dy;
-      const double u = l2 > 0 ? std::clamp(((p.x - a.x) * dx + (p.y - a.y) * dy) / l2, 0.0, 1.0) : 0.0;
-      m = std::min(m, std::hypot(p.x - a.x - u * dx, p.y - a.y - u * dy));
-    }
+    for (std::size_t i = 0; i < r.size(); ++i) m = std::min(m, vdtest::DistToSegment(p, {r[i], r[(i + 1) % r.size()]}));
   return m;
 }
 
 double OneWay(const std::vector<Ring>& from, const std::vector<Ring>& to) {
   double m = 0;
   for (const Ring& r : from)
-    for (const Point2d& p : r) m = std::max(m, DistToRings(p, to));
+    for (const Pt& p : r) m = std::max(m, DistToRings(p, to));
   return m;
 }
 
 TEST(ClipperOffsetOracle, PocketsWithIslandsInsideAndOutside) {
   std::mt19937 rng(23);
   for (int trial = 0; trial < 40; ++trial) {
-    std::vector<Ring> rings{Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
+    std::vector<Ring> rings{vdtest::Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
     const int islands = trial % 4;
     for (int h = 0; h < islands; ++h) {
       const double a = 2 * std::numbers::pi * h / std::max(islands, 1);
       const double off = islands == 1 ? 0.0 : 35.0;
-      rings.push_back(Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
+      rings.push_back(vdtest::Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
     }
     std::uniform_real_distribution<double> td(0.5, 12.0);
     const double t = td(rng);

@@ -1,148 +1,88 @@
-// Construction of the diagram of points: the invariant checker after every
-// insertion on random, clustered, lattice and collinear input, and the edge
-// cases of a computation (single point, duplicates, restarts, scaling,
-// reproducibility).
+// Construction of the diagram of points: the point-set cases of
+// data/point_sets.txt (invariant checker after insertions and in full), and
+// the edge cases of a computation that need more than a row (merge
+// distance, restarts, reproducibility, corner points).
 #include <gtest/gtest.h>
 
+#include <cmath>
+
+#include "case_rows.hpp"
 #include "vd_test_util.hpp"
 
-namespace zt {
+namespace zt::vdtest {
 namespace {
 
-using namespace vdtest;
+class PointSets : public CaseRows {};
 
-void RunChecked(const std::vector<Pt>& pts, int every = 1) {
-  Store(pts);
+TEST_P(PointSets, KeepTheInvariantsAndTheExpectations) {
+  const Keys k(row().field(1));
+  Store(Generate(row().field(0)));
   CheckingObserver obs;
-  obs.every = every;
-  obs.Attach();
-  ASSERT_TRUE(ComputePoints());
+  obs.every = static_cast<int>(k.num("every", 1));
+  obs.allUpTo = static_cast<int>(k.num("allUpTo", 0));
+  if (obs.every > 0) obs.Attach();
+  const bool computed = ComputePoints();
+  ASSERT_EQ(computed, k.num("computed", 1) != 0);
+  if (!computed) {
+    EXPECT_FALSE(VD_IsUpToDate());
+    EXPECT_EQ(VD_GetNodeCount(), 0);
+    return;
+  }
   EXPECT_EQ(obs.firstError, "");
-  EXPECT_EQ(FinalCheck(), "");
+  EXPECT_EQ(FinalCheck(k.num("brute", 1) != 0), "");
+  const vd::Engine& g = vd::Vd();
+  const std::pair<const char*, double> values[] = {
+      {"nodes", VD_GetNodeCount()},    {"edges", VD_GetEdgeCount()},  {"dups", VD_GetDuplicateCount()},
+      {"restarts", g.restartCount},    {"count", g.points.count},     {"quadtree", g.usedQuadtree},
+      {"scaled", g.scaled},            {"scale", g.scale},            {"shiftX", g.shiftX},
+      {"shiftY", g.shiftY}};
+  for (const auto& [key, value] : values) {
+    if (k.has(key)) { EXPECT_EQ(value, k.num(key)) << key; }
+  }
+  if (k.has("deleted")) {
+    EXPECT_EQ(g.points[static_cast<int>(k.num("deleted"))].deleted, 1);
+  }
+  if (k.has("point")) {
+    const std::vector<double> xy = Nums(k.str("point"));
+    bool found = false;
+    for (std::int32_t i = 2; i < g.points.count - 2; ++i) found |= g.points[i].x == xy[0] && g.points[i].y == xy[1];
+    EXPECT_TRUE(found);
+  }
 }
 
-TEST(PointDiagram, RandomPointsKeepInvariantsAfterEveryInsertion) {
-  RunChecked(UniformPoints(2000, 1, 100.0));
-}
+INSTANTIATE_TEST_SUITE_P(Data, PointSets, RowsOf("point_sets.txt"), RowName);
 
 TEST(PointDiagram, SmallRandomSets) {
-  for (int n = 1; n <= 40; ++n) RunChecked(UniformPoints(n, 100 + n));
+  for (int n = 1; n <= 40; ++n) EXPECT_EQ(CheckedRun(UniformPoints(n, 100 + n)), "") << n;
 }
 
-}  // namespace
-}  // namespace zt
-
-namespace zt {
-namespace {
-
-using namespace vdtest;
-
-TEST(PointDiagram, ClusteredPointsTakeTheQuadtree) {
-  // Enough points that the search samples, and clustered enough to leave the grid.
-  const std::vector<Pt> pts = ClusteredPoints(6400, 7);
-  Store(pts);
-  CheckingObserver obs;
-  // Every insertion up to 2000 (the search leaves the grid after 1536
-  // sampled points), then every 50th.
-  obs.allUpTo = 2000;
-  obs.every = 50;
-  obs.Attach();
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_TRUE(vd::Vd().usedQuadtree);
-  EXPECT_EQ(obs.firstError, "");
-  EXPECT_EQ(FinalCheck(false), "");
-}
-
-TEST(PointDiagram, LatticePointsAreCocircular) {
-  RunChecked(LatticePoints(45));  // 2025 points, every cell cocircular
-}
-
-TEST(PointDiagram, CollinearPoints) { RunChecked(CollinearPoints(2000, 3)); }
-
-TEST(PointDiagram, UniformInputStaysOnTheGrid) {
-  Store(UniformPoints(8000, 9));
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_FALSE(vd::Vd().usedQuadtree);
-  EXPECT_EQ(FinalCheck(false), "");
-}
-
-TEST(PointDiagram, SinglePointIsTheInitialDiagram) {
-  Store({{3.0, 4.0}});
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(VD_GetNodeCount(), 8);
-  EXPECT_EQ(VD_GetEdgeCount(), 12);
-  EXPECT_EQ(FinalCheck(), "");
-}
-
-TEST(PointDiagram, IdenticalPointIsCountedAsDuplicate) {
-  Store({{1.0, 2.0}, {1.0, 2.0}});
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(VD_GetDuplicateCount(), 1);
-  EXPECT_EQ(VD_GetRestartCount(), 0);
-  EXPECT_EQ(vd::Vd().points[3].deleted, 1);
-  EXPECT_EQ(VD_GetNodeCount(), 8);  // the diagram of one point
-  EXPECT_EQ(FinalCheck(), "");
-}
-
-TEST(PointDiagram, PointsCloserThanTheToleranceMergeAfterOneRestart) {
-  // Extent 1 keeps the internal frame equal to the user frame.
-  Store({{0.0, 0.0}, {1.0, 1.0}, {0.5, 0.5}, {0.5 + 1e-12, 0.5}});
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(VD_GetRestartCount(), 1);
-  EXPECT_EQ(VD_GetDuplicateCount(), 1);
-  EXPECT_EQ(vd::Vd().points.count, 3 + 4);
-  EXPECT_EQ(FinalCheck(), "");
-  bool found = false;
-  for (std::int32_t i = 2; i < vd::Vd().points.count - 2; ++i)
-    found |= vd::Vd().points[i].x == 0.5 + 0.5e-12 && vd::Vd().points[i].y == 0.5;
-  EXPECT_TRUE(found);
-}
-
-TEST(PointDiagram, ScalingFollowsThePowerOfTwoRule) {
-  struct Case {
-    std::vector<Pt> pts;
-    double scale, shiftX, shiftY;
-    bool scaled;
-  };
-  const Case cases[] = {
-      {{{0, 0}, {1, 0.6}}, 1.0, 0.0, 0.0, false},
-      {{{0, 0}, {0.3, 0.3}}, 2.0, 0.0, 0.0, true},
-      {{{5, 7}, {1005, 507}}, 1.0 / 1024, 5.0, 7.0, true},
-      {{{-0.25, 0}, {0.5, 0.5}}, 1.0, -0.25, 0.0, true},  // extent in range, shift needed
-  };
-  for (const Case& c : cases) {
-    Store(c.pts);
-    ASSERT_TRUE(ComputePoints());
-    EXPECT_EQ(vd::Vd().scale, c.scale);
-    EXPECT_EQ(vd::Vd().shiftX, c.shiftX);
-    EXPECT_EQ(vd::Vd().shiftY, c.shiftY);
-    EXPECT_EQ(vd::Vd().scaled, c.scaled);
+TEST(PointDiagram, PairsJustAboveAndBelowTheMergeDistance) {
+  // Extent 1: internal units are user units. Pairs 2e-11 apart stay apart;
+  // pairs 5e-12 apart merge, one restart each at most.
+  std::vector<Pt> pts{{0, 0}, {1, 1}};
+  for (int i = 1; i < 20; ++i) {
+    const double x = i / 20.0, y = std::fmod(i * 0.37, 1.0);
+    pts.push_back({x, y});
+    pts.push_back({x + (i % 2 ? 2e-11 : 5e-12), y});
   }
+  EXPECT_EQ(CheckedRun(pts), "");
+  EXPECT_GE(VD_GetRestartCount(), 1);
+  EXPECT_LE(VD_GetRestartCount(), 10);
+  EXPECT_EQ(VD_GetDuplicateCount(), 9);                   // the even i
+  EXPECT_EQ(vd::Vd().points.count, 2 + 2 + 19 + 10 + 2);  // slots, corners, points kept
 }
 
 TEST(PointDiagram, RepeatedComputationIsReproducible) {
   const std::vector<Pt> pts = UniformPoints(500, 11, 10.0);
-  auto snapshot = [] {
-    std::vector<double> v;
-    for (std::int32_t i = 0; i < VD_GetNodeCount(); ++i) {
-      const VD_NodeInfo n = VD_GetNode(i);
-      v.insert(v.end(), {n.live ? 1.0 : 0.0, n.x, n.y, n.r});
-    }
-    for (std::int32_t i = 0; i < VD_GetEdgeCount(); ++i) {
-      const VD_EdgeInfo e = VD_GetEdge(i);
-      v.insert(v.end(), {double(e.n1), double(e.n2), double(e.lft), double(e.rgt)});
-    }
-    return v;
-  };
   Store(pts);
   ASSERT_TRUE(ComputePoints());
-  const auto first = snapshot();
+  const auto first = Snapshot();
   Store(pts);
   ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(snapshot(), first);
+  EXPECT_EQ(Snapshot(), first);
   // Computing again without a reset gives the same diagram too.
   ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(snapshot(), first);
+  EXPECT_EQ(Snapshot(), first);
 }
 
 TEST(PointDiagram, InsertionOrderDrawsLargePositionsDirectly) {
@@ -178,14 +118,6 @@ TEST(PointDiagram, CornerPointsReturnToTheirSlotsAfterARepairAppendedAPoint) {
   EXPECT_EQ(FinalCheck(), "");
 }
 
-}  // namespace
-}  // namespace zt
-
-namespace zt {
-namespace {
-
-using namespace vdtest;
-
 TEST(PointDiagram, CornerPointsFixTheMaximalOffset) {
   Store({{0, 0}, {1, 0}, {1, 1}, {0, 1}});
   ASSERT_TRUE(ComputePoints());  // points only: bound factor 1 becomes 5
@@ -219,4 +151,4 @@ TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
 }
 
 }  // namespace
-}  // namespace zt
+}  // namespace zt::vdtest

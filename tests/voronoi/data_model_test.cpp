@@ -117,12 +117,5 @@ TEST(DataModelDeathTest, AllocationFailureReportsAndExitsWithStatus2) {
               "ReallocateArray\\(\\) - memory allocation failed!");
 }
 
-TEST(DataModel, RecordSizesAreFixed) {
-  EXPECT_EQ(sizeof(PointRecord), 40u);
-  EXPECT_EQ(sizeof(SegmentRecord), 64u);
-  EXPECT_EQ(sizeof(NodeRecord), 48u);
-  EXPECT_EQ(sizeof(EdgeRecord), 48u);
-}
-
 }  // namespace
 }  // namespace zt

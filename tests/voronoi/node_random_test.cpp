@@ -2,11 +2,15 @@
 // circle (points on it, segments touching it), an edge of two of them cut
 // around the circle's centre, and the third as the new site. The computed
 // node must be the centre, with the radius as clearance, by true distances.
+// The configurations are the rows of data/node_random.txt.
 #include <gtest/gtest.h>
 
 #include <cmath>
 #include <random>
+#include <sstream>
+#include <string>
 
+#include "case_rows.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 
@@ -31,8 +35,6 @@ double claim_dist(const SiteRef& s, Point2d q) {
   const double t = ((q.x - a.x) * dx + (q.y - a.y) * dy) / (dx * dx + dy * dy);
   return t < -1e-12 || t > 1 + 1e-12 ? HUGE_VAL : site_dist(s, q);
 }
-
-enum class Shape { PointOn, Tangent, TangentFromPoint, CornerPair };
 
 struct Builder {
   std::mt19937_64 rng;
@@ -95,89 +97,45 @@ bool bisector_point(const SiteRef& a, const SiteRef& b, Point2d x, double h, Poi
   return true;
 }
 
-struct Case {
-  const char* name;
-  int kind;  // which configuration below
-};
-
-// Builds sites a, b (the edge) and fresh (the new site) for configuration k.
-void make_sites(Builder& B, int k, SiteRef& a, SiteRef& b, SiteRef& fresh) {
+// Sites a and b of the edge and the new site for a configuration of
+// data/node_random.txt.
+void make_sites(Builder& B, const std::string& sites, SiteRef& a, SiteRef& b, SiteRef& fresh) {
   const double base = B.uni(0, 2 * M_PI);
   const double th[3] = {base, base + B.uni(0.8, 2.0), base + B.uni(0.8, 2.0) + 2.2};
-  switch (k) {
-    case 0: {  // two points, new segment touching elsewhere
-      a = SiteRef::point(B.point(th[0]));
-      b = SiteRef::point(B.point(th[1]));
-      fresh = SiteRef::segment(B.tangent_seg(th[2]));
-      break;
-    }
-    case 1: {  // two points, new segment starting at one of them
-      const PointSite p = B.point(th[0]);
-      a = SiteRef::point(p);
-      b = SiteRef::point(B.point(th[1]));
-      fresh = SiteRef::segment(B.tangent_from(p, th[0]));
-      break;
-    }
-    case 2: {  // point and segment, new segment elsewhere
-      a = SiteRef::point(B.point(th[0]));
-      b = SiteRef::segment(B.tangent_seg(th[1]));
-      fresh = SiteRef::segment(B.tangent_seg(th[2]));
-      break;
-    }
-    case 3: {  // point and segment, new segment starting at the point
-      const PointSite p = B.point(th[0]);
-      a = SiteRef::point(p);
-      b = SiteRef::segment(B.tangent_seg(th[1]));
-      fresh = SiteRef::segment(B.tangent_from(p, th[0]));
-      break;
-    }
-    case 4: {  // segment and its own end point, new segment elsewhere
-      const PointSite p = B.point(th[0]);
-      a = SiteRef::point(p);
-      b = SiteRef::segment(B.tangent_from(p, th[0]));
-      fresh = SiteRef::segment(B.tangent_seg(th[1]));
-      break;
-    }
-    case 5: {  // three segments
-      a = SiteRef::segment(B.tangent_seg(th[0]));
-      b = SiteRef::segment(B.tangent_seg(th[1]));
-      fresh = SiteRef::segment(B.tangent_seg(th[2]));
-      break;
-    }
-    case 6: {  // a corner of two segments, new segment elsewhere
-      const double t1 = th[0], t2 = th[0] + B.uni(0.6, 2.4);
-      const double mid = 0.5 * (t1 + t2), half = 0.5 * (t2 - t1);
-      const PointSite v{B.next_point++, add(B.x, mul(Point2d{std::cos(mid), std::sin(mid)}, B.r / std::cos(half)))};
-      const auto leg = [&](double t) {
-        const Point2d tp = B.on_circle(t);
-        const Point2d far = add(v.p, mul(sub(tp, v.p), 1.0 + B.uni(0.2, 1.0)));
-        return B.segment(v, {B.next_point++, far});
-      };
-      a = SiteRef::segment(leg(t1));
-      b = SiteRef::segment(leg(t2));
-      fresh = SiteRef::segment(B.tangent_seg(t2 + B.uni(1.0, 2 * M_PI - (t2 - t1) - 1.0)));
-      break;
-    }
-    case 7: {  // new point against a point and a segment
-      a = SiteRef::point(B.point(th[0]));
-      b = SiteRef::segment(B.tangent_seg(th[1]));
-      fresh = SiteRef::point(B.point(th[2]));
-      break;
-    }
-    default: {  // new point against two segments
-      a = SiteRef::segment(B.tangent_seg(th[0]));
-      b = SiteRef::segment(B.tangent_seg(th[1]));
-      fresh = SiteRef::point(B.point(th[2]));
-      break;
+  if (sites == "corner") {
+    const double t1 = th[0], t2 = th[0] + B.uni(0.6, 2.4);
+    const double mid = 0.5 * (t1 + t2), half = 0.5 * (t2 - t1);
+    const PointSite v{B.next_point++, add(B.x, mul(Point2d{std::cos(mid), std::sin(mid)}, B.r / std::cos(half)))};
+    const auto leg = [&](double t) {
+      const Point2d tp = B.on_circle(t);
+      const Point2d far = add(v.p, mul(sub(tp, v.p), 1.0 + B.uni(0.2, 1.0)));
+      return B.segment(v, {B.next_point++, far});
+    };
+    a = SiteRef::segment(leg(t1));
+    b = SiteRef::segment(leg(t2));
+    fresh = SiteRef::segment(B.tangent_seg(t2 + B.uni(1.0, 2 * M_PI - (t2 - t1) - 1.0)));
+    return;
+  }
+  std::istringstream words(sites);
+  PointSite first{-1, {}};
+  for (SiteRef* s : {&a, &b, &fresh}) {
+    std::string w;
+    words >> w;
+    const double t = w.size() > 1 ? th[w[1] - '0'] : th[0];
+    if (w[0] == 'P') {
+      const PointSite p = B.point(t);
+      if (first.index < 0) first = p;
+      *s = SiteRef::point(p);
+    } else {
+      *s = SiteRef::segment(w[0] == 'T' ? B.tangent_seg(t) : B.tangent_from(first, t));
     }
   }
 }
 
-class NodeRandom : public ::testing::TestWithParam<Case> {};
+class NodeRandom : public vdtest::CaseRows {};
 
 TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
-  const int kind = GetParam().kind;
-  Builder B{std::mt19937_64(1234 + kind), {}, 0};
+  Builder B{std::mt19937_64(1234 + std::stoi(row().field(0))), {}, 0};
   int used = 0;
   for (int trial = 0; trial < 3000; ++trial) {
     B.x = {B.uni(0.25, 0.75), B.uni(0.25, 0.75)};
@@ -185,7 +143,7 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
     // coefficient scaling of the solver.
     B.r = 0.2 * std::pow(10.0, -B.uni(0, 5));
     SiteRef a, b, fresh;
-    make_sites(B, kind, a, b, fresh);
+    make_sites(B, row().field(1), a, b, fresh);
     const double h1 = B.r * B.uni(1e-3, 0.25), h2 = -B.r * B.uni(1e-3, 0.25);
     Point2d y1, y2;
     if (!bisector_point(a, b, B.x, h1, y1) || !bisector_point(a, b, B.x, h2, y2)) continue;
@@ -216,32 +174,26 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
     const bool ok = compute_node(e, fresh, memory, suspect, out);
     ++used;
     const double tol = 1e-9;
-    ASSERT_TRUE(ok) << "trial " << trial;
-    ASSERT_FALSE(out.copied) << "trial " << trial << " r " << B.r;
+    SCOPED_TRACE("trial " + std::to_string(trial) + " r " + std::to_string(B.r));
+    ASSERT_TRUE(ok);
+    ASSERT_FALSE(out.copied);
     EXPECT_EQ(out.on_point, -1);
-    ASSERT_NEAR(out.n.x, B.x.x, tol) << "trial " << trial << " r " << B.r;
-    ASSERT_NEAR(out.n.y, B.x.y, tol) << "trial " << trial << " r " << B.r;
-    ASSERT_NEAR(out.r, B.r, tol) << "trial " << trial;
     const double da = site_dist(a, out.n), db = site_dist(b, out.n), df = site_dist(fresh, out.n);
     ASSERT_NEAR(da, db, tol);
     ASSERT_NEAR(da, df, tol);
     // The bisection that stands in for a failed closed form finds it too.
     NodeResult searched;
-    ASSERT_TRUE(bisect_on_edge(e, fresh, searched)) << "trial " << trial;
-    ASSERT_NEAR(searched.n.x, B.x.x, tol) << "trial " << trial;
-    ASSERT_NEAR(searched.n.y, B.x.y, tol) << "trial " << trial;
-    ASSERT_NEAR(searched.r, B.r, tol) << "trial " << trial;
+    ASSERT_TRUE(bisect_on_edge(e, fresh, searched));
+    for (const NodeResult& n : {out, searched}) {
+      ASSERT_NEAR(n.n.x, B.x.x, tol);
+      ASSERT_NEAR(n.n.y, B.x.y, tol);
+      ASSERT_NEAR(n.r, B.r, tol);
+    }
   }
   EXPECT_GT(used, 1500);
 }
 
-INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom,
-                         ::testing::Values(Case{"PointsNewSegment", 0}, Case{"PointsNewSegmentFromPoint", 1},
-                                           Case{"PointSegmentNewSegment", 2}, Case{"PointSegmentNewFromPoint", 3},
-                                           Case{"SegmentOwnEndNewSegment", 4}, Case{"ThreeSegments", 5},
-                                           Case{"CornerNewSegment", 6}, Case{"PointSegmentNewPoint", 7},
-                                           Case{"SegmentsNewPoint", 8}),
-                         [](const auto& info) { return std::string(info.param.name); });
+INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom, vdtest::RowsOf("node_random.txt"), vdtest::RowName);
 
 }  // namespace
 }  // namespace zt::vd::geo

@@ -1,32 +1,52 @@
 // Checks of traced offsets against brute force: every sampled point of every
-// element lies at distance t from the nearest input site, and every curve
-// closes. Sites are kept here in user coordinates, independent of the engine.
+// element lies at distance t from the nearest input site, every curve
+// closes, and curves of contours stay on their side of the material. Sites
+// are kept here in user coordinates, independent of the engine.
 #pragma once
 
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <numbers>
+#include <random>
 #include <string>
 #include <vector>
 
-#include "voronoi/engine.hpp"
+#include "vd_test_util.hpp"
 
 namespace zt::vdtest {
 
-struct Site2 {
-  double x, y;
-};
 struct Seg2 {
-  Site2 a, b;
+  Pt a, b;
 };
 
 struct InputSites {
-  std::vector<Site2> points;
+  std::vector<Pt> points;
   std::vector<Seg2> segments;
+  std::vector<Contour> contours;
 };
 
-inline double DistToSegment(const Site2& p, const Seg2& s) {
+inline InputSites SitesOf(const std::vector<Contour>& contours) {
+  InputSites in;
+  in.contours = contours;
+  for (const Contour& c : contours)
+    for (std::size_t i = 0; i < c.size(); ++i) {
+      in.points.push_back(c[i]);
+      in.segments.push_back({c[i], c[(i + 1) % c.size()]});
+    }
+  return in;
+}
+
+inline double Extent(const InputSites& in) {
+  double x0 = INFINITY, x1 = -INFINITY, y0 = INFINITY, y1 = -INFINITY;
+  for (const Pt& p : in.points) {
+    x0 = std::min(x0, p.x), x1 = std::max(x1, p.x);
+    y0 = std::min(y0, p.y), y1 = std::max(y1, p.y);
+  }
+  return std::max(x1 - x0, y1 - y0);
+}
+
+inline double DistToSegment(const Pt& p, const Seg2& s) {
   const double dx = s.b.x - s.a.x, dy = s.b.y - s.a.y;
   const double l2 = dx * dx + dy * dy;
   double u = l2 > 0 ? ((p.x - s.a.x) * dx + (p.y - s.a.y) * dy) / l2 : 0.0;
@@ -34,17 +54,27 @@ inline double DistToSegment(const Site2& p, const Seg2& s) {
   return std::hypot(p.x - (s.a.x + u * dx), p.y - (s.a.y + u * dy));
 }
 
-inline double Clearance(const InputSites& in, const Site2& p) {
+inline double Clearance(const InputSites& in, const Pt& p) {
   double m = INFINITY;
-  for (const Site2& q : in.points) m = std::min(m, std::hypot(p.x - q.x, p.y - q.y));
+  for (const Pt& q : in.points) m = std::min(m, std::hypot(p.x - q.x, p.y - q.y));
   for (const Seg2& s : in.segments) m = std::min(m, DistToSegment(p, s));
   return m;
 }
 
+// Even-odd inside test over all contours.
+inline bool Inside(const std::vector<Contour>& contours, const Pt& p) {
+  bool in = false;
+  for (const Contour& c : contours)
+    for (std::size_t i = 0, j = c.size() - 1; i < c.size(); j = i++)
+      if ((c[i].y > p.y) != (c[j].y > p.y) && p.x < (c[j].x - c[i].x) * (p.y - c[i].y) / (c[j].y - c[i].y) + c[i].x)
+        in = !in;
+  return in;
+}
+
 struct Element {
   std::int32_t kind, site;
-  Site2 start;   // user coordinates
-  Site2 centre;  // point sites
+  Pt start;   // user coordinates
+  Pt centre;  // point sites
 };
 struct Curve {
   double offset;
@@ -71,17 +101,23 @@ inline std::vector<Curve> ReadStore() {
   return out;
 }
 
-// Samples along element k of c: a straight piece, or a clockwise arc about
-// its point site (a full turn when both ends coincide).
-inline std::vector<Site2> Samples(const Curve& c, std::size_t k, int n = 16) {
+// The clockwise turn of arc element k of c (a full turn when its ends meet).
+inline double Sweep(const Curve& c, std::size_t k) {
   const Element& e = c.elements[k];
-  const Site2 p = e.start, q = c.elements[(k + 1) % c.elements.size()].start;
-  std::vector<Site2> s;
+  const Pt q = c.elements[(k + 1) % c.elements.size()].start;
+  double sweep = std::atan2(e.start.y - e.centre.y, e.start.x - e.centre.x) - std::atan2(q.y - e.centre.y, q.x - e.centre.x);
+  while (sweep < 0) sweep += 2 * std::numbers::pi;
+  return sweep;
+}
+
+// Samples along element k of c: a straight piece, or a clockwise arc about
+// its point site.
+inline std::vector<Pt> Samples(const Curve& c, std::size_t k, int n = 16) {
+  const Element& e = c.elements[k];
+  const Pt p = e.start, q = c.elements[(k + 1) % c.elements.size()].start;
+  std::vector<Pt> s;
   if (e.kind == 2) {
-    const double a0 = std::atan2(p.y - e.centre.y, p.x - e.centre.x);
-    const double a1 = std::atan2(q.y - e.centre.y, q.x - e.centre.x);
-    double sweep = a0 - a1;  // clockwise
-    while (sweep < 0) sweep += 2 * std::numbers::pi;
+    const double a0 = std::atan2(p.y - e.centre.y, p.x - e.centre.x), sweep = Sweep(c, k);
     const double r = std::hypot(p.x - e.centre.x, p.y - e.centre.y);
     for (int i = 0; i <= n; ++i) {
       const double a = a0 - sweep * i / n;
@@ -100,7 +136,7 @@ inline std::string CheckAtDistance(const InputSites& in, const std::vector<Curve
     if (c.elements.empty()) return "curve " + std::to_string(ci) + " is empty";
     if (std::fabs(c.offset - t) > tol) return "curve " + std::to_string(ci) + " has offset " + std::to_string(c.offset);
     for (std::size_t k = 0; k < c.elements.size(); ++k) {
-      for (const Site2& p : Samples(c, k)) {
+      for (const Pt& p : Samples(c, k)) {
         const double d = Clearance(in, p);
         if (std::fabs(d - t) > tol)
           return "curve " + std::to_string(ci) + " element " + std::to_string(k) + " kind " +
@@ -110,6 +146,32 @@ inline std::string CheckAtDistance(const InputSites& in, const std::vector<Curve
     }
   }
   return {};
+}
+
+// Empty when every sample of every curve is on the wanted side of the
+// material (the left of counter-clockwise outer contours and clockwise holes
+// is the inside).
+inline std::string CheckSide(const std::vector<Contour>& contours, const std::vector<Curve>& curves, bool inside) {
+  for (std::size_t ci = 0; ci < curves.size(); ++ci)
+    for (std::size_t k = 0; k < curves[ci].elements.size(); ++k)
+      for (const Pt& p : Samples(curves[ci], k, 4))
+        if (Inside(contours, p) != inside) return "curve " + std::to_string(ci) + " leaves its side";
+  return {};
+}
+
+// A star-shaped polygon around (cx, cy) with n vertices, counter-clockwise
+// unless `clockwise`.
+template <class P = Pt>
+std::vector<P> Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
+  std::uniform_real_distribution<double> radius(rmin, rmax), jitter(-0.3, 0.3);
+  std::vector<P> c;
+  for (int i = 0; i < n; ++i) {
+    const double a = 2 * std::numbers::pi * (i + 0.5 + jitter(rng)) / n;
+    const double r = radius(rng);
+    c.push_back({cx + r * std::cos(a), cy + r * std::sin(a)});
+  }
+  if (clockwise) std::reverse(c.begin(), c.end());
+  return c;
 }
 
 }  // namespace zt::vdtest

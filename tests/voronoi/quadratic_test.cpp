@@ -1,4 +1,5 @@
-// Quadratic solver: normalisation by powers of 128 and root forms.
+// Quadratic solver: the root forms of data/quadratic.txt, and the
+// normalisation by powers of 128.
 #include "voronoi/detail/quadratic.hpp"
 
 #include <gtest/gtest.h>
@@ -6,23 +7,29 @@
 #include <algorithm>
 #include <cmath>
 
+#include "case_rows.hpp"
+
 namespace zt::vd::geo {
 namespace {
 
-TEST(Quadratic, RootsDoNotDependOnScale) {
-  // (t − 1)(t − 2) scaled down by powers of 128: the scaling is exact, so the
-  // roots must come out bit-identical.
-  double scale = 1.0;
-  for (int k = 0; k < 12; ++k, scale /= 128.0) {
-    QuadCoefs q{1.0 * scale, -3.0 * scale, 2.0 * scale};
-    const QuadRoots r = solve_quadratic(q);
-    ASSERT_EQ(r.count, 2) << k;
-    EXPECT_EQ(std::min(r.t1, r.t2), 1.0) << k;
-    EXPECT_EQ(std::max(r.t1, r.t2), 2.0) << k;
+class Quadratic : public vdtest::CaseRows {};
+
+TEST_P(Quadratic, FindsItsRoots) {
+  const std::vector<double> c = vdtest::Nums(row().field(0));
+  const std::vector<std::string> want = vdtest::Words(row().field(1));
+  const double tol = vdtest::Num(row().field(2));
+  const QuadRoots r = solve_quadratic({c.at(0), c.at(1), c.at(2)});
+  ASSERT_EQ(r.count, std::stoi(want.at(0)));
+  const double roots[] = {std::min(r.t1, r.t2), std::max(r.t1, r.t2)};
+  for (std::size_t i = 1; i < want.size(); ++i) {
+    const double root = r.count == 1 ? r.t1 : roots[i - 1];
+    EXPECT_TRUE(want[i] == "*" || std::fabs(root - vdtest::Num(want[i])) <= tol) << i << ": " << root;
   }
 }
 
-TEST(Quadratic, NormalisationStopsAndCounts) {
+INSTANTIATE_TEST_SUITE_P(Data, Quadratic, vdtest::RowsOf("quadratic.txt"), vdtest::RowName);
+
+TEST(QuadraticNormalisation, StopsAndCounts) {
   QuadCoefs q{1.0 / (128.0 * 128.0 * 128.0), 0.0, 0.0};
   EXPECT_EQ(normalize_quadratic(q), 3);
   EXPECT_EQ(q.a, 1.0);
@@ -37,35 +44,6 @@ TEST(Quadratic, NormalisationStopsAndCounts) {
   // A large A stops the scaling even when B and C are tiny.
   QuadCoefs big{1.0, 1e-30, 1e-30};
   EXPECT_EQ(normalize_quadratic(big), 0);
-}
-
-TEST(Quadratic, DegenerateForms) {
-  // Linear: A = 0.
-  QuadRoots r = solve_quadratic({0.0, 2.0, -4.0});
-  ASSERT_EQ(r.count, 1);
-  EXPECT_EQ(r.t1, 2.0);
-  // Neither A nor B: no root.
-  EXPECT_EQ(solve_quadratic({0.0, 0.0, 1.0}).count, 0);
-  // Double root.
-  r = solve_quadratic({1.0, -2.0, 1.0});
-  ASSERT_EQ(r.count, 1);
-  EXPECT_EQ(r.t1, 1.0);
-  // Negative discriminant: no root.
-  EXPECT_EQ(solve_quadratic({1.0, 0.0, 1.0}).count, 0);
-  // q = 0 (B = C = 0 after the disc): one root.
-  r = solve_quadratic({1.0, 0.0, -0.0});
-  EXPECT_EQ(r.count, 1);
-  // Non-finite coefficients give no root.
-  EXPECT_EQ(solve_quadratic({std::nan(""), 1.0, 1.0}).count, 0);
-  EXPECT_EQ(solve_quadratic({1.0, HUGE_VAL, 1.0}).count, 0);
-}
-
-TEST(Quadratic, CancellationFreeSmallRoot) {
-  // t² − 1e8·t + 1: the small root 1e-8 is lost by the textbook formula.
-  const QuadRoots r = solve_quadratic({1.0, -1e8, 1.0});
-  ASSERT_EQ(r.count, 2);
-  const double small = std::min(r.t1, r.t2);
-  EXPECT_NEAR(small, 1e-8, 1e-22);
 }
 
 }  // namespace

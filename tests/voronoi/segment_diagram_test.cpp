@@ -1,5 +1,6 @@
-// Diagrams of points and segments through the facade: invariants after the
-// whole computation, restarts and recovery mode on clean and defective input.
+// Diagrams of points and segments through the facade: the clean and the
+// defective input of data/segment_diagrams.txt checked after every insertion
+// and in full, and the orientation memory of the constructions.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -7,35 +8,12 @@
 #include <random>
 #include <vector>
 
-#include "tests/voronoi/vd_test_util.hpp"
+#include "case_rows.hpp"
+#include "vd_test_util.hpp"
 #include "voronoi/detail/segment_checks.hpp"
 
 namespace zt::vdtest {
 namespace {
-
-using Contour = std::vector<Pt>;
-
-// Stores closed contours as points and segments between consecutive points.
-void StoreContours(const std::vector<Contour>& contours) {
-  VD_Initialize();
-  VD_Reset();
-  std::int32_t tag = 0;
-  for (const Contour& c : contours) {
-    std::vector<std::int32_t> idx;
-    for (const Pt& p : c) idx.push_back(API_AddPoint(p.x, p.y, tag++));
-    for (std::size_t i = 0; i < idx.size(); ++i) API_AddSegment(idx[i], idx[(i + 1) % idx.size()], tag++);
-  }
-}
-
-bool ComputeSegments() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
-
-TEST(SegmentDiagram, Square) {
-  StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_EQ(VD_GetRestartCount(), 0);
-  EXPECT_FALSE(VD_InRecoveryMode());
-}
 
 // A star-shaped simple polygon: sorted random angles, random radii.
 Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rmin = 0.2, double rmax = 0.45) {
@@ -52,71 +30,16 @@ Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rm
   return c;
 }
 
-Contour Reversed(Contour c) {
-  std::reverse(c.begin(), c.end());
-  return c;
-}
+// Stores the sites of a generator list (see data/segment_diagrams.txt): its
+// contours first, then its loose points, open segments and links.
+void StoreList(const std::string& list);
 
-// A circle approximated by n chord points.
-Contour Circle(int n, Pt centre, double r, double phase = 0.1) {
-  Contour c;
-  for (int i = 0; i < n; ++i) {
-    const double a = phase + 2 * M_PI * i / n;
-    c.push_back({centre.x + r * std::cos(a), centre.y + r * std::sin(a)});
-  }
-  return c;
-}
-
-// A rectilinear staircase: axis-parallel edges only.
-Contour Staircase(int steps, double size) {
-  Contour c{{0, 0}};
-  const double h = size / steps;
-  for (int i = 0; i < steps; ++i) {
-    c.push_back({(i + 1) * h, i * h});
-    c.push_back({(i + 1) * h, (i + 1) * h});
-  }
-  c.push_back({0, size});
-  return c;
-}
-
-// A square with k collinear points on each side.
-Contour DenseSquare(int k, double size, double at = 0.0) {
-  Contour c;
-  for (int side = 0; side < 4; ++side) {
-    for (int i = 0; i < k; ++i) {
-      const double t = size * i / k;
-      const Pt p = side == 0 ? Pt{t, 0} : side == 1 ? Pt{size, t} : side == 2 ? Pt{size - t, size} : Pt{0, size - t};
-      c.push_back({p.x + at, p.y + at});
-    }
-  }
-  return c;
-}
-
-// Computes with the checker after every insertion; returns the first error.
-std::string RunChecked(const std::vector<Contour>& contours, int every = 1, bool bruteForce = true) {
-  StoreContours(contours);
-  CheckingObserver obs;
-  obs.every = every;
-  obs.Attach();
-  if (!ComputeSegments()) return "not computed";
-  if (!obs.firstError.empty()) return obs.firstError;
-  const std::string error = FinalCheck(bruteForce);
+// Computes with the checker after every `every`-th insertion; "" or the
+// first error, of the diagram or of its segment edges.
+std::string RunChecked(const std::string& list, int every = 1, bool bruteForce = true) {
+  StoreList(list);
+  const std::string error = CheckedCompute(false, every, bruteForce);
   return error.empty() ? vd::CheckSegmentEdges() : error;
-}
-
-void ExpectClean(const std::vector<Contour>& contours, const std::string& what, int every = 1, bool bruteForce = true) {
-  EXPECT_EQ(RunChecked(contours, every, bruteForce), "") << what;
-  EXPECT_EQ(VD_GetRestartCount(), 0) << what;
-  EXPECT_FALSE(VD_InRecoveryMode()) << what;
-}
-
-TEST(SegmentDiagram, StarPolygons) {
-  for (int n : {4, 5, 10, 30, 100}) {
-    for (std::uint32_t seed = 1; seed <= 6; ++seed) {
-      ExpectClean({StarPolygon(n, seed * 7919 + n)}, "star " + std::to_string(n) + " seed " + std::to_string(seed));
-    }
-  }
-  ExpectClean({StarPolygon(5000, 5)}, "star 5000", 2500, false);
 }
 
 bool Cross(Pt a, Pt b, Pt c, Pt d) {
@@ -145,53 +68,99 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
   return c;
 }
 
-TEST(SegmentDiagram, RandomSimplePolygons) {
-  for (int n : {10, 40, 150}) {
-    for (std::uint32_t seed = 1; seed <= 4; ++seed) {
-      ExpectClean({RandomSimplePolygon(n, seed * 31 + n)}, "polygon " + std::to_string(n) + " seed " + std::to_string(seed));
+void StoreList(const std::string& list) {
+  std::vector<Contour> contours;
+  std::vector<std::pair<std::string, std::vector<double>>> extras;
+  std::istringstream s(list);
+  for (std::string part; std::getline(s, part, ';');) {
+    std::vector<std::string> w = Words(part);
+    const bool reversed = w.at(0) == "rev";
+    if (reversed) w.erase(w.begin());
+    std::vector<double> a;
+    for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
+    const auto arg = [&](std::size_t i, double fallback) { return i < a.size() ? a[i] : fallback; };
+    Contour c;
+    if (w[0] == "poly") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) c.push_back({a[i], a[i + 1]});
+    } else if (w[0] == "star") {
+      c = StarPolygon(int(a.at(0)), std::uint32_t(a.at(1)), {arg(2, 0.5), arg(3, 0.5)}, arg(4, 0.2), arg(5, 0.45));
+    } else if (w[0] == "burst") {
+      for (int i = 0; i < int(a.at(0)); ++i) {
+        const double angle = 2 * M_PI * i / int(a[0]), r = i % 2 ? a.at(2) : a.at(1);
+        c.push_back({r * std::cos(angle), r * std::sin(angle)});
+      }
+    } else if (w[0] == "simple") {
+      c = RandomSimplePolygon(int(a.at(0)), std::uint32_t(a.at(1)));
+    } else if (w[0] == "circle") {
+      for (int i = 0; i < int(a.at(0)); ++i) {
+        const double angle = arg(4, 0.1) + 2 * M_PI * i / int(a[0]);
+        c.push_back({a.at(1) + a.at(3) * std::cos(angle), a.at(2) + a.at(3) * std::sin(angle)});
+      }
+    } else if (w[0] == "staircase") {
+      const double h = a.at(1) / int(a.at(0));
+      c.push_back({0, 0});
+      for (int i = 0; i < int(a[0]); ++i) {
+        c.push_back({(i + 1) * h, i * h});
+        c.push_back({(i + 1) * h, (i + 1) * h});
+      }
+      c.push_back({0, a[1]});
+    } else if (w[0] == "dense") {
+      const double size = a.at(1), at = arg(2, 0.0);
+      for (int side = 0; side < 4; ++side) {
+        for (int i = 0; i < int(a[0]); ++i) {
+          const double t = size * i / int(a[0]);
+          const Pt p = side == 0 ? Pt{t, 0} : side == 1 ? Pt{size, t} : side == 2 ? Pt{size - t, size} : Pt{0, size - t};
+          c.push_back({p.x + at, p.y + at});
+        }
+      }
+    } else {
+      extras.emplace_back(w[0], a);
+      continue;
+    }
+    if (reversed) std::reverse(c.begin(), c.end());
+    contours.push_back(c);
+  }
+  StoreContours(contours);
+  for (const auto& [kind, a] : extras) {
+    if (kind == "points") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) API_AddPoint(a[i], a[i + 1], 3);
+    } else if (kind == "segment") {
+      API_AddSegment(API_AddPoint(a.at(0), a.at(1), 0), API_AddPoint(a.at(2), a.at(3), 0), 0);
+    } else if (kind == "link") {
+      API_AddSegment(int(a.at(0)), int(a.at(1)), 0);
+    } else {
+      ADD_FAILURE() << "unknown sites " << kind;
     }
   }
 }
 
-TEST(SegmentDiagram, NestedContoursWithHoles) {
-  for (std::uint32_t seed = 1; seed <= 5; ++seed) {
-    ExpectClean({StarPolygon(40, seed, {0.5, 0.5}, 0.4, 0.48), Reversed(StarPolygon(12, seed + 100, {0.5, 0.5}, 0.1, 0.2)),
-                 Reversed(Circle(16, {0.5, 0.5}, 0.3, 0.05 * seed))},
-                "nested " + std::to_string(seed));
-  }
+class SegmentDiagrams : public CaseRows {};
+
+TEST_P(SegmentDiagrams, AreSound) {
+  const Keys k(row().field(1));
+  EXPECT_EQ(RunChecked(row().field(0), int(k.num("every", 1)), k.num("brute", 1) != 0), "");
+  const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
+  EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? VD_GetRestartCount() > 0 : VD_GetRestartCount() == 0))
+      << VD_GetRestartCount();
+  EXPECT_FALSE(VD_InRecoveryMode());
+  EXPECT_TRUE(!k.has("segments") || vd::Vd().segments.count == k.num("segments")) << vd::Vd().segments.count;
 }
 
-TEST(SegmentDiagram, AxisAlignedAndCollinearContours) {
-  ExpectClean({Staircase(20, 1.0)}, "staircase");
-  ExpectClean({DenseSquare(10, 1.0)}, "dense square");
-  ExpectClean({DenseSquare(7, 3.0), Reversed(DenseSquare(3, 1.0, 1.0))}, "dense squares nested");
-}
-
-TEST(SegmentDiagram, ChordPointsOfArcs) {
-  ExpectClean({Circle(64, {0, 0}, 10.0)}, "circle 64");
-  ExpectClean({Circle(200, {5, 5}, 1.0), Reversed(Circle(50, {5, 5}, 0.5))}, "annulus");
-}
+INSTANTIATE_TEST_SUITE_P(Data, SegmentDiagrams, RowsOf("segment_diagrams.txt"), RowName);
 
 // The orientation memory of the point-segment-segment construction is reset
 // by every segment insertion: a memory left set by anything before gives
 // the same diagram.
 TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
-  const std::vector<Contour> input{StarPolygon(60, 3), Reversed(Circle(9, {0.5, 0.5}, 0.1))};
-  StoreContours(input);
+  const std::string input = "star 60 3; rev circle 9 0.5 0.5 0.1";
+  StoreList(input);
   ASSERT_TRUE(ComputeSegments());
-  std::vector<VD_NodeInfo> first;
-  for (std::int32_t n = 0; n < VD_GetNodeCount(); ++n) first.push_back(VD_GetNode(n));
-  StoreContours(input);
+  const std::vector<double> first = Snapshot();
+  StoreList(input);
   vd::Vd().pssOrientByKeptNode = true;
   ASSERT_TRUE(ComputeSegments());
   EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
-  ASSERT_EQ(VD_GetNodeCount(), static_cast<std::int32_t>(first.size()));
-  for (std::int32_t n = 0; n < VD_GetNodeCount(); ++n) {
-    const VD_NodeInfo b = VD_GetNode(n);
-    EXPECT_EQ(first[n].live, b.live);
-    EXPECT_EQ(first[n].x, b.x);
-    EXPECT_EQ(first[n].y, b.y);
-  }
+  EXPECT_EQ(Snapshot(), first);
 }
 
 }  // namespace

@@ -1,11 +1,14 @@
-// Input repair with segments: the worked examples on a bare engine, and
-// defective input repaired by whole computations.
+// Input repair with segments: the worked examples of data/segment_repair.txt
+// on a bare engine (whole computations of defective input are rows of
+// data/segment_diagrams.txt).
 #include <gtest/gtest.h>
 
+#include <cfloat>
 #include <cmath>
 #include <vector>
 
-#include "tests/voronoi/vd_test_util.hpp"
+#include "case_rows.hpp"
+#include "vd_test_util.hpp"
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/preprocess.hpp"
 #include "voronoi/detail/segment_repair.hpp"
@@ -13,176 +16,63 @@
 namespace zt::vdtest {
 namespace {
 
-// A bare engine holding points (from index 2) and segments with line data,
-// in internal units (no scaling, no dummies).
-struct Bare {
-  explicit Bare(const std::vector<Pt>& pts) {
-    VD_Initialize();
-    VD_Reset();
-    for (std::size_t i = 0; i < pts.size(); ++i) API_AddPoint(pts[i].x, pts[i].y, 10 + static_cast<int>(i));
-  }
-  std::int32_t Seg(std::int32_t a, std::int32_t b) { return API_AddSegment(a, b, 77); }
-  void Prepare() {
-    vd::ComputeSegmentLineData();
-    vd::Vd().restartPending = false;
-  }
+// The cases of data/segment_repair.txt.
+class SegmentRepair : public CaseRows {};
+
+TEST_P(SegmentRepair, LeavesTheExpectedInput) {
+  VD_Initialize();
+  VD_Reset();
+  const std::vector<double> xy = Nums(row().field(0));
+  for (std::size_t i = 0; i + 1 < xy.size(); i += 2) API_AddPoint(xy[i], xy[i + 1], 10 + static_cast<int>(i / 2));
+  for (const std::string& s : Words(row().field(1))) API_AddSegment(std::stoi(s), std::stoi(s.substr(s.find('-') + 1)), 77);
+  vd::ComputeSegmentLineData();
   vd::Engine& g = vd::Vd();
-};
-
-TEST(SegmentRepair, PointNearTheInteriorSplitsTheSegment) {
-  Bare b({{0, 0}, {1, 0}, {0.5, 5e-7}});
-  b.Seg(2, 3);
-  b.Prepare();
-  ASSERT_TRUE(vd::RepairSegmentPoint(0, 4));
-  EXPECT_TRUE(b.g.restartPending);
-  ASSERT_EQ(b.g.segments.count, 2);
-  EXPECT_EQ(b.g.segments[0].i1, 2);
-  EXPECT_EQ(b.g.segments[0].i2, 4);
-  EXPECT_EQ(b.g.segments[1].i1, 4);
-  EXPECT_EQ(b.g.segments[1].i2, 3);
-  EXPECT_EQ(b.g.segments[1].tag, 77);
-}
-
-TEST(SegmentRepair, PointNearAnEndMergesWithIt) {
-  Bare b({{0, 0}, {1, 0}, {3e-7, 4e-7}});
-  b.Seg(2, 3);
-  b.Prepare();
-  ASSERT_TRUE(vd::RepairSegmentPoint(0, 4));
-  EXPECT_EQ(b.g.segments.count, 1);
-  EXPECT_EQ(b.g.points[2].x, b.g.points[4].x);
-  EXPECT_EQ(b.g.points[2].y, b.g.points[4].y);
-  EXPECT_DOUBLE_EQ(b.g.points[2].x, 1.5e-7);
-  EXPECT_TRUE(b.g.lineDataInexact);
-}
-
-TEST(SegmentRepair, PointOffTheLineChangesNothing) {
-  Bare b({{0, 0}, {1, 0}, {0.5, 2e-6}});
-  b.Seg(2, 3);
-  b.Prepare();
-  EXPECT_FALSE(vd::RepairSegmentPoint(0, 4));
-  EXPECT_FALSE(vd::RepairInput(0, vd::SEG, true));  // check-all is off by default
-  EXPECT_FALSE(b.g.restartPending);
-  EXPECT_EQ(b.g.segments.count, 1);
-}
-
-TEST(SegmentRepair, CrossingSegmentsAreSplitAtTheCrossing) {
-  Bare b({{0, 0}, {1, 1}, {0, 1}, {1, 0.5}});
-  b.Seg(2, 3);
-  b.Seg(4, 5);
-  b.Prepare();
-  const std::int32_t before = b.g.points.count;
-  ASSERT_TRUE(vd::RepairSegmentSegment(0, 1));
-  ASSERT_EQ(b.g.points.count, before + 1);
-  const vd::PointRecord& x = b.g.points[before];
-  EXPECT_EQ(x.tag, -1);
-  // (0,0)-(1,1) meets (0,1)-(1,0.5) at x = y = 2/3.
-  EXPECT_NEAR(x.x, 2.0 / 3.0, 1e-15);
-  EXPECT_NEAR(x.y, 2.0 / 3.0, 1e-15);
-  ASSERT_EQ(b.g.segments.count, 4);
-  EXPECT_EQ(b.g.segments[0].i2, before);
-  EXPECT_EQ(b.g.segments[1].i2, before);
-  EXPECT_EQ(b.g.segments[2].i1, before);
-  EXPECT_EQ(b.g.segments[3].i1, before);
-}
-
-TEST(SegmentRepair, TouchingSegmentsAreNotCrossing) {
-  // A shared end point, and an end point on the other's interior.
-  Bare b({{0, 0}, {1, 0}, {1, 1}, {0.5, 0}, {0.5, 1}});
-  b.Seg(2, 3);
-  b.Seg(3, 4);
-  b.Seg(5, 6);
-  b.Prepare();
-  EXPECT_FALSE(vd::RepairSegmentSegment(0, 1));
-  EXPECT_FALSE(vd::RepairSegmentSegment(0, 2));
-  EXPECT_FALSE(b.g.restartPending);
-  // The point on the interior is caught by the segment-point test.
-  EXPECT_TRUE(vd::RepairSegmentPoint(0, 5));
-}
-
-TEST(SegmentRepair, DuplicateSegmentsLoseTheHigherIndex) {
-  for (const bool reversed : {false, true}) {
-    Bare b({{0, 0}, {1, 0}, {0, 1}});
-    b.Seg(2, 3);
-    b.Seg(3, 4);
-    reversed ? b.Seg(3, 2) : b.Seg(2, 3);
-    b.Prepare();
-    ASSERT_TRUE(vd::RepairSegmentSegment(2, 0)) << reversed;
-    ASSERT_EQ(b.g.segments.count, 2);
-    EXPECT_EQ(b.g.segments[0].i1, 2);
-    EXPECT_EQ(b.g.segments[1].i1, 3);
-    EXPECT_EQ(b.g.segments[1].i2, 4);
+  g.restartPending = false;
+  std::istringstream calls(row().field(2));
+  for (std::string call; std::getline(calls, call, ';');) {
+    const std::vector<std::string> w = Words(call);
+    const int a = std::stoi(w.at(1)), b = w.at(2) == "=" || w.at(2) == "all" ? 0 : std::stoi(w[2]);
+    bool answer = false;
+    if (w[0] == "suspect") {
+      g.suspect = vd::SuspectPair{true, a, vd::PNT, b, vd::SEG};
+      continue;
+    }
+    if (w[0] == "sp") answer = vd::RepairSegmentPoint(a, b);
+    if (w[0] == "ss") answer = vd::RepairSegmentSegment(a, b);
+    if (w[0] == "input") answer = vd::RepairInput(a, vd::SEG, w[2] == "all");
+    EXPECT_EQ(answer, w.back() == "1") << call;
+  }
+  const Keys want(row().field(3));
+  if (want.has("segs")) {
+    const std::vector<std::string> ends = List(want.str("segs"));
+    ASSERT_EQ(g.segments.count, static_cast<std::int32_t>(ends.size()));
+    for (std::int32_t s = 0; s < g.segments.count; ++s) {
+      const std::string e = ends[s], i1 = e.substr(0, e.find('-')), i2 = e.substr(e.find('-') + 1);
+      EXPECT_TRUE(i1 == "*" || g.segments[s].i1 == std::stoi(i1)) << "segment " << s;
+      EXPECT_TRUE(i2 == "*" || g.segments[s].i2 == std::stoi(i2)) << "segment " << s;
+      EXPECT_TRUE(!want.has("tags") || g.segments[s].tag == want.num("tags")) << "segment " << s;
+    }
+  }
+  EXPECT_TRUE(!want.has("restart") || g.restartPending == (want.num("restart") != 0));
+  EXPECT_TRUE(!want.has("count") || g.points.count == want.num("count"));
+  EXPECT_TRUE(!want.has("inexact") || g.lineDataInexact);
+  EXPECT_TRUE(!want.has("suspect") || !g.suspect.set);
+  for (const auto& [key, value] : want.kv) {
+    if (key.rfind("point", 0) == 0 || key.rfind("ptag", 0) == 0) {
+      const vd::PointRecord& p = g.points[std::stoi(key.substr(key[1] == 'o' ? 5 : 4))];
+      const std::vector<double> v = Nums(value);
+      const auto near = [&](double a, double b) { return std::fabs(a - b) <= want.num("tol", 4 * DBL_EPSILON * std::fabs(b)); };
+      EXPECT_TRUE(key[1] == 't' ? p.tag == v.at(0) : near(p.x, v.at(0)) && near(p.y, v.at(1))) << key;
+    }
+  }
+  if (want.has("same")) {
+    const std::vector<double> v = Nums(want.str("same"));
+    EXPECT_EQ(g.points[int(v.at(0))].x, g.points[int(v.at(1))].x);
+    EXPECT_EQ(g.points[int(v.at(0))].y, g.points[int(v.at(1))].y);
   }
 }
 
-TEST(SegmentRepair, SuspectPairIsTestedFirstAndCleared) {
-  Bare b({{0, 0}, {1, 0}, {0.5, 5e-7}});
-  b.Seg(2, 3);
-  b.Prepare();
-  b.g.suspect = vd::SuspectPair{true, 4, vd::PNT, 0, vd::SEG};
-  EXPECT_TRUE(vd::RepairInput(0, vd::SEG, false));
-  EXPECT_FALSE(b.g.suspect.set);
-  EXPECT_EQ(b.g.segments.count, 2);
-}
-
-// ---- Whole computations on defective input.
-
-void StoreClosed(const std::vector<std::vector<Pt>>& contours) {
-  VD_Initialize();
-  VD_Reset();
-  for (const auto& c : contours) {
-    std::vector<std::int32_t> idx;
-    for (const Pt& p : c) idx.push_back(API_AddPoint(p.x, p.y, 1));
-    for (std::size_t i = 0; i < idx.size(); ++i) API_AddSegment(idx[i], idx[(i + 1) % idx.size()], 2);
-  }
-}
-
-bool Compute() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
-
-TEST(SegmentRepairComputation, CrossingContoursAreSplitAndComplete) {
-  // Two overlapping squares: eight crossings... of which the computation
-  // needs every one repaired to finish with a sound diagram.
-  StoreClosed({{{0, 0}, {2, 0}, {2, 2}, {0, 2}}, {{1, 1}, {3, 1.2}, {3.1, 3}, {0.9, 3.2}}});
-  ASSERT_TRUE(Compute());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_GT(VD_GetRestartCount(), 0);
-  // A star crossed by a long segment through its middle.
-  VD_Reset();
-  std::vector<std::int32_t> idx;
-  for (int i = 0; i < 12; ++i) {
-    const double a = 2 * M_PI * i / 12, r = i % 2 ? 1.0 : 0.5;
-    idx.push_back(API_AddPoint(r * std::cos(a), r * std::sin(a), 0));
-  }
-  for (int i = 0; i < 12; ++i) API_AddSegment(idx[i], idx[(i + 1) % 12], 0);
-  API_AddSegment(API_AddPoint(-2, 0.1, 0), API_AddPoint(2, -0.05, 0), 0);
-  ASSERT_TRUE(Compute());
-  EXPECT_EQ(FinalCheck(), "");
-}
-
-TEST(SegmentRepairComputation, NearDuplicatePointsAndPointsOnSegments) {
-  // Internal units: the square spans 1, so 1e-8 is far below the repair
-  // distance of 1e-6.
-  StoreClosed({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
-  API_AddPoint(0.5, 1e-8, 3);        // on the bottom edge
-  API_AddPoint(1 + 1e-8, 1 - 1e-8, 3);  // at a corner
-  API_AddPoint(0.25, 0.75, 3);       // an honest point inside
-  ASSERT_TRUE(Compute());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_GT(VD_GetRestartCount(), 0);
-}
-
-TEST(SegmentRepairComputation, DuplicateSegmentsInEitherOrientation) {
-  VD_Initialize();
-  VD_Reset();
-  const std::int32_t a = API_AddPoint(0, 0, 0), b = API_AddPoint(1, 0, 0), c = API_AddPoint(0.5, 1, 0);
-  API_AddSegment(a, b, 0);
-  API_AddSegment(b, c, 0);
-  API_AddSegment(c, a, 0);
-  API_AddSegment(b, a, 0);
-  API_AddSegment(c, b, 0);
-  ASSERT_TRUE(Compute());
-  EXPECT_EQ(FinalCheck(), "");
-  EXPECT_EQ(vd::Vd().segments.count, 3);
-}
+INSTANTIATE_TEST_SUITE_P(Data, SegmentRepair, RowsOf("segment_repair.txt"), RowName);
 
 }  // namespace
 }  // namespace zt::vdtest

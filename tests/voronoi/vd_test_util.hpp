@@ -4,11 +4,13 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
 #include <cstdint>
 #include <random>
 #include <string>
 #include <vector>
 
+#include "case_rows.hpp"
 #include "voronoi/detail/checker.hpp"
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/input_repair.hpp"
@@ -29,32 +31,61 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
   return pts;
 }
 
-// Tight clusters far apart: the nearest-point search must leave the grid.
-inline std::vector<Pt> ClusteredPoints(int n, std::uint32_t seed) {
-  std::mt19937 rng(seed);
-  std::uniform_real_distribution<double> u(0.0, 1000.0);
-  std::normal_distribution<double> spread(0.0, 0.01);
-  std::vector<Pt> centres(5);
-  for (Pt& c : centres) c = {u(rng), u(rng)};
-  std::vector<Pt> pts(n);
-  for (int i = 0; i < n; ++i) pts[i] = {centres[i % 5].x + spread(rng), centres[i % 5].y + spread(rng)};
-  return pts;
-}
-
-inline std::vector<Pt> LatticePoints(int side, double step = 1.0) {
+// The points of a generator list, parts separated by ';':
+//   points x y x y ...     the given points
+//   uniform n seed scale   UniformPoints
+//   clustered n seed       tight clusters far apart: the nearest-point search
+//                          must leave the grid
+//   lattice side step      a side x side lattice
+//   collinear n seed       points on one line
+//   dice n seed max        n points of integer coordinates 0 to max
+//   ring n r               n points evenly on the circle of radius r about the origin
+//   jitter seed k          moves every coordinate so far by up to k ulps
+inline std::vector<Pt> Generate(const std::string& list) {
   std::vector<Pt> pts;
-  for (int i = 0; i < side; ++i)
-    for (int j = 0; j < side; ++j) pts.push_back({i * step, j * step});
-  return pts;
-}
-
-inline std::vector<Pt> CollinearPoints(int n, std::uint32_t seed) {
-  std::mt19937 rng(seed);
-  std::uniform_int_distribution<int> u(0, 1 << 20);
-  std::vector<Pt> pts(n);
-  for (Pt& p : pts) {
-    const double t = u(rng);
-    p = {3.0 * t + 7.0, 2.0 * t - 5.0};
+  std::istringstream s(list);
+  for (std::string part; std::getline(s, part, ';');) {
+    const std::vector<std::string> w = Words(part);
+    std::vector<double> a;
+    for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
+    const int n = a.empty() ? 0 : static_cast<int>(a[0]);
+    std::mt19937 rng(a.size() > 1 ? static_cast<std::uint32_t>(a[1]) : 0);
+    if (w.empty()) continue;
+    if (w[0] == "points") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) pts.push_back({a[i], a[i + 1]});
+    } else if (w[0] == "uniform") {
+      const std::vector<Pt> more = UniformPoints(n, static_cast<std::uint32_t>(a.at(1)), a.at(2));
+      pts.insert(pts.end(), more.begin(), more.end());
+    } else if (w[0] == "clustered") {
+      std::uniform_real_distribution<double> u(0.0, 1000.0);
+      std::normal_distribution<double> spread(0.0, 0.01);
+      Pt centres[5];
+      for (Pt& c : centres) c = {u(rng), u(rng)};
+      for (int i = 0; i < n; ++i) pts.push_back({centres[i % 5].x + spread(rng), centres[i % 5].y + spread(rng)});
+    } else if (w[0] == "lattice") {
+      for (int i = 0; i < n; ++i)
+        for (int j = 0; j < n; ++j) pts.push_back({i * a.at(1), j * a.at(1)});
+    } else if (w[0] == "collinear") {
+      std::uniform_int_distribution<int> u(0, 1 << 20);
+      for (int i = 0; i < n; ++i) {
+        const double t = u(rng);
+        pts.push_back({3.0 * t + 7.0, 2.0 * t - 5.0});
+      }
+    } else if (w[0] == "dice") {
+      std::uniform_int_distribution<int> u(0, static_cast<int>(a.at(2)));
+      for (int i = 0; i < n; ++i) pts.push_back({double(u(rng)), double(u(rng))});
+    } else if (w[0] == "ring") {
+      for (int i = 0; i < n; ++i) pts.push_back({a[1] * std::cos(i * M_PI / (n / 2)), a[1] * std::sin(i * M_PI / (n / 2))});
+    } else if (w[0] == "jitter") {
+      std::mt19937 jitter(static_cast<std::uint32_t>(n));
+      std::uniform_int_distribution<int> ulp(-static_cast<int>(a.at(1)), static_cast<int>(a.at(1)));
+      for (Pt& p : pts) {
+        for (int k = ulp(jitter); k != 0; k += k > 0 ? -1 : 1) p.x = std::nextafter(p.x, k > 0 ? 10.0 : -10.0);
+        for (int k = ulp(jitter); k != 0; k += k > 0 ? -1 : 1) p.y = std::nextafter(p.y, k > 0 ? 10.0 : -10.0);
+      }
+    } else {
+      ADD_FAILURE() << "unknown generator " << w[0];
+    }
   }
   return pts;
 }
@@ -67,7 +98,24 @@ inline void Store(const std::vector<Pt>& pts) {
   for (std::size_t i = 0; i < pts.size(); ++i) API_AddPoint(pts[i].x, pts[i].y, static_cast<std::int32_t>(i));
 }
 
+using Contour = std::vector<Pt>;
+
+// Resets the engine and stores closed contours: each point once (tagged
+// `pointTag`), a segment from each to the next and back to the first
+// (tagged with the contour's number).
+inline void StoreContours(const std::vector<Contour>& contours, std::int32_t pointTag = -1) {
+  VD_Initialize();
+  VD_Reset();
+  for (std::size_t c = 0; c < contours.size(); ++c) {
+    std::vector<std::int32_t> idx;
+    for (const Pt& p : contours[c]) idx.push_back(API_AddPoint(p.x, p.y, pointTag));
+    for (std::size_t i = 0; i < idx.size(); ++i)
+      API_AddSegment(idx[i], idx[(i + 1) % idx.size()], static_cast<std::int32_t>(c));
+  }
+}
+
 inline bool ComputePoints() { return VD_ComputeDiagram(false, 1, true, false, 0, 0, 0.0, 0.0, true); }
+inline bool ComputeSegments() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
 
 // Runs the checker after every insertion (local emptiness) and in full
 // (brute force) at the end; the first failure is kept.
@@ -100,6 +148,38 @@ inline std::string FinalCheck(bool bruteForce = true) {
   o.bruteForce = bruteForce;
   o.complete = true;
   return vd::CheckDiagram(o);
+}
+
+// Computes the stored sites with the checker after insertions (every
+// `every`-th, each of the first `allUpTo`; none for 0) and in full at the
+// end: "" or the first error.
+inline std::string CheckedCompute(bool pointsOnly = true, int every = 1, bool bruteForce = true, int allUpTo = 0) {
+  CheckingObserver obs;
+  obs.every = every;
+  obs.allUpTo = allUpTo;
+  if (every > 0) obs.Attach();
+  if (!VD_ComputeDiagram(false, 1, pointsOnly, false, 0, 0, 0.0, 0.0, true)) return "not computed";
+  return obs.firstError.empty() ? FinalCheck(bruteForce) : obs.firstError;
+}
+
+// The computed diagram as numbers: every node (live, x, y, r) and edge
+// (n1, n2, lft, rgt).
+inline std::vector<double> Snapshot() {
+  std::vector<double> v;
+  for (std::int32_t i = 0; i < VD_GetNodeCount(); ++i) {
+    const VD_NodeInfo n = VD_GetNode(i);
+    v.insert(v.end(), {n.live ? 1.0 : 0.0, n.x, n.y, n.r});
+  }
+  for (std::int32_t i = 0; i < VD_GetEdgeCount(); ++i) {
+    const VD_EdgeInfo e = VD_GetEdge(i);
+    v.insert(v.end(), {double(e.n1), double(e.n2), double(e.lft), double(e.rgt)});
+  }
+  return v;
+}
+
+inline std::string CheckedRun(const std::vector<Pt>& pts) {
+  Store(pts);
+  return CheckedCompute();
 }
 
 }  // namespace zt::vdtest

@@ -1,0 +1,99 @@
+// Cases kept as rows of text files in tests/voronoi/data: one case a line,
+// fields split by '|', blank lines and lines starting with '#' skipped. The
+// first field names the case (letters, digits, '_'); gtest shows it when the
+// row fails. A file that cannot be read gives one failing row.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cmath>
+#include <cstdlib>
+#include <fstream>
+#include <map>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace zt::vdtest {
+
+struct Row {
+  std::string name, error;
+  std::vector<std::string> fields;  // after the name, trimmed
+  std::string field(std::size_t i) const { return i < fields.size() ? fields[i] : ""; }
+};
+
+inline std::string Trim(const std::string& s) {
+  const auto b = s.find_first_not_of(" \t\r"), e = s.find_last_not_of(" \t\r");
+  return b == std::string::npos ? "" : s.substr(b, e - b + 1);
+}
+
+inline std::vector<Row> ReadRows(const std::string& file) {
+  std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/" + file);
+  if (!in) return {Row{"UnreadableCaseFile", "cannot read " + file, {}}};
+  std::vector<Row> rows;
+  for (std::string line; std::getline(in, line);) {
+    if (Trim(line).empty() || Trim(line)[0] == '#') continue;
+    std::istringstream s(line);
+    Row r;
+    for (std::string f; std::getline(s, f, '|');) r.fields.push_back(Trim(f));
+    r.name = r.fields.front();
+    r.fields.erase(r.fields.begin());
+    rows.push_back(r);
+  }
+  return rows;
+}
+
+// A number as strtod reads it (nan, inf), or "sqrt(v)".
+inline double Num(const std::string& word) {
+  if (word.rfind("sqrt(", 0) == 0) return std::sqrt(std::strtod(word.c_str() + 5, nullptr));
+  return std::strtod(word.c_str(), nullptr);
+}
+
+inline std::vector<std::string> Words(const std::string& text) {
+  std::istringstream s(text);
+  std::vector<std::string> w;
+  for (std::string x; s >> x;) w.push_back(x);
+  return w;
+}
+
+// The words of a text separated by blanks or commas.
+inline std::vector<std::string> List(std::string text) {
+  std::replace(text.begin(), text.end(), ',', ' ');
+  return Words(text);
+}
+
+inline std::vector<double> Nums(const std::string& text) {
+  std::vector<double> v;
+  for (const std::string& w : List(text)) v.push_back(Num(w));
+  return v;
+}
+
+// The key=value words of a field.
+struct Keys {
+  std::map<std::string, std::string> kv;
+  explicit Keys(const std::string& text) {
+    for (const std::string& w : Words(text)) {
+      const auto eq = w.find('=');
+      kv[w.substr(0, eq)] = eq == std::string::npos ? "" : w.substr(eq + 1);
+    }
+  }
+  bool has(const std::string& k) const { return kv.count(k) != 0; }
+  double num(const std::string& k, double fallback = 0) const { return has(k) ? Num(kv.at(k)) : fallback; }
+  std::string str(const std::string& k) const { return has(k) ? kv.at(k) : ""; }
+};
+
+// gtest names a failing row by this.
+inline void PrintTo(const Row& r, std::ostream* os) { *os << r.name; }
+
+// The fixture of a row-driven suite: an unreadable file fails its row.
+class CaseRows : public testing::TestWithParam<Row> {
+ protected:
+  void SetUp() override { ASSERT_EQ(GetParam().error, ""); }
+  const Row& row() const { return GetParam(); }
+};
+
+inline auto RowsOf(const std::string& file) { return testing::ValuesIn(ReadRows(file)); }
+inline std::string RowName(const testing::TestParamInfo<Row>& info) { return info.param.name; }
+
+}  // namespace zt::vdtest

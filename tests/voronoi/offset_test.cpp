@@ -1,0 +1,327 @@
+// Offsets and the offset store: the request cases of data/offsets.txt;
+// refusals, isolated point circles, random points and polygons against
+// brute force; broken diagrams that must end the request instead of
+// looping; the store written to a file.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <fstream>
+#include <iterator>
+#include <random>
+
+#include "case_rows.hpp"
+#include "offset_check.hpp"
+#include "voronoi/detail/engine_state.hpp"
+
+namespace zt::vdtest {
+namespace {
+
+constexpr double kTol = 1e-9;
+
+// Whether the kinds of c are `pattern` repeated, from some rotation on.
+bool KindsFollow(const Curve& c, const std::string& pattern) {
+  for (std::size_t r = 0; r < pattern.size(); ++r) {
+    bool all = true;
+    for (std::size_t k = 0; k < c.elements.size(); ++k) all &= c.elements[k].kind == pattern[(k + r) % pattern.size()] - '0';
+    if (all) return true;
+  }
+  return false;
+}
+
+class OffsetCases : public CaseRows {};
+
+TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
+  const std::string sites = row().field(0);
+  const std::vector<std::string> request = Words(row().field(1));
+  const Keys want(row().field(2));
+  InputSites in;
+  if (sites.rfind("contour", 0) == 0) {
+    std::vector<Contour> cs;
+    std::istringstream s(sites);
+    for (std::string part; std::getline(s, part, ';');) {
+      const std::vector<double> v = Nums(Trim(part).substr(7));
+      cs.emplace_back();
+      for (std::size_t i = 0; i + 1 < v.size(); i += 2) cs.back().push_back({v[i], v[i + 1]});
+    }
+    StoreContours(cs);
+    in = SitesOf(cs);
+    ASSERT_TRUE(ComputeSegments());
+  } else {
+    in.points = Generate(sites);
+    Store(in.points);
+    ASSERT_TRUE(ComputePoints());
+  }
+  const int side = std::stoi(request.at(0));
+  const double maxUser = vd::Vd().maxOffset / vd::Vd().scale, step = Num(request.at(2));
+  const double t = Num(request.at(1)) * (request[1].ends_with("max") ? maxUser : 1.0);
+  ASSERT_EQ(VD_ComputeOffsets(side, t, step), want.num("ok", 1) != 0);
+  if (want.has("api")) {
+    EXPECT_EQ(API_ComputeOff(false, nullptr, false, false, t, step, false, false, false), want.num("ok", 1) != 0);
+  }
+  std::vector<Curve> curves = ReadStore();
+  std::erase_if(curves, [&](const Curve& c) { return want.has("below") && c.offset >= want.num("below"); });
+  if (want.has("curves")) {
+    const std::string n = want.str("curves");
+    EXPECT_TRUE(n.ends_with("+") ? curves.size() >= Num(n) : curves.size() == Num(n)) << curves.size();
+  }
+  const double tol = want.has("reltol") ? want.num("reltol") * Extent(in) : want.num("tol", kTol);
+  for (const Curve& c : curves) {
+    EXPECT_NEAR(step > 0 ? std::remainder(c.offset - t, step) : 0.0, 0.0, 1e-9) << c.offset;
+    EXPECT_EQ(CheckAtDistance(in, {c}, step > 0 ? c.offset : t, tol), "");
+    EXPECT_TRUE(!want.has("elements") || c.elements.size() == want.num("elements")) << c.elements.size();
+    EXPECT_TRUE(!want.has("kinds") || KindsFollow(c, want.str("kinds")));
+    for (std::size_t k = 0; k < c.elements.size(); ++k) {
+      const Element& e = c.elements[k];
+      EXPECT_TRUE(e.kind != 2 || !want.has("sweep") || std::fabs(Sweep(c, k) - want.num("sweep")) <= 1e-9) << k;
+      EXPECT_TRUE(e.kind != 0 || !want.has("segtag") || VD_GetSegmentTag(e.site) == want.num("segtag")) << k;
+    }
+  }
+  EXPECT_TRUE(in.contours.empty() || side == 3 || CheckSide(in.contours, curves, side == 1).empty());
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, OffsetCases, RowsOf("offsets.txt"), RowName);
+
+TEST(OffsetRequest, SideZeroSucceedsAndLeavesTheStoreAlone) {
+  Store({{0, 0}, {1, 0}, {0, 1}});
+  ASSERT_TRUE(ComputePoints());
+  EXPECT_TRUE(VD_ComputeOffsets(3, 0.1, 0.0));
+  const std::int32_t n = GetNumOffsetCurves();
+  EXPECT_GT(n, 0);
+  EXPECT_TRUE(VD_ComputeOffsets(0, 0.2, 0.0));
+  EXPECT_EQ(GetNumOffsetCurves(), n);
+  // Every request appends: the same request again doubles the store.
+  EXPECT_TRUE(VD_ComputeOffsets(3, 0.1, 0.0));
+  EXPECT_EQ(GetNumOffsetCurves(), 2 * n);
+  VD_Reset();
+  EXPECT_EQ(GetNumOffsetCurves(), 0);
+}
+
+TEST(OffsetRequest, StaleDiagramIsRefusedByTheFacadeAndFatalBelowIt) {
+  Store({{0, 0}, {1, 0}});
+  for (int side = 0; side <= 3; ++side) EXPECT_FALSE(VD_ComputeOffsets(side, 0.1, 0.0));
+  EXPECT_EXIT(API_ComputeOff(false, nullptr, false, false, 0.1, 0.0, false, false, false),
+              ::testing::ExitedWithCode(2), "error in API_ComputeOff: VD not known or not up-to-date!");
+}
+
+TEST(OffsetRequest, ZeroDistanceSelectsTheAutomaticOffsets) {
+  Store({{0, 0}, {10, 0}});
+  ASSERT_TRUE(ComputePoints());
+  const double scale = vd::Vd().scale;
+  ASSERT_TRUE(VD_ComputeOffsets(3, 0.0, 0.0));
+  ASSERT_GT(GetNumOffsetCurves(), 0);
+  double offset, second;
+  std::int32_t first, last;
+  ASSERT_TRUE(GetOffsetCurve(0, offset, first, last));
+  EXPECT_NEAR(offset, 0.001 / scale, 1e-15);
+  // The family steps by at least ten times t.
+  ASSERT_TRUE(GetOffsetCurve(2, second, first, last));
+  EXPECT_GE(second - offset, 10 * offset - 1e-12);
+}
+
+TEST(OffsetReadOut, IndicesOutsideTheStoreAreRefused) {
+  Store({{0, 0}});
+  ASSERT_TRUE(ComputePoints());
+  double offset = 7, x = 7, y = 7;
+  std::int32_t first = 7, last = 7, kind = 7, site = 7, tag = 7;
+  EXPECT_FALSE(GetOffsetCurve(0, offset, first, last));
+  EXPECT_FALSE(GetOffsetCurve(-1, offset, first, last));
+  EXPECT_FALSE(GetOffsetElement(0, kind, site, x, y, tag));
+  EXPECT_EQ(first, 7);
+  EXPECT_TRUE(PointsCoincide({0, 0}, {1e-6, 0}));
+  EXPECT_FALSE(PointsCoincide({0, 0}, {1e-6, 1e-7}));
+}
+
+// A lone point has no extent: the frame around it, and with it the maximal
+// offset, is tiny in user units.
+TEST(IsolatedPoints, SinglePointGivesCirclesOfTwoHalves) {
+  Store({{3, 4}});
+  ASSERT_TRUE(ComputePoints());
+  const double t = vd::Vd().maxOffset / vd::Vd().scale / 4;
+  ASSERT_TRUE(VD_ComputeOffsets(3, t, 0.0));
+  const auto curves = ReadStore();
+  ASSERT_EQ(curves.size(), 1u);
+  const Curve& c = curves[0];
+  EXPECT_NEAR(c.offset, t, 1e-12 * t);
+  ASSERT_EQ(c.elements.size(), 2u);
+  for (const Element& e : c.elements) {
+    EXPECT_EQ(e.kind, 2);
+    EXPECT_EQ(e.site, 2);
+    EXPECT_EQ(VD_GetPointTag(e.site), 0);
+  }
+  EXPECT_NEAR(c.elements[0].start.x, 3 + c.offset, 1e-12);
+  EXPECT_NEAR(c.elements[1].start.x, 3 - c.offset, 1e-12);
+  EXPECT_NEAR(c.elements[0].start.y, 4, 1e-12);
+  // The tag read-out of the element is always -1.
+  std::int32_t kind, site, tag = 0;
+  double x, y;
+  GetOffsetElement(0, kind, site, x, y, tag);
+  EXPECT_EQ(tag, -1);
+}
+
+// Random points at distances where the circles overlap: the traced curves
+// are made of arcs at distance t from their nearest point.
+TEST(TracedOffsets, RandomPointsAgainstBruteForce) {
+  for (std::uint32_t seed = 1; seed <= 12; ++seed) {
+    const auto pts = UniformPoints(60, seed, 100.0);
+    for (const double t : {2.0, 5.0, 9.0, 20.0}) {
+      Store(pts);
+      ASSERT_TRUE(ComputePoints());
+      ASSERT_TRUE(VD_ComputeOffsets(3, t, 0.0)) << "seed " << seed << " t " << t;
+      const auto curves = ReadStore();
+      ASSERT_FALSE(curves.empty());
+      EXPECT_EQ(CheckAtDistance(InputSites{pts, {}, {}}, curves, t, kTol * 100.0), "") << "seed " << seed << " t " << t;
+    }
+  }
+}
+
+// Every distance of a family is traced: the curve count never drops to zero
+// before the points' circles have all merged, and offsets rise by d.
+TEST(TracedOffsets, FamilyOfDistances) {
+  const auto pts = UniformPoints(30, 7, 10.0);
+  Store(pts);
+  ASSERT_TRUE(ComputePoints());
+  ASSERT_TRUE(VD_ComputeOffsets(3, 0.5, 0.5));
+  const auto curves = ReadStore();
+  for (const auto& c : curves) EXPECT_NEAR(c.offset / 0.5, std::round(c.offset / 0.5), 1e-9);
+  for (const double t : {0.5, 1.0, 3.0}) {
+    std::vector<Curve> at;
+    for (const auto& c : curves)
+      if (std::fabs(c.offset - t) < 1e-9) at.push_back(c);
+    EXPECT_FALSE(at.empty()) << t;
+    EXPECT_EQ(CheckAtDistance(InputSites{pts, {}, {}}, at, t, 1e-7), "") << t;
+  }
+}
+
+// The edges that a request at distance 1.5 crosses on a diagram of 40
+// random points, after one good request.
+std::vector<std::int32_t> CrossedEdgesOfAGoodRequest() {
+  Store(UniformPoints(40, 5, 10.0));
+  EXPECT_TRUE(ComputePoints());
+  EXPECT_TRUE(VD_ComputeOffsets(3, 1.5, 0.0));
+  EXPECT_GT(GetNumOffsetCurves(), 0);
+  const vd::Engine& g = vd::Vd();
+  std::vector<std::int32_t> crossed;
+  for (std::int32_t e = 4; e < g.edges.count; ++e) {
+    const auto& r = g.edges[e];
+    const double r1 = g.nodes[r.n1].r, r2 = g.nodes[r.n2].r, t = 1.5 * g.scale;
+    if (!r.deleted && std::fmin(r1, r2) <= t && t < std::fmax(r1, r2)) crossed.push_back(e);
+  }
+  return crossed;
+}
+
+// A diagram whose neighbour fields lead the walk astray: an edge crossed at
+// this distance becomes everybody's neighbour, and the request fails
+// instead of tracing forever.
+TEST(TracedOffsets, BrokenDiagramEndsTheRequestWithFailure) {
+  const std::vector<std::int32_t> crossed = CrossedEdgesOfAGoodRequest();
+  ASSERT_FALSE(crossed.empty());
+  vd::Engine& g = vd::Vd();
+  for (std::int32_t e = 4; e < g.edges.count; ++e) g.edges[e].s_ccw = g.edges[e].e_ccw = crossed[0];
+  EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
+}
+
+// Every crossed edge but the first (where the sweep starts) turns back onto
+// itself: the walk comes back to an edge it has already crossed.
+TEST(TracedOffsets, WalkBackOntoACrossedEdgeEndsTheRequestWithFailure) {
+  const std::vector<std::int32_t> crossed = CrossedEdgesOfAGoodRequest();
+  const std::int32_t before = GetNumOffsetCurves();
+  for (std::size_t i = 1; i < crossed.size(); ++i) vd::Vd().edges[crossed[i]].s_ccw = vd::Vd().edges[crossed[i]].e_ccw = crossed[i];
+  EXPECT_FALSE(VD_ComputeOffsets(3, 1.5, 0.0));
+  // The failed curve leaves nothing behind; the circles of the request stay.
+  std::int32_t kind, site, tag, f, l;
+  double x, y, offset;
+  for (std::int32_t i = before; i < GetNumOffsetCurves(); ++i) {
+    ASSERT_TRUE(GetOffsetCurve(i, offset, f, l));
+    EXPECT_TRUE(GetOffsetElement(l, kind, site, x, y, tag));
+  }
+  EXPECT_FALSE(GetOffsetElement(vd::Vd().offsetElements.count, kind, site, x, y, tag));
+}
+
+// Stores contours (and loose points tagged from 100), computes, requests
+// and checks the curves against brute force; inside and outside requests
+// of contours alone also keep their side.
+void ExpectOffsetsOf(const std::vector<Contour>& cs, const std::vector<Pt>& loose, int side, double t,
+                     bool someCurve, const std::string& what) {
+  StoreContours(cs);
+  InputSites in = SitesOf(cs);
+  for (std::size_t k = 0; k < loose.size(); ++k) API_AddPoint(loose[k].x, loose[k].y, 100 + static_cast<int>(k));
+  in.points.insert(in.points.end(), loose.begin(), loose.end());
+  ASSERT_TRUE(ComputeSegments()) << what;
+  ASSERT_TRUE(VD_ComputeOffsets(side, t, 0.0)) << what;
+  const auto curves = ReadStore();
+  ASSERT_TRUE(!someCurve || !curves.empty()) << what;
+  ASSERT_EQ(CheckAtDistance(in, curves, t, 1e-9 * Extent(in)), "") << what;
+  ASSERT_TRUE(side == 3 || !loose.empty() || CheckSide(cs, curves, side == 1).empty()) << what;
+}
+
+// Necks at random places and depths, with distances below, near and above
+// half the neck's width.
+TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
+  std::mt19937 rng(17);
+  std::uniform_real_distribution<double> ux(-5, 10), uy(0.3, 3.6), ut(0.2, 2.2), uw(0.3, 3);
+  for (int trial = 0; trial < 60; ++trial) {
+    const double x = ux(rng), y = uy(rng), w = uw(rng), t = ut(rng);
+    ExpectOffsetsOf({{{-10, 0}, {14, 0}, {14, 4}, {x + w, 4}, {x, y}, {x - w, 4}, {-10, 4}}}, {}, 1, t, t < 2.0,
+                    "trial " + std::to_string(trial));
+  }
+}
+
+// Random outer contours with star-shaped holes; inside, outside and both.
+TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
+  std::mt19937 rng(11);
+  for (int trial = 0; trial < 200; ++trial) {
+    std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 8 + trial % 40, false)};
+    const int holes = trial % 4;
+    for (int h = 0; h < holes; ++h) {
+      const double a = 2 * std::numbers::pi * h / std::max(holes, 1);
+      const double off = holes == 1 ? 0.0 : 35.0;
+      cs.push_back(Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
+    }
+    const int side = 1 + trial % 3;
+    std::uniform_real_distribution<double> td(0.5, 12.0);
+    const double t = td(rng);
+    ExpectOffsetsOf(cs, {}, side, t, side != 3, "trial " + std::to_string(trial) + " side " + std::to_string(side));
+  }
+}
+
+// Loose points inside a pocket: their circles (both sides) and the curves
+// where circles meet the walls' offsets, against brute force.
+TEST(PolygonOffsets, PocketWithLoosePointsAgainstBruteForce) {
+  std::mt19937 rng(5);
+  for (int trial = 0; trial < 30; ++trial) {
+    const std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 12 + trial, false)};
+    std::uniform_real_distribution<double> u(-40, 40);
+    std::vector<Pt> loose;
+    for (int k = 0; k < 1 + trial % 6; ++k) {
+      const double x = u(rng);
+      loose.push_back({x, u(rng)});
+    }
+    ExpectOffsetsOf(cs, loose, 1 + trial % 3, 2.0 + trial % 7 * 1.5, false, "trial " + std::to_string(trial));
+  }
+}
+
+// A request that asks for a file writes the whole store there.
+TEST(PolygonOffsets, RequestedFileHoldsTheStore) {
+  StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
+  ASSERT_TRUE(ComputeSegments());
+  const std::string text = testing::TempDir() + "zt_offsets.txt";
+  ASSERT_TRUE(API_ComputeOff(false, text.c_str(), true, false, 0.1, 0.0, false, true, false));
+  std::ifstream in(text);
+  std::string line;
+  std::getline(in, line);
+  EXPECT_EQ(line, "curve 0.10000000000000001");
+  int elements = 0;
+  while (std::getline(in, line)) ++elements;
+  EXPECT_EQ(elements, 4);
+  const std::string dxf = testing::TempDir() + "zt_offsets.dxf";
+  ASSERT_TRUE(API_ComputeOff(false, dxf.c_str(), true, true, 0.1, 0.0, false, false, true));
+  std::ifstream din(dxf);
+  const std::string all((std::istreambuf_iterator<char>(din)), std::istreambuf_iterator<char>());
+  EXPECT_NE(all.find("ARC"), std::string::npos);
+  EXPECT_NE(all.find("EOF"), std::string::npos);
+  // A file that cannot be written fails the request.
+  EXPECT_FALSE(API_ComputeOff(false, "/nonexistent/dir/x.txt", true, false, 0.1, 0.0, false, true, false));
+}
+
+}  // namespace
+}  // namespace zt::vdtest

@@ -1,0 +1,81 @@
+// zonetool voronoi and zonetool offset as subprocesses: the cases of
+// data/zonetool.txt (exit status, exact or partial output: curves, the raw
+// offset store, messages) and the figures of a printed diagram.
+#include <gtest/gtest.h>
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <fstream>
+#include <sstream>
+#include <string>
+
+#include "case_rows.hpp"
+#include "support/subprocess.hpp"
+
+namespace zt::vdtest {
+namespace {
+
+using ToolRun = test::CommandRun;
+
+std::string Unescape(const std::string& s) {
+  std::string out;
+  for (std::size_t i = 0; i < s.size(); ++i) {
+    const bool escape = s[i] == '\\' && i + 1 < s.size() && s[i + 1] == 'n';
+    out += escape ? '\n' : s[i];
+    i += escape;
+  }
+  return out;
+}
+
+// Runs `zonetool <subcommand> <input file> <args>`; one input file per test
+// and process, as ctest runs the cases side by side.
+ToolRun Zonetool(const std::string& subcommand, const std::string& text, const std::string& args = "") {
+  std::string name = testing::UnitTest::GetInstance()->current_test_info()->name();
+  std::replace(name.begin(), name.end(), '/', '_');
+  std::ostringstream file, command;
+  file << testing::TempDir() << "zt_" << subcommand << "_" << name << "_" << getpid() << ".txt";
+  std::ofstream(file.str()) << text;
+  command << test::zonetool_path() << " " << subcommand << " " << file.str() << " " << args << " 2>&1";
+  return test::run_command(command.str());
+}
+
+class ZonetoolCases : public CaseRows {};
+
+TEST_P(ZonetoolCases, AnswerWithTheirStatusAndOutput) {
+  const std::string command = row().field(0), want = row().field(3);
+  const std::string subcommand = command.substr(0, command.find(' '));
+  const ToolRun r = Zonetool(subcommand, Unescape(row().field(1)), command.substr(subcommand.size()));
+  EXPECT_EQ(r.status, std::stoi(row().field(2))) << r.out;
+  const std::string text = want.empty() ? "" : Unescape(Trim(want.substr(1)));
+  EXPECT_TRUE(want.empty() || want[0] != '=' || r.out == text) << r.out;
+  EXPECT_TRUE(want.empty() || want[0] != '~' || r.out.find(text) != std::string::npos) << r.out;
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, ZonetoolCases, RowsOf("zonetool.txt"), RowName);
+
+TEST(ZonetoolVoronoi, PrintsNodesEdgesAndFigures) {
+  const ToolRun r = Zonetool("voronoi", "# a triangle\np 0 0\np 4 0\n\np 0 3\n");
+  ASSERT_EQ(r.status, 0) << r.out;
+  std::istringstream in(r.out);
+  int nodes = 0, edges = 0;
+  bool circumcentre = false;
+  std::string line, last;
+  while (std::getline(in, line)) {
+    last = line;
+    nodes += line.rfind("node ", 0) == 0;
+    edges += line.rfind("edge ", 0) == 0;
+    // The circumcentre of the right triangle: the hypotenuse's midpoint.
+    circumcentre |= line.find(" 2 1.5 2.5") != std::string::npos;
+  }
+  EXPECT_TRUE(circumcentre) << r.out;
+  EXPECT_EQ(last, "restarts 0 recovery 0");
+  // Euler with 7 sites (three points, four corners) and the outer face.
+  EXPECT_EQ(nodes - edges + 8, 2);
+  // An edge between points 0 and 1, in one direction or the other.
+  EXPECT_TRUE(r.out.find(" 0 2 1 2\n") != std::string::npos || r.out.find(" 1 2 0 2\n") != std::string::npos)
+      << r.out;
+}
+
+}  // namespace
+}  // namespace zt::vdtest
