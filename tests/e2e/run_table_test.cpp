@@ -6,18 +6,24 @@
 #include <gtest/gtest.h>
 
 #include "e2e/e2e_support.hpp"
-#include "support/data_table.hpp"
+#include "support/case_rows.hpp"
 
 namespace zt::e2e {
 namespace {
 
-using test::Row;
-using test::split_fields;
-using test::unescape;
+using test::Unescape;
+
+// The trimmed parts of `s` between `sep`.
+std::vector<std::string> split(const std::string& s, char sep) {
+  std::istringstream in(s);
+  std::vector<std::string> out;
+  for (std::string part; std::getline(in, part, sep);) out.push_back(test::Trim(part));
+  return out;
+}
 
 std::vector<float> numbers(const std::string& list, char sep) {
   std::vector<float> out;
-  for (const std::string& n : split_fields(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
+  for (const std::string& n : split(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
   return out;
 }
 
@@ -28,12 +34,12 @@ Bytes recipe(const std::string& r, Bytes old) {
   if (kind == "rest") return rest(numbers(arg, ','));
   if (kind == "none") return {};
   if (kind == "text") {
-    const std::string t = unescape(arg);
+    const std::string t = Unescape(arg);
     return Bytes(t.begin(), t.end());
   }
   if (kind == "raw") {
     std::vector<Bytes> recs;
-    for (const std::string& x : split_fields(arg, ','))
+    for (const std::string& x : split(arg, ','))
       recs.push_back(x == "sep" ? test::separator() : Bytes(std::stoul(x), 0));
     return test::record_file(recs);
   }
@@ -48,9 +54,9 @@ Bytes recipe(const std::string& r, Bytes old) {
     return old;
   }
   std::vector<Contour> contours;  // Z@X,Y;X,Y/...
-  for (const std::string& c : split_fields(r, '/')) {
+  for (const std::string& c : split(r, '/')) {
     contours.push_back({std::strtof(c.c_str(), nullptr), {}});
-    for (const std::string& p : split_fields(c.substr(c.find('@') + 1), ';')) {
+    for (const std::string& p : split(c.substr(c.find('@') + 1), ';')) {
       const std::vector<float> xy = numbers(p, ',');
       contours.back().points.push_back({xy.at(0), xy.at(1)});
     }
@@ -59,7 +65,7 @@ Bytes recipe(const std::string& r, Bytes old) {
 }
 
 void set_up(ProgramRun& r, const std::string& setup) {
-  for (const std::string& step : split_fields(setup, ' ')) {
+  for (const std::string& step : split(setup, ' ')) {
     if (step.empty()) continue;
     if (step == "params" || step == "usual") r.parameters();
     if (step == "usual") {
@@ -81,8 +87,8 @@ void set_up(ProgramRun& r, const std::string& setup) {
 void check(const ProgramRun& r, const std::vector<Contour>& zones, const std::string& c) {
   SCOPED_TRACE(c);
   const std::string arg = c.substr(c.find(' ') + 1);
-  if (c.rfind("out=", 0) == 0) EXPECT_EQ(r.out, unescape(c.substr(4)));
-  else if (c.rfind("out~", 0) == 0) EXPECT_NE(r.out.find(unescape(c.substr(4))), std::string::npos) << r.out;
+  if (c.rfind("out=", 0) == 0) EXPECT_EQ(r.out, Unescape(c.substr(4)));
+  else if (c.rfind("out~", 0) == 0) EXPECT_NE(r.out.find(Unescape(c.substr(4))), std::string::npos) << r.out;
   else if (c.rfind("err~", 0) == 0) EXPECT_NE(r.err.find(c.substr(4)), std::string::npos) << r.err;
   else if (c == "banner") EXPECT_EQ(r.out.rfind(banner_and_scale(), 0), 0u) << r.out;
   else if (c == "no stars") EXPECT_EQ(r.out.find('*'), std::string::npos) << r.out;
@@ -105,12 +111,11 @@ void check(const ProgramRun& r, const std::vector<Contour>& zones, const std::st
 }
 
 // NAME | SETUP | END | CHECKS
-class RunTable : public ::testing::TestWithParam<Row> {};
+class RunTable : public test::CaseRows {};
 
 TEST_P(RunTable, EndsAsListed) {
-  const Row& c = GetParam();
   ProgramRun r;
-  set_up(r, c[1]);
+  set_up(r, row().field(0));
   const int status = r.run();
   ASSERT_NE(status, kTimedOut) << "hang";
   ASSERT_LT(status, 128) << "killed by signal " << status - 128;
@@ -131,7 +136,7 @@ TEST_P(RunTable, EndsAsListed) {
     EXPECT_FALSE(r.has("stock2.bin"));
     EXPECT_TRUE(!r.messages().empty() || !r.err.empty()) << "stopped without a message";
   }
-  const std::string how = c[2].substr(0, c[2].find(' ')), detail = c[2].substr(c[2].find(' ') + 1);
+  const std::string end = row().field(1), how = end.substr(0, end.find(' ')), detail = end.substr(end.find(' ') + 1);
   if (how == "fault") {
     EXPECT_EQ(status, std::stoi(detail)) << r.err;
     EXPECT_FALSE(normal);
@@ -147,11 +152,11 @@ TEST_P(RunTable, EndsAsListed) {
     ASSERT_EQ(how, "either");
     EXPECT_TRUE(status == 0 || (status >= 1 && status <= 2) || status == 255) << status;
   }
-  for (const std::string& one : split_fields(c[3], ';'))
+  for (const std::string& one : split(row().field(2), ';'))
     if (!one.empty()) check(r, zones, one);
 }
 
-INSTANTIATE_TEST_SUITE_P(Runs, RunTable, ::testing::ValuesIn(test::read_table("runs.txt", 4)), test::row_name);
+INSTANTIATE_TEST_SUITE_P(Runs, RunTable, test::RowsOf("runs.txt"), test::RowName);
 
 }  // namespace
 }  // namespace zt::e2e

@@ -2,7 +2,7 @@
 // bytes, messages and exit statuses.
 #include <gtest/gtest.h>
 
-#include "support/data_table.hpp"
+#include "support/case_rows.hpp"
 #include "support/scratch_dir.hpp"
 #include "support/subprocess.hpp"
 
@@ -15,27 +15,26 @@ void expect_stream(const std::string& got, const std::string& want, const char* 
   if (want.starts_with('~')) {
     EXPECT_NE(got.find(want.substr(1)), std::string::npos) << which << got;
   } else if (want != "*") {
-    EXPECT_EQ(got, want.starts_with('@') ? read_text(kData + "/" + want.substr(1)) : unescape(want)) << which;
+    EXPECT_EQ(got, want.starts_with('@') ? read_text(kData + "/" + want.substr(1)) : Unescape(want)) << which;
   }
 }
 
-class ZonetoolRuns : public ::testing::TestWithParam<Row> {};
+class ZonetoolRuns : public CaseRows {};
 
 TEST_P(ZonetoolRuns, AsListed) {
-  const Row& row = GetParam();
   ScratchDir dir;
-  write_text(dir.file("in"), unescape(row[2]));
-  std::string args = row[1];
+  write_text(dir.file("in"), Unescape(row().field(1)));
+  std::string args = row().field(0);
   for (std::size_t at; (at = args.find("$D")) != std::string::npos;) args.replace(at, 2, kData);
   for (std::size_t at; (at = args.find("$T")) != std::string::npos;) args.replace(at, 2, dir.path().string());
   const CommandRun r =
       run_command(zonetool_path() + " " + args + " <'" + dir.file("in") + "' 2>'" + dir.file("err") + "'");
-  EXPECT_EQ(r.status, std::stoi(row[3]));
-  expect_stream(r.out, row[4], "standard output");
-  expect_stream(read_text(dir.file("err")), row[5], "standard error");
+  EXPECT_EQ(r.status, std::stoi(row().field(2)));
+  expect_stream(r.out, row().field(3), "standard output");
+  expect_stream(read_text(dir.file("err")), row().field(4), "standard error");
 }
 
-INSTANTIATE_TEST_SUITE_P(Rows, ZonetoolRuns, ::testing::ValuesIn(read_table("zonetool.txt", 6)), row_name);
+INSTANTIATE_TEST_SUITE_P(Rows, ZonetoolRuns, RowsOf("zonetool.txt"), RowName);
 
 }  // namespace
 }  // namespace zt::test

@@ -10,7 +10,7 @@
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
 #include "regions/detail/output_collector.hpp"
-#include "support/data_table.hpp"
+#include "support/case_rows.hpp"
 
 namespace zt::detail {
 namespace {
@@ -31,11 +31,10 @@ double value(const std::string& t) {
 }
 Point2d point(const std::string& t) { return {value(t.substr(0, t.find(','))), value(t.substr(t.find(',') + 1))}; }
 
-class OverlayRoutines : public ::testing::TestWithParam<test::Row> {};
+class OverlayRoutines : public test::CaseRows {};
 
 TEST_P(OverlayRoutines, AsListed) {
-  const std::vector<std::string> call = test::split_fields(GetParam()[1], ' ');
-  const std::vector<std::string> want = test::split_fields(GetParam()[2], ' ');
+  const std::vector<std::string> call = test::Words(row().field(0)), want = test::Words(row().field(1));
   if (call[0] == "segment") {
     Point2d r1{-9, -9}, r2{-9, -9};
     SegmentDirection a, b;
@@ -54,8 +53,7 @@ TEST_P(OverlayRoutines, AsListed) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Rows, OverlayRoutines, ::testing::ValuesIn(test::read_table("overlay.txt", 3)),
-                         test::row_name);
+INSTANTIATE_TEST_SUITE_P(Rows, OverlayRoutines, test::RowsOf("overlay.txt"), test::RowName);
 
 // Nearly parallel crossings near an end: the point found always lies on the
 // first segment (its parameter held to 0..1), never off both edges.

@@ -6,7 +6,7 @@
 
 #include <cmath>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "vd_test_util.hpp"
 
 namespace zt::vdtest {

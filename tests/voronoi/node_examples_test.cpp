@@ -4,7 +4,7 @@
 
 #include <map>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 

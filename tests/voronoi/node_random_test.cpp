@@ -10,7 +10,7 @@
 #include <sstream>
 #include <string>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 

@@ -9,7 +9,7 @@
 #include <iterator>
 #include <random>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "offset_check.hpp"
 #include "voronoi/detail/engine_state.hpp"
 

@@ -7,7 +7,7 @@
 #include <algorithm>
 #include <cmath>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 
 namespace zt::vd::geo {
 namespace {

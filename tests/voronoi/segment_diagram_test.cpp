@@ -8,7 +8,7 @@
 #include <random>
 #include <vector>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "vd_test_util.hpp"
 #include "voronoi/detail/segment_checks.hpp"
 

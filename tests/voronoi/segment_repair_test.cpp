@@ -7,7 +7,7 @@
 #include <cmath>
 #include <vector>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "vd_test_util.hpp"
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/preprocess.hpp"

@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "voronoi/detail/checker.hpp"
 #include "voronoi/detail/compute_vd.hpp"
 #include "voronoi/detail/input_repair.hpp"

@@ -10,7 +10,7 @@
 #include <sstream>
 #include <string>
 
-#include "case_rows.hpp"
+#include "support/case_rows.hpp"
 #include "support/subprocess.hpp"
 
 namespace zt::vdtest {

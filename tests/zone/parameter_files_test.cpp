@@ -4,7 +4,7 @@
 
 #include <gtest/gtest.h>
 
-#include "support/data_table.hpp"
+#include "support/case_rows.hpp"
 #include "zone_test_support.hpp"
 
 namespace zt::testing {
@@ -13,21 +13,21 @@ namespace {
 class ParameterFiles : public ZoneTmpTest, public ::testing::WithParamInterface<test::Row> {};
 
 TEST_P(ParameterFiles, ValueAsListed) {
-  const test::Row& row = GetParam();
-  write_file(row[1], test::unescape(row[2]));
-  if (row[1] == "zstock.ok") {
+  ASSERT_EQ(GetParam().error, "");
+  const std::string file = GetParam().field(0), value = GetParam().field(2);
+  write_file(file, test::Unescape(GetParam().field(1)));
+  if (file == "zstock.ok") {
     double d = 1.0;
-    read_offset_distance(path(row[1]).c_str(), d);
-    EXPECT_EQ(d, std::strtod(row[3].c_str(), nullptr));
+    read_offset_distance(path(file).c_str(), d);
+    EXPECT_EQ(d, std::strtod(value.c_str(), nullptr));
   } else {
     float r = 10.0f;
-    EXPECT_EQ(read_merge_radius(path(row[1]).c_str(), r), 0);
-    EXPECT_EQ(r, std::strtof(row[3].c_str(), nullptr));
+    EXPECT_EQ(read_merge_radius(path(file).c_str(), r), 0);
+    EXPECT_EQ(r, std::strtof(value.c_str(), nullptr));
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Rows, ParameterFiles,
-                         ::testing::ValuesIn(test::read_table("parameter_files.txt", 4)), test::row_name);
+INSTANTIATE_TEST_SUITE_P(Rows, ParameterFiles, test::RowsOf("parameter_files.txt"), test::RowName);
 
 TEST_F(ZoneTmpTest, MissingParameterFilesChangeNothing) {
   double d = 1.0;

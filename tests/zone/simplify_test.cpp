@@ -11,7 +11,7 @@
 #include <string>
 #include <vector>
 
-#include "support/data_table.hpp"
+#include "support/case_rows.hpp"
 
 namespace zt {
 namespace {
@@ -149,7 +149,6 @@ std::vector<Point2d> run_polyline(const std::vector<Point2d>& p, double tol) {
   return {out.begin(), out.end()};
 }
 
-
 // "x,y x,y ..."; a number ending in '+' is the next double above it.
 std::vector<Point2d> points(const std::string& field) {
   auto num = [](std::string s) {
@@ -159,27 +158,27 @@ std::vector<Point2d> points(const std::string& field) {
     return up ? std::nextafter(v, INFINITY) : v;
   };
   std::vector<Point2d> out;
-  for (const std::string& p : test::split_fields(field, ' '))
+  for (const std::string& p : test::Words(field))
     out.push_back({num(p.substr(0, p.find(','))), num(p.substr(p.find(',') + 1))});
   return out;
 }
 
-class SimplifyExact : public ::testing::TestWithParam<test::Row> {};
+class SimplifyExact : public test::CaseRows {};
 
 // "x,y,tag ..." with S for a separator.
 void tagged(const std::string& field, TaggedPointList& l) {
-  for (const std::string& p : test::split_fields(field, ' ')) {
-    const std::vector<double> v = test::numbers(p, ',');
+  for (const std::string& p : test::Words(field)) {
+    const std::vector<double> v = test::Nums(p);
     l.Add(p == "S" ? TaggedPoint::separator() : TaggedPoint(static_cast<std::int32_t>(v.at(2)), v.at(0), v.at(1)));
   }
 }
 
 TEST_P(SimplifyExact, KeepsTheListedPoints) {
-  const test::Row& row = GetParam();
-  if (row[1] == "lists") {
+  const std::string form = row().field(0), input = row().field(1), kept = row().field(2);
+  if (form == "lists") {
     TaggedPointList in, out, want;
-    tagged(row[2], in);
-    tagged(row[3], want);
+    tagged(input, in);
+    tagged(kept, want);
     out.Add({5, 1, 1});
     simplify_polylines(in, out, 0.005);
     ASSERT_EQ(out.count(), want.count());
@@ -187,14 +186,13 @@ TEST_P(SimplifyExact, KeepsTheListedPoints) {
       EXPECT_TRUE(out[k].tag == want[k].tag && out[k].x == want[k].x && out[k].y == want[k].y) << k;
     return;
   }
-  const std::vector<double> a = test::numbers(row[1].substr(row[1].find(' ')));
-  const std::vector<Point2d> in = points(row[2]);
-  const bool vector = row[1].rfind("vector", 0) == 0;
-  EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(row[3])));
+  const std::vector<double> a = test::Nums(form.substr(form.find(' ')));
+  const std::vector<Point2d> in = points(input);
+  const bool vector = form.rfind("vector", 0) == 0;
+  EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(kept)));
 }
 
-INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, ::testing::ValuesIn(test::read_table("simplify.txt", 4)),
-                         test::row_name);
+INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, test::RowsOf("simplify.txt"), test::RowName);
 
 TEST(PolylineSimplifier, AppendsWithoutClearAndOwnsItsResultList) {
   PolylineSimplifier ps;

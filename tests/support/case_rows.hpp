@@ -1,7 +1,8 @@
-// Cases kept as rows of text files in tests/voronoi/data: one case a line,
-// fields split by '|', blank lines and lines starting with '#' skipped. The
-// first field names the case (letters, digits, '_'); gtest shows it when the
-// row fails. A file that cannot be read gives one failing row.
+// Tests kept as data: rows of text files in the suite's data folder
+// (ZT_TEST_DATA_DIR), one case a line, fields split by '|', blank lines and
+// lines starting with '#' skipped. The first field names the case (letters,
+// digits, '_'); gtest shows it when the row fails. A file that cannot be
+// read gives one failing row.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -15,7 +16,7 @@
 #include <string>
 #include <vector>
 
-namespace zt::vdtest {
+namespace zt::test {
 
 struct Row {
   std::string name, error;
@@ -44,10 +45,17 @@ inline std::vector<Row> ReadRows(const std::string& file) {
   return rows;
 }
 
-// A number as strtod reads it (nan, inf), or "sqrt(v)".
+// A number as strtod reads it (nan, inf, hexadecimal), a sum of such
+// numbers written without blanks ("1+1e-8"), or "sqrt(v)".
 inline double Num(const std::string& word) {
   if (word.rfind("sqrt(", 0) == 0) return std::sqrt(std::strtod(word.c_str() + 5, nullptr));
-  return std::strtod(word.c_str(), nullptr);
+  double sum = 0;
+  char* end = nullptr;
+  for (const char* s = word.c_str(); *s; s = end) {
+    sum += std::strtod(s, &end);
+    if (end == s) break;
+  }
+  return sum;
 }
 
 inline std::vector<std::string> Words(const std::string& text) {
@@ -67,6 +75,16 @@ inline std::vector<double> Nums(const std::string& text) {
   std::vector<double> v;
   for (const std::string& w : List(text)) v.push_back(Num(w));
   return v;
+}
+
+// A field with \n, \r, \t and \s (a space) escapes.
+inline std::string Unescape(const std::string& s) {
+  std::string out;
+  for (std::size_t i = 0; i < s.size(); ++i) {
+    if (s[i] != '\\' || i + 1 == s.size()) out += s[i];
+    else ++i, out += s[i] == 'n' ? '\n' : s[i] == 'r' ? '\r' : s[i] == 't' ? '\t' : s[i] == 's' ? ' ' : s[i];
+  }
+  return out;
 }
 
 // The key=value words of a field.
@@ -96,4 +114,9 @@ class CaseRows : public testing::TestWithParam<Row> {
 inline auto RowsOf(const std::string& file) { return testing::ValuesIn(ReadRows(file)); }
 inline std::string RowName(const testing::TestParamInfo<Row>& info) { return info.param.name; }
 
+}  // namespace zt::test
+
+// The Voronoi suites name these from their own namespace.
+namespace zt::vdtest {
+using namespace zt::test;
 }  // namespace zt::vdtest
