@@ -1,25 +1,85 @@
 // Behaviour of rg_boolean on the small cases that pin the classification:
-// two overlapping squares worked through exactly, identical operands,
-// touching at one vertex, nesting and the ray test, closing duplicates, open
-// polylines, the retry with exchanged roles, results written over an
-// operand, engine reuse and threads.
+// the rows of data/boolean.txt (identical operands, touching at one vertex,
+// nesting and the ray test, open polylines, the retry with exchanged roles),
+// two overlapping squares worked through exactly, closing duplicates,
+// results written over an operand, engine reuse and threads.
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <sstream>
 #include <thread>
 
 #include "region_test_support.hpp"
+#include "support/case_rows.hpp"
 
 namespace zt::test {
 namespace {
 
-double area_of(const TaggedPointList& a, const TaggedPointList& b, const char* op, int contours = -1) {
-  TaggedPointList r;
-  EXPECT_EQ(rg_boolean(a, b, op, &r), 0) << op;
-  if (contours >= 0) {
-    EXPECT_EQ(contours_of(r).size(), std::size_t(contours)) << op;
+// Records "x,y[,tag]" (tag 0 when left out; S: a separator) separated by
+// blanks or `sep`.
+std::vector<TaggedPoint> records(std::string text, char sep = ' ') {
+  std::replace(text.begin(), text.end(), sep, ' ');
+  std::vector<TaggedPoint> out;
+  for (const std::string& w : Words(text)) {
+    const std::vector<double> v = Nums(w);
+    out.push_back(w == "S" ? TaggedPoint::separator()
+                           : TaggedPoint(v.size() > 2 ? static_cast<std::int32_t>(v[2]) : 0, v.at(0), v.at(1)));
   }
-  return total_area(r);
+  return out;
 }
+
+// Contours separated by ';', each closed unless its last word is "open".
+void operand(const std::string& field, TaggedPointList& l) {
+  std::istringstream in(field);
+  for (std::string c; std::getline(in, c, ';');) {
+    const bool open = Words(c).back() == "open";
+    std::vector<TaggedPoint> points = records(open ? c.substr(0, c.rfind("open")) : c);
+    if (!open) points.push_back(points.front());
+    for (const TaggedPoint& p : points) l.AddDoubling(p);
+    l.AddDoubling(TaggedPoint::separator());
+  }
+}
+
+class BooleanRows : public CaseRows {};
+
+TEST_P(BooleanRows, ResultAsListed) {
+  TaggedPointList a, b, r;
+  operand(row().field(0), a);
+  operand(row().field(1), b);
+  r.AddDoubling(TaggedPoint(7, 1, 1));
+  ASSERT_EQ(rg_boolean(a, b, row().field(2).c_str(), &r), 0);
+  for (const auto& [key, value] : Keys(row().field(3)).kv) {
+    SCOPED_TRACE(key);
+    const auto tilde = value.find('~');
+    const double want = Num(value.substr(0, tilde));
+    const double tol = tilde == std::string::npos ? 0 : Num(value.substr(tilde + 1));
+    if (key == "area" || key == "|area|") {
+      const double got = key == "area" ? total_area(r) : std::fabs(total_area(r));
+      if (tol > 0) {
+        EXPECT_NEAR(got, want, tol);
+      } else {
+        EXPECT_DOUBLE_EQ(got, want);
+      }
+    } else if (key == "contours") {
+      EXPECT_EQ(contours_of(r).size(), static_cast<std::size_t>(want));
+    } else if (key == "records") {
+      EXPECT_EQ(r.count(), static_cast<int>(want));
+    } else if (key == "tags" || key == "integral") {
+      for (const TaggedPoint& p : r) {
+        if (key == "tags") EXPECT_TRUE(p.tag == want || is_separator(p));
+        else EXPECT_TRUE(p.x == std::floor(p.x) && p.y == std::floor(p.y));
+      }
+    } else {
+      ASSERT_EQ(key, "starts");
+      const std::vector<TaggedPoint> e = records(value, ';');
+      ASSERT_GE(r.count(), static_cast<int>(e.size()));
+      for (std::size_t k = 0; k < e.size(); ++k)
+        EXPECT_TRUE(r[k].tag == e[k].tag && r[k].x == e[k].x && r[k].y == e[k].y) << k;
+    }
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Rows, BooleanRows, RowsOf("boolean.txt"), RowName);
 
 // The two overlapping squares, worked through exactly: areas, orientation,
 // one separator, and the tag changes at the crossing points (2, 1), (1, 2).
@@ -66,54 +126,6 @@ TEST(TwoSquares, OneContourWithTagChangesAtTheCrossings) {
   }
 }
 
-TEST(BooleanCases, IdenticalOperandsKeepOneCopyForUnionAndIntersectionAndNothingForDifference) {
-  TaggedPointList a, b, d;
-  fill_list(a, {{{0, 0, 1}, {4, 0, 1}, {4, 3, 1}, {2, 5, 1}, {0, 3, 1}}});
-  fill_list(b, {{{0, 0, 2}, {4, 0, 2}, {4, 3, 2}, {2, 5, 2}, {0, 3, 2}}});
-  EXPECT_DOUBLE_EQ(area_of(a, b, "u", 1), 16.0);
-  EXPECT_DOUBLE_EQ(area_of(a, b, "i", 1), 16.0);
-  d.AddDoubling(TaggedPoint(7, 1, 1));
-  ASSERT_EQ(rg_boolean(a, b, "d", &d), 0);
-  EXPECT_EQ(d.count(), 0);
-  TaggedPointList u;  // A's copy is the one kept
-  ASSERT_EQ(rg_boolean(a, b, "u", &u), 0);
-  for (const TaggedPoint& p : u) EXPECT_TRUE(p.tag == 1 || is_separator(p));
-}
-
-TEST(BooleanCases, OperandsTouchingAtOneVertex) {
-  TaggedPointList a, b, u;
-  fill_list(a, {rect(0, 0, 1, 1, 1)});
-  fill_list(b, {rect(1, 1, 2, 2, 2)});
-  EXPECT_DOUBLE_EQ(area_of(a, b, "i", 0), 0.0);
-  EXPECT_DOUBLE_EQ(std::fabs(area_of(a, b, "d")), 1.0);
-  ASSERT_EQ(rg_boolean(a, b, "u", &u), 0);
-  EXPECT_DOUBLE_EQ(total_area(u), 2.0);
-  for (const TaggedPoint& p : u) EXPECT_TRUE(p.x == std::floor(p.x) && p.y == std::floor(p.y));
-}
-
-TEST(BooleanCases, NestedOperandIsDecidedByTheRayTest) {
-  TaggedPointList outer, inner, r;
-  fill_list(outer, {rect(0, 0, 10, 10, 1)});
-  fill_list(inner, {{{2, 2, 5}, {3, 2, 6}, {3, 3, 7}, {2, 3, 8}}});
-  ASSERT_EQ(rg_boolean(outer, inner, "i", &r), 0);
-  // The inner contour whole with its own tags; its closing point first with
-  // the last tag, then with its own.
-  const TaggedPoint expected[] = {{5, 2, 2}, {6, 3, 2}, {7, 3, 3}, {8, 2, 3}, {8, 2, 2}, {5, 2, 2},
-                                  TaggedPoint::separator()};
-  ASSERT_EQ(r.count(), 7);
-  for (int k = 0; k < 7; ++k) {
-    EXPECT_TRUE(r[k].tag == expected[k].tag && r[k].x == expected[k].x && r[k].y == expected[k].y) << k;
-  }
-  EXPECT_DOUBLE_EQ(area_of(outer, inner, "u", 1), 100.0);
-  EXPECT_DOUBLE_EQ(area_of(inner, outer, "i", 1), 1.0);
-  area_of(outer, inner, "d", 2);
-  // The ray from (1, 1) runs along the edge (4, 1)-(6, 1): only x = 4 counts.
-  fill_list(outer, {{{0, 0}, {4, 0}, {4, 1}, {6, 1}, {6, 3}, {0, 3}}});
-  fill_list(inner, {rect(1, 1, 2, 2)});
-  EXPECT_DOUBLE_EQ(area_of(outer, inner, "i", 1), 1.0);
-  EXPECT_DOUBLE_EQ(area_of(outer, inner, "u", 1), 16.0);
-}
-
 TEST(BooleanCases, ResultWrittenOverAnOperand) {
   TaggedPointList a, b, expected;
   fill_list(a, {rect(0, 0, 2, 2, 1)});
@@ -144,35 +156,6 @@ TEST(BooleanCases, ClosingDuplicatesWithinTheTolerance) {
   c = contours_of(r).at(0);
   ASSERT_EQ(c.size(), 5u);
   EXPECT_NEAR(c.back().x, 1e-12, 0x1p-46);
-}
-
-TEST(BooleanCases, OpenPolylines) {
-  TaggedPointList line, square, r;
-  fill_list(square, {rect(0, 0, 2, 2)});
-  add_contour(line, {{-1, 1, 9}, {3, 1, 9}}, false);
-  ASSERT_EQ(rg_boolean(line, square, "i", &r), 0);
-  const auto c = contours_of(r).at(0);  // its piece inside the square first
-  EXPECT_TRUE(c[0].x == 0 && c[0].tag == 9 && c[1].x == 2 && c[1].tag == 9);
-  // Regression: an open polyline that meets the other operand nowhere and is
-  // not kept has no pieces to write; it is skipped, not a failure.
-  line.Clear();
-  add_contour(line, {{5, 5}, {6, 6}, {7, 5}}, false);
-  ASSERT_EQ(rg_boolean(line, square, "i", &r), 0);
-  EXPECT_EQ(r.count(), 0);
-  area_of(line, square, "u", 2);
-}
-
-// B's long edge runs from beyond A's corner (2, 0) along A's bottom edge,
-// within the tolerance, to beyond (0, 0): the pair test asks for the roles
-// to be exchanged, which puts A's corners on B's edge.
-TEST(BooleanCases, NearlyCollinearOverlapThroughTheRetry) {
-  TaggedPointList a, b, i;
-  fill_list(a, {rect(0, 0, 2, 2, 1)});
-  fill_list(b, {{{3, 0, 2}, {-1, 18 * 0x1p-48, 2}, {1, -2, 2}}});  // just off once normalised
-  EXPECT_NEAR(area_of(a, b, "u", 1), 8.0, 1e-12);
-  EXPECT_NEAR(std::fabs(area_of(a, b, "d", 1)), 4.0, 1e-12);
-  ASSERT_EQ(rg_boolean(a, b, "i", &i), 0);
-  EXPECT_EQ(i.count(), 0);
 }
 
 TEST(BooleanCases, EngineReuseAcrossSizesAndThreadsGivesTheSameOutput) {
