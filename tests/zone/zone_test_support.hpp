@@ -16,6 +16,7 @@
 #include <string>
 #include <vector>
 
+#include "support/record_bytes.hpp"
 #include "support/scratch_dir.hpp"
 #include "zone/offset_engine.hpp"
 #include "zone/zone_context.hpp"
@@ -169,27 +170,18 @@ struct Rec {
 };
 inline constexpr Rec kSep{99999.0f, 99999.0f, 99999.0f, 1};
 inline std::string record_bytes(const std::vector<Rec>& recs, int width = 18, bool header = false) {
-  auto put = [](std::string& s, const void* p, size_t n) { s.append(static_cast<const char*>(p), n); };
-  std::string out = "K";
-  if (header) {
-    const float v = 1.0f;
-    const std::int32_t c = 2;
-    out += '\x08';
-    put(out, &v, 4);
-    put(out, &c, 4);
-    out += '\x08';
-  }
+  auto bytes = [](const auto&... v) {
+    std::string s;
+    (s.append(reinterpret_cast<const char*>(&v), sizeof v), ...);
+    return s;
+  };
+  std::vector<std::string> records;
+  if (header) records.push_back(bytes(1.0f, std::int32_t{2}));
   for (const Rec& r : recs) {
     const std::int32_t code = r.x >= 90000 ? -1001 : -1003;
-    out += static_cast<char>(width);
-    put(out, &r.x, 4);
-    put(out, &r.y, 4);
-    put(out, &r.z, 4);
-    if (width >= 16) put(out, &code, 4);
-    if (width >= 18) put(out, &r.flag, 2);
-    out += static_cast<char>(width);
+    records.push_back(bytes(r.x, r.y, r.z, code, r.flag).substr(0, static_cast<std::size_t>(width)));
   }
-  return out + '\x82';
+  return test::segmented_record_file(records);
 }
 
 // Per level its contours, each behind a separator record.
