@@ -158,34 +158,33 @@ TEST_F(Assembly, SpareRangesAreNotLevelsAndTheLevelFileKeepsItsPoints) {
 // Regressions: a failed read of temp1 gave a short contour, and a write to
 // temp2 that the disk refused only ended the level's range early.
 TEST_F(Assembly, FailuresEndTheAssembly) {
-  levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
+  const auto oneLevel = [&] {
+    reset_zone_builder();
+    levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
+  };
+  oneLevel();
   zone_builder().levelRanges[0].last += 3;  // beyond the end of temp1
   EXPECT_EQ(assemble(), -1);
-  reset_zone_builder();
   std::filesystem::remove(path("grid.tmp"));
-  levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
+  oneLevel();
   EXPECT_EQ(assemble(), -1);
-  reset_zone_builder();
   write_file("grid.tmp", "0 0 0 0 0.1 0 2 0\n");
-  levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
+  oneLevel();
   engine.offsetsOk = false;
   EXPECT_EQ(assemble(), -1);
   if (!std::filesystem::exists("/dev/full")) return;
-  reset_zone_builder();
   engine.offsetsOk = true;
   std::filesystem::remove(path("temp2"));
   std::filesystem::create_symlink("/dev/full", path("temp2"));
-  levels({0}, {{0, stock_points({rectangle(0, 0, 10, 10)})}});
+  oneLevel();
   EXPECT_EQ(assemble(), -1);
 }
 
 TEST(SplitRuns, SeparatorThresholds) {
   const std::vector<Point2f> p = {{99999, 99999}, {90000, 0}, {1, 1}, {90000, 2}, {2, 2},
                                   {90000.01f, 0}, {3, 3},     {4, 4}, {95000, 0}};
-  const auto runs = split_runs(p.data(), static_cast<std::int32_t>(p.size()));
-  ASSERT_EQ(runs.size(), 2u);
-  EXPECT_EQ(runs[0], std::make_pair(2, 5));
-  EXPECT_EQ(runs[1], std::make_pair(6, 8));
+  EXPECT_EQ(split_runs(p.data(), static_cast<std::int32_t>(p.size())),
+            (std::vector<std::pair<std::int32_t, std::int32_t>>{{2, 5}, {6, 8}}));
 }
 
 TEST_F(Assembly, WriteZonesDropsShortRunsClosesRunsAndFailsOnRefusal) {
