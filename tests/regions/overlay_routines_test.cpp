@@ -1,6 +1,6 @@
 // The overlay's numeric routines and small structures: segment intersection,
-// ray crossing and snapping case by case (the rows of data/overlay.txt), the
-// clamped crossing, split lists, pseudo-angles, the output collector.
+// ray crossing, snapping and the output collector case by case (the rows of
+// data/overlay.txt), the clamped crossing, split lists, pseudo-angles.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -30,6 +30,11 @@ double value(const std::string& t) {
   return sum;
 }
 Point2d point(const std::string& t) { return {value(t.substr(0, t.find(','))), value(t.substr(t.find(',') + 1))}; }
+// "x,y,tag", or S for a separator.
+TaggedPoint record(const std::string& t) {
+  if (t == "S") return TaggedPoint::separator();
+  return {std::stoi(t.substr(t.rfind(',') + 1)), point(t).x, point(t).y};
+}
 
 class OverlayRoutines : public test::CaseRows {};
 
@@ -47,6 +52,16 @@ TEST_P(OverlayRoutines, AsListed) {
   } else if (call[0] == "ray") {
     const Point2d p = point(call[1]), a = point(call[2]), b = point(call[3]);
     EXPECT_EQ(ray_crossing(p.x, p.y, a.x, a.y, b.x, b.y, kEps), std::stoi(want[0]));
+  } else if (call[0] == "collect") {
+    TaggedPointList out;
+    collector_set_tolerance(kDuplicateTolerance);
+    collector_reset(&out, 10.0, 20.0, 2.0, 4.0);
+    for (std::size_t i = 1; i < call.size(); ++i) emit_point(record(call[i]).x, record(call[i]).y, record(call[i]).tag);
+    ASSERT_EQ(out.count(), static_cast<int>(want.size()));
+    for (int k = 0; k < out.count(); ++k) {
+      const TaggedPoint w = record(want[k]);
+      EXPECT_TRUE(out[k].x == w.x && out[k].y == w.y && out[k].tag == w.tag) << k;
+    }
   } else {
     ASSERT_EQ(call[0], "snap");
     EXPECT_EQ(snap_coordinate(value(call[1])), value(want[0]));
@@ -127,38 +142,6 @@ TEST(PseudoAngle, IncreasesCounterClockwiseFromZeroToEight) {
   }
   EXPECT_EQ(pseudo_angle(1, 0), 8.0);
   EXPECT_EQ(pseudo_angle(-1, 0), 4.0);
-}
-
-// The output collector: duplicates within the tolerance, the stored point
-// moved at a change of tag, separators passed unmapped and collapsed.
-TEST(OutputCollector, DuplicateAndTagRules) {
-  TaggedPointList out;
-  collector_set_tolerance(kDuplicateTolerance);
-  collector_reset(&out, 10.0, 20.0, 2.0, 4.0);
-  emit_point(1, 1, 5);
-  emit_point(1, 1, 5);  // same point, same tag: stored once
-  emit_point(1 + 2e-8, 1, 5);
-  emit_point(1 + 4e-8, 1 - 2e-8, 5);  // a run within 1e-7 keeps the first position...
-  ASSERT_EQ(out.count(), 1);
-  EXPECT_EQ(out[0].x, 12.0);
-  emit_point(2, 2, 6);  // ...until the tag changes: then it moves to the run's last point
-  ASSERT_EQ(out.count(), 2);
-  EXPECT_EQ(out[0].x, (1 + 4e-8) * 2 + 10);
-  EXPECT_EQ(out[0].y, (1 - 2e-8) * 4 + 20);
-  EXPECT_EQ(out[0].tag, 5);
-  emit_point(2, 2, 7);  // same point, another tag: stored twice
-  ASSERT_EQ(out.count(), 3);
-  EXPECT_EQ(out[1].tag, 6);
-  EXPECT_EQ(out[2].tag, 7);
-  emit_separator();
-  emit_separator();  // collapses
-  ASSERT_EQ(out.count(), 4);
-  EXPECT_EQ(out[3].x, kSeparatorCoord);
-  EXPECT_EQ(out[3].tag, kSeparatorTag);
-  emit_point(0, 0, 3);
-  ASSERT_EQ(out.count(), 5);
-  EXPECT_EQ(out[3].x, kSeparatorCoord);  // the separator stays
-  EXPECT_EQ(out[4].x, 10.0);
 }
 
 }  // namespace
