@@ -11,12 +11,10 @@ namespace {
 class ZonetoolSvg : public ::testing::Test {
  protected:
   int svg(const std::string& args) {
-    const std::string tool = test::zonetool_path();
-    const std::string cmd = tool + " svg " + args + " >/dev/null 2>" + q(dir.file("err.txt"));
-    const int status = std::system(cmd.c_str());
+    const int status = test::run_command(test::zonetool_path() + " svg " + args + " 2>" + q(dir.file("err.txt"))).status;
     err = test::read_text(dir.file("err.txt"));
     out = test::read_text(dir.file("out.svg"));
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+    return status;
   }
   // Built piece by piece: "'" + std::string + "'" trips a false -Wrestrict
   // warning of GCC 12 inside the standard library.
