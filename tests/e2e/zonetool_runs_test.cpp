@@ -1,5 +1,5 @@
 // zonetool run as a program on the rows of data/zonetool.txt: exact output
-// bytes, messages and exit statuses.
+// bytes, what the output holds (svg drawings), messages and exit statuses.
 #include <gtest/gtest.h>
 
 #include "support/case_rows.hpp"
@@ -11,9 +11,19 @@ namespace {
 
 const std::string kData = ZT_TEST_DATA_DIR;
 
+// TEXT exactly, @FILE the bytes of a data file, ~TEXT held, ^TEXT at the
+// start, #N TEXT held N times, * anything.
 void expect_stream(const std::string& got, const std::string& want, const char* which) {
+  const std::string text = want.empty() ? "" : Unescape(want.substr(1));
   if (want.starts_with('~')) {
-    EXPECT_NE(got.find(want.substr(1)), std::string::npos) << which << got;
+    EXPECT_NE(got.find(text), std::string::npos) << which << got;
+  } else if (want.starts_with('^')) {
+    EXPECT_EQ(got.rfind(text, 0), 0u) << which << got;
+  } else if (want.starts_with('#')) {
+    const std::string what = text.substr(text.find(' ') + 1);
+    int n = 0;
+    for (auto at = got.find(what); at != std::string::npos; at = got.find(what, at + 1)) ++n;
+    EXPECT_EQ(n, std::stoi(text)) << which << got;
   } else if (want != "*") {
     EXPECT_EQ(got, want.starts_with('@') ? read_text(kData + "/" + want.substr(1)) : Unescape(want)) << which;
   }
