@@ -45,18 +45,11 @@ inline Bytes records(const std::vector<Contour>& contours) {
   return test::record_file(r);
 }
 
-// A closed axis-parallel rectangle, counter-clockwise (clockwise when cw).
-inline std::vector<Pt> rectangle(float x0, float y0, float x1, float y1, bool cw = false) {
-  std::vector<Pt> p{{x0, y0}, {x1, y0}, {x1, y1}, {x0, y1}, {x0, y0}};
-  if (cw) return {p.rbegin(), p.rend()};
-  return p;
-}
-
-// The square lo..hi on each of the given levels: the pocket 0..100, and a
-// square of rest material 40..60.
+// The closed counter-clockwise square lo..hi on each of the given levels:
+// the pocket 0..100, and a square of rest material 40..60.
 inline Bytes squares(const std::vector<float>& levels, float lo, float hi) {
   std::vector<Contour> c;
-  for (float z : levels) c.push_back({z, rectangle(lo, lo, hi, hi)});
+  for (float z : levels) c.push_back({z, {{lo, lo}, {hi, lo}, {hi, hi}, {lo, hi}, {lo, lo}}});
   return records(c);
 }
 inline Bytes pocket(const std::vector<float>& levels) { return squares(levels, 0, 100); }
