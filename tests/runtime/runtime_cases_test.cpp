@@ -2,6 +2,7 @@
 // named test in a fresh RuntimeTest, its commands in order (described at the
 // top of data/expansion.cases).
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cstring>
@@ -9,10 +10,13 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <regex>
 #include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
+#include "runtime/dynamic_storage.hpp"
 #include "runtime/environment.hpp"
+#include "runtime/error_report.hpp"
 #include "runtime/path_expansion.hpp"
 #include "runtime/progress.hpp"
 #include "runtime/record_readers.hpp"
@@ -28,12 +32,18 @@ using test::Words;
 
 class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
-  // "@" before "/" or at the end of a word is the test directory; a relative
-  // path lies in it.
+  // "@" before "/" or at the end of a word is the test directory (a relative
+  // path lies in it), "<pid>" this process's id, "{N*TEXT}" TEXT N times.
   std::string at(const std::string& s) const {
     std::string out;
     for (std::size_t i = 0; i < s.size(); ++i)
       out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
+    static const std::regex special(R"(<pid>|\{(\d+)\*([^}]*)\})");
+    for (std::smatch m; std::regex_search(out, m, special);) {
+      std::string text = m[1].matched ? "" : std::to_string(::getpid());
+      for (int n = m[1].matched ? std::stoi(m[1]) : 0; n > 0; --n) text += m[2];
+      out.replace(static_cast<std::size_t>(m.position(0)), static_cast<std::size_t>(m.length(0)), text);
+    }
     return out;
   }
   std::string in_dir(const std::string& s) const { return (std::filesystem::path(dir_) / at(s)).string(); }
@@ -60,6 +70,7 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
   std::size_t messages_seen_ = 0;
   ConfigTable table_;
   std::size_t warnings_seen_ = 0, fatals_seen_ = 0;
+  std::unique_ptr<DynamicStorage, void (*)(DynamicStorage*)> arena_{nullptr, ds_destroy};
 };
 
 void RuntimeCases::run(const Words& raw) {
@@ -104,6 +115,7 @@ void RuntimeCases::run(const Words& raw) {
     for (std::size_t i = 1; i + 1 < w.size(); ++i)
       EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
   } else if (op == "value") EXPECT_EQ(shown(table_.value(w.at(1), w.at(2))), w.at(3));
+  else if (op == "value-cut") EXPECT_LE(table_.value(w.at(1), w.at(2)).value_or("").size(), kMaxResolvedValue);
   else if (op == "origin") EXPECT_EQ(table_.origin(w.at(1), w.at(2)), w.at(3));
   else if (op == "installed-origin") EXPECT_EQ(configuration().origin(w.at(1), w.at(2)), w.at(3));
   else if (op == "environment") load_environment();
@@ -142,6 +154,7 @@ void RuntimeCases::run(const Words& raw) {
     EXPECT_EQ(reader_->openPoints(in_dir(w.at(1)).c_str()), status(2));
   } else if (op == "get") {  // the reader's NAME is VALUE
     const std::map<std::string, std::function<double()>> get = {
+        {"isOpen", [&] { return reader_->isOpen(); }},
         {"recordSize", [&] { return reader_->recordSize(); }},
         {"recordCount", [&] { return reader_->recordCount(); }},
         {"hasCode", [&] { return reader_->hasCode(); }},
@@ -174,6 +187,31 @@ void RuntimeCases::run(const Words& raw) {
     ::testing::internal::CaptureStdout();
     progress(status(1), status(2));
     EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(3));
+  } else if (op == "report") {  // begin|status|message TEXT|- STATUS, or end|mark-empty STATUS
+    const char* text = w.size() > 3 && w[2] != "-" ? w[2].c_str() : nullptr;
+    const auto n = static_cast<std::int32_t>(text ? w[2].size() : 0);
+    const std::string& call = w.at(1);
+    EXPECT_EQ(call == "begin" ? report_begin(text) : call == "status" ? report_status(text, n)
+              : call == "message" ? report_message(text, n) : call == "end" ? report_end() : report_mark_empty(),
+              status(w.size() - 1));
+  } else if (op == "capture") ::testing::internal::CaptureStdout();
+  else if (op == "stdout") EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(1));
+  else if (op == "arena") {  // SIZE yes|no: the case's new arena, or none made
+    arena_.reset(ds_create(std::stoll(w.at(1))));
+    EXPECT_EQ(arena_ ? "yes" : "no", w.at(2));
+  } else if (op == "arena-string") EXPECT_EQ(ds_store_string(arena_.get(), w.at(1)), status(2));
+  else if (op == "arena-reserve") EXPECT_EQ(ds_reserve(arena_.get(), std::stoll(w.at(1))), status(2));
+  else if (op == "arena-growth") arena_->growth = status(1);
+  else if (op == "arena-trim") ds_trim(arena_.get());
+  else if (op == "arena-size") {  // USED|* CAPACITY
+    if (w.at(1) != "*") { EXPECT_EQ(arena_->used, status(1)); }
+    count(static_cast<std::size_t>(arena_->capacity), w.at(2));
+  } else if (op == "arena-at") {  // HANDLE then <none>, "?" (something) or the string there
+    const auto* p = static_cast<const char*>(ds_deref(arena_.get(), status(1)));
+    EXPECT_EQ(!p ? "<none>" : w.at(2) == "?" ? "?" : std::string(p), w.at(2));
+  } else if (op == "warning-start") {
+    ASSERT_FALSE(warnings.empty());
+    EXPECT_EQ(warnings.back().rfind(w.at(1), 0), 0u) << warnings.back();
   } else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
   else if (op == "fatal") next(fatals, fatals_seen_, w.at(1));
   else if (op == "warnings") count(warnings.size(), w.at(1));
@@ -186,7 +224,7 @@ TEST_P(RuntimeCases, Run) { test::run_script(GetParam(), [this](const Words& w) 
 
 INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases,
                          ::testing::ValuesIn(test::load_script_cases(
-                             {"expansion", "configuration", "workzone", "progress", "readers"})),
+                             {"expansion", "configuration", "workzone", "progress", "readers", "report", "storage"})),
                          test::case_name);
 
 }  // namespace

@@ -1,7 +1,5 @@
-// Tracked allocation and dynamic storage: counters, kinds and their fatal
-// texts, arena growth and handles.
-#include "runtime/dynamic_storage.hpp"
-
+// Tracked allocation: counters, kinds and their fatal texts (dynamic
+// storage: data/storage.cases).
 #include <cstring>
 #include <string>
 
@@ -90,62 +88,6 @@ TEST_F(TrackedAllocTest, DefaultFatalEndsProcess) {
         tracked_free(&local);
       },
       ::testing::ExitedWithCode(255), "Trying to free unallocated or corrupt memory");
-}
-
-class DynamicStorageTest : public testing::RuntimeTest {};
-
-TEST_F(DynamicStorageTest, RoundingToFourAndGrowthByInitialSizeKeepHandles) {
-  DynamicStorage* ds = ds_create(100);
-  ASSERT_NE(ds, nullptr);
-  const std::int32_t text = ds_store_string(ds, "hello");
-  EXPECT_EQ(ds->used, 8);
-  for (int n = 1; n <= 4; ++n) {
-    EXPECT_EQ(ds_reserve(ds, n), 4 + 4 * n);
-    EXPECT_EQ(ds->used, 8 + 4 * n);
-  }
-  ASSERT_EQ(ds_reserve(ds, 76), 24);
-  EXPECT_EQ(ds->capacity, 100);
-  EXPECT_EQ(ds_reserve(ds, 1), 100);
-  EXPECT_EQ(ds->capacity, 200);
-  EXPECT_EQ(ds_reserve(ds, 350), 104);  // several steps at once
-  EXPECT_EQ(ds->capacity, 500);
-  EXPECT_STREQ(static_cast<const char*>(ds_deref(ds, text)), "hello");
-  ds_trim(ds);
-  EXPECT_EQ(ds->capacity, ds->used);
-  EXPECT_STREQ(static_cast<const char*>(ds_deref(ds, text)), "hello");
-  ds_destroy(ds);
-}
-
-TEST_F(DynamicStorageTest, DerefOutsideUsedWarns) {
-  DynamicStorage* ds = ds_create(16);
-  ds_reserve(ds, 8);
-  EXPECT_EQ(ds_deref(ds, -1), nullptr);
-  EXPECT_TRUE(warnings.empty());
-  EXPECT_NE(ds_deref(ds, 7), nullptr);
-  EXPECT_EQ(ds_deref(ds, 8), nullptr);
-  ASSERT_EQ(warnings.size(), 1u);
-  EXPECT_EQ(warnings[0], "Dynamic storage: trying to access unallocated memory\n");
-  ds_destroy(ds);
-}
-
-// Regression: an arena created with 0 bytes (growth step 0) looped forever on
-// its first reservation; sizes beyond 32 bits wrapped.
-TEST_F(DynamicStorageTest, ZeroGrowthAndHugeSizesTerminate) {
-  DynamicStorage* ds = ds_create(0);
-  ASSERT_NE(ds, nullptr);
-  EXPECT_EQ(ds_reserve(ds, 10), 0);
-  EXPECT_EQ(ds->capacity, kMinimumGrowth);
-  EXPECT_EQ(ds_reserve(ds, 1000), 12);
-  EXPECT_GE(ds->capacity, 1012);
-  ds->growth = 0;
-  EXPECT_EQ(ds_reserve(ds, 2000), 1012);
-  EXPECT_EQ(ds_reserve(ds, std::int64_t{1} << 32), kDsNoHandle);
-  EXPECT_EQ(ds_reserve(ds, -4), kDsNoHandle);
-  EXPECT_EQ(ds_reserve(ds, 0x7FFFFFFE), kDsNoHandle);  // would pass 2^31 - 1 bytes
-  EXPECT_EQ(warnings.back().rfind("Dynamic storage: no more memory, could not expand from ", 0), 0u);
-  EXPECT_EQ(ds_create(std::int64_t{1} << 33), nullptr);
-  EXPECT_EQ(ds_create(-1), nullptr);
-  ds_destroy(ds);
 }
 
 }  // namespace
