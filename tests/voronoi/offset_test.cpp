@@ -64,7 +64,7 @@ TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
     const std::string n = want.str("curves");
     EXPECT_TRUE(n.ends_with("+") ? curves.size() >= Num(n) : curves.size() == Num(n)) << curves.size();
   }
-  const double tol = want.has("reltol") ? want.num("reltol") * Extent(in) : want.num("tol", kTol);
+  const double tol = want.has("reltol") ? want.num("reltol") * Extent(in.points) : want.num("tol", kTol);
   for (const Curve& c : curves) {
     EXPECT_NEAR(step > 0 ? std::remainder(c.offset - t, step) : 0.0, 0.0, 1e-9) << c.offset;
     EXPECT_EQ(CheckAtDistance(in, {c}, step > 0 ? c.offset : t, tol), "");
@@ -236,7 +236,7 @@ void ExpectOffsetsOf(const std::vector<Contour>& cs, const std::vector<Pt>& loos
   ASSERT_TRUE(VD_ComputeOffsets(side, t, 0.0)) << what;
   const auto curves = ReadStore();
   ASSERT_TRUE(!someCurve || !curves.empty()) << what;
-  ASSERT_EQ(CheckAtDistance(in, curves, t, 1e-9 * Extent(in)), "") << what;
+  ASSERT_EQ(CheckAtDistance(in, curves, t, 1e-9 * Extent(in.points)), "") << what;
   ASSERT_TRUE(side == 3 || !loose.empty() || CheckSide(cs, curves, side == 1).empty()) << what;
 }
 
