@@ -20,6 +20,7 @@
 #include "runtime/path_expansion.hpp"
 #include "runtime/progress.hpp"
 #include "runtime/record_readers.hpp"
+#include "runtime/tracked_alloc.hpp"
 #include "runtime_fixture.hpp"
 #include "support/case_script.hpp"
 #include "support/record_bytes.hpp"
@@ -33,15 +34,19 @@ using test::Words;
 class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
   // "@" before "/" or at the end of a word is the test directory (a relative
-  // path lies in it), "<pid>" this process's id, "{N*TEXT}" TEXT N times.
+  // path lies in it), "<pid>" this process's id, "<serial>" the serial of the
+  // last tracked block, "<maximum>" the permanent maximum the case set,
+  // "{N*TEXT}" TEXT N times.
   std::string at(const std::string& s) const {
     std::string out;
     for (std::size_t i = 0; i < s.size(); ++i)
       out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
-    static const std::regex special(R"(<pid>|\{(\d+)\*([^}]*)\})");
+    static const std::regex special(R"(<(pid|serial|maximum)>|\{(\d+)\*([^}]*)\})");
     for (std::smatch m; std::regex_search(out, m, special);) {
-      std::string text = m[1].matched ? "" : std::to_string(::getpid());
-      for (int n = m[1].matched ? std::stoi(m[1]) : 0; n > 0; --n) text += m[2];
+      const TrackedCounters c = tracked_counters();
+      std::string text = m[1] == "pid" ? std::to_string(::getpid()) : m[1] == "serial" ? std::to_string(c.next_serial - 1)
+                         : m[1] == "maximum" ? std::to_string(maximum_) : "";
+      for (int n = m[2].matched ? std::stoi(m[2]) : 0; n > 0; --n) text += m[3];
       out.replace(static_cast<std::size_t>(m.position(0)), static_cast<std::size_t>(m.length(0)), text);
     }
     return out;
@@ -71,6 +76,11 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
   ConfigTable table_;
   std::size_t warnings_seen_ = 0, fatals_seen_ = 0;
   std::unique_ptr<DynamicStorage, void (*)(DynamicStorage*)> arena_{nullptr, ds_destroy};
+  TrackedCounters counted_{};
+  std::uint64_t maximum_ = 0;  // as the case set it
+  std::map<std::string, void*> blocks_;  // tracked blocks by name; "local" is no block
+  int local_ = 0;
+  void* block(const std::string& name) { return name == "local" ? &local_ : blocks_[name]; }
 };
 
 void RuntimeCases::run(const Words& raw) {
@@ -196,7 +206,28 @@ void RuntimeCases::run(const Words& raw) {
               status(w.size() - 1));
   } else if (op == "capture") ::testing::internal::CaptureStdout();
   else if (op == "stdout") EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(1));
-  else if (op == "arena") {  // SIZE yes|no: the case's new arena, or none made
+  else if (op == "counters") counted_ = tracked_counters();
+  else if (op == "counted") {  // BYTES PERMANENT SERIALS since "counters" ("*": not checked)
+    const TrackedCounters now = tracked_counters();
+    const std::uint64_t change[] = {now.bytes_in_use - counted_.bytes_in_use,
+                                    now.permanent_bytes - counted_.permanent_bytes, now.next_serial - counted_.next_serial};
+    for (std::size_t i = 1; i < 4; ++i) {
+      if (w.at(i) != "*") { EXPECT_EQ(change[i - 1], std::stoull(w[i])) << "counter " << i; }
+    }
+  } else if (op == "alloc" || op == "realloc") {  // NAME temporary|permanent SIZE yes|no
+    const bool permanent = w.at(2) == "permanent";
+    const std::uint64_t n = std::stoull(w.at(3));
+    void* p = op == "alloc" ? (permanent ? permanent_alloc(n) : _Wmalloc(n))
+                            : _Wrealloc(permanent ? kBlockPermanent : kBlockTemporary, block(w[1]), n);
+    EXPECT_EQ(p ? "yes" : "no", w.at(4));
+    if (p) blocks_[w[1]] = p;
+  } else if (op == "free") EXPECT_EQ(tracked_free(block(w.at(1))), status(2));
+  else if (op == "fill") std::memset(block(w.at(1)), std::stoi(w.at(2)), std::stoul(w.at(3)));
+  else if (op == "byte") EXPECT_EQ(static_cast<unsigned char*>(block(w.at(1)))[std::stoul(w.at(2))], std::stoi(w.at(3)));
+  else if (op == "maximum") {  // N, or +N above the permanent bytes now
+    const std::uint64_t above = w.at(1)[0] == '+' ? tracked_counters().permanent_bytes : 0;
+    set_permanent_maximum(maximum_ = above + std::stoull(w[1].substr(above ? 1 : 0)));
+  } else if (op == "arena") {  // SIZE yes|no: the case's new arena, or none made
     arena_.reset(ds_create(std::stoll(w.at(1))));
     EXPECT_EQ(arena_ ? "yes" : "no", w.at(2));
   } else if (op == "arena-string") EXPECT_EQ(ds_store_string(arena_.get(), w.at(1)), status(2));
@@ -224,7 +255,7 @@ TEST_P(RuntimeCases, Run) { test::run_script(GetParam(), [this](const Words& w) 
 
 INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases,
                          ::testing::ValuesIn(test::load_script_cases(
-                             {"expansion", "configuration", "workzone", "progress", "readers", "report", "storage"})),
+                             {"expansion", "configuration", "workzone", "progress", "readers", "report", "storage", "tracked"})),
                          test::case_name);
 
 }  // namespace
