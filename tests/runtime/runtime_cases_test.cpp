@@ -92,7 +92,7 @@ void RuntimeCases::run(const Words& raw) {
   if (op == "env") set_env(w.at(1), w.at(2));
   else if (op == "unenv") unset_env(w.at(1));
   else if (op == "file") write_file(w.at(1), w.at(2));
-  else if (op == "config") write_install_config(w.at(1));
+  else if (op == "config") write_file("home/config/environ.cfg", w.at(1));  // the installation's own
   else if (op == "mkdir") std::filesystem::create_directories(in_dir(w.at(1)));
   else if (op == "remove") std::filesystem::remove(in_dir(w.at(1)));
   else if (op == "exists") {
