@@ -5,12 +5,12 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
-#include <fstream>
-#include <iterator>
 #include <random>
+#include <sstream>
 
 #include "case_rows.hpp"
 #include "offset_check.hpp"
+#include "support/scratch_dir.hpp"
 #include "voronoi/detail/engine_state.hpp"
 
 namespace zt::vdtest {
@@ -290,19 +290,17 @@ TEST(PolygonOffsets, PocketWithLoosePointsAgainstBruteForce) {
 TEST(PolygonOffsets, RequestedFileHoldsTheStore) {
   StoreContours({{{0, 0}, {1, 0}, {1, 1}, {0, 1}}});
   ASSERT_TRUE(ComputeSegments());
-  const std::string text = testing::TempDir() + "zt_offsets.txt";
-  ASSERT_TRUE(API_ComputeOff(false, text.c_str(), true, false, 0.1, 0.0, false, true, false));
-  std::ifstream in(text);
+  const test::ScratchDir dir;
+  ASSERT_TRUE(API_ComputeOff(false, dir.file("o.txt").c_str(), true, false, 0.1, 0.0, false, true, false));
+  std::istringstream in(test::read_text(dir.file("o.txt")));
   std::string line;
   std::getline(in, line);
   EXPECT_EQ(line, "curve 0.10000000000000001");
   int elements = 0;
   while (std::getline(in, line)) ++elements;
   EXPECT_EQ(elements, 4);
-  const std::string dxf = testing::TempDir() + "zt_offsets.dxf";
-  ASSERT_TRUE(API_ComputeOff(false, dxf.c_str(), true, true, 0.1, 0.0, false, false, true));
-  std::ifstream din(dxf);
-  const std::string all((std::istreambuf_iterator<char>(din)), std::istreambuf_iterator<char>());
+  ASSERT_TRUE(API_ComputeOff(false, dir.file("o.dxf").c_str(), true, true, 0.1, 0.0, false, false, true));
+  const std::string all = test::read_text(dir.file("o.dxf"));
   EXPECT_NE(all.find("ARC"), std::string::npos);
   EXPECT_NE(all.find("EOF"), std::string::npos);
   // A file that cannot be written fails the request.
