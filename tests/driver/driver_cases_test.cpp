@@ -130,7 +130,8 @@ void DriverCases::run(const Words& raw) {
     }
     EXPECT_TRUE(writer.close());
   } else if (op == "read-records") {  // PATH then "end N" (records), or [open-]fault KIND RECORD
-    const char* const kinds[] = {"none", "unreadable", "unwritable", "disk-full", "not-record-file", "damaged"};
+    const char* const kinds[] = {"none",    "unreadable",   "unwritable", "disk-full", "not-record-file",
+                                 "damaged", "short-record", "non-finite"};
     RecordReader reader;
     const bool opened = reader.open(w.at(1));
     test::Bytes head(12);
@@ -139,7 +140,7 @@ void DriverCases::run(const Words& raw) {
     while (opened && (s = reader.read(head, length)) == ReadStatus::kRecord) ++records;
     const RecordFaultInfo& f = reader.fault();
     EXPECT_EQ(s == ReadStatus::kEnd ? "end " + std::to_string(records)
-                                    : (opened ? "fault " : "open-fault ") + std::string(kinds[static_cast<int>(f.fault) % 6]) +
+                                    : (opened ? "fault " : "open-fault ") + std::string(kinds[static_cast<int>(f.fault)]) +
                                           " " + std::to_string(f.record) + " " + f.path,
               w.at(2) + " " + w.at(3) + (w.size() > 4 ? " " + w[4] + " " + w[1] : ""));
   } else if (op == "remove") std::filesystem::remove(w.at(1));
