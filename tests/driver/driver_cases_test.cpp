@@ -24,10 +24,6 @@ using test::Words;
 
 class DriverCases : public test::SuiteEnv, public ::testing::WithParamInterface<test::ScriptCase> {
  protected:
-  void SetUp() override {
-    test::SuiteEnv::SetUp();
-    detail::reset_message_tables();
-  }
   // "@tmp" and "@txt" are the suite's two directories.
   std::string at(std::string s) const {
     for (const auto& [key, value] : {std::pair{"@tmp", tmp.path().string()}, std::pair{"@txt", txt_dir()}})
