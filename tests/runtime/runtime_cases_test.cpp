@@ -10,7 +10,6 @@
 #include <functional>
 #include <map>
 #include <memory>
-#include <regex>
 #include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
@@ -41,13 +40,17 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
     std::string out;
     for (std::size_t i = 0; i < s.size(); ++i)
       out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
-    static const std::regex special(R"(<(pid|serial|maximum)>|\{(\d+)\*([^}]*)\})");
-    for (std::smatch m; std::regex_search(out, m, special);) {
-      const TrackedCounters c = tracked_counters();
-      std::string text = m[1] == "pid" ? std::to_string(::getpid()) : m[1] == "serial" ? std::to_string(c.next_serial - 1)
-                         : m[1] == "maximum" ? std::to_string(maximum_) : "";
-      for (int n = m[2].matched ? std::stoi(m[2]) : 0; n > 0; --n) text += m[3];
-      out.replace(static_cast<std::size_t>(m.position(0)), static_cast<std::size_t>(m.length(0)), text);
+    const std::pair<const char*, std::string> named[] = {{"<pid>", std::to_string(::getpid())},
+                                                         {"<serial>", std::to_string(tracked_counters().next_serial - 1)},
+                                                         {"<maximum>", std::to_string(maximum_)}};
+    for (const auto& [key, value] : named)
+      for (std::size_t i; (i = out.find(key)) != std::string::npos;) out.replace(i, std::strlen(key), value);
+    for (std::size_t b = out.find('{'); b != std::string::npos; b = out.find('{', b + 1)) {
+      const std::size_t star = out.find_first_not_of("0123456789", b + 1), e = out.find('}', b);
+      if (star == b + 1 || star == std::string::npos || out[star] != '*' || e == std::string::npos) continue;
+      std::string text;
+      for (int n = std::stoi(out.substr(b + 1, star - b - 1)); n > 0; --n) text += out.substr(star + 1, e - star - 1);
+      out.replace(b, e - b + 1, text);
     }
     return out;
   }
