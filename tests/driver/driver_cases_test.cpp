@@ -12,6 +12,7 @@
 #include "driver/logical_units.hpp"
 #include "driver/message_text.hpp"
 #include "driver/record_files.hpp"
+#include "driver/record_stream.hpp"
 #include "suite_env.hpp"
 #include "support/case_script.hpp"
 #include "support/subprocess.hpp"
@@ -23,10 +24,6 @@ using test::Words;
 
 class DriverCases : public test::SuiteEnv, public ::testing::WithParamInterface<test::ScriptCase> {
  protected:
-  void SetUp() override {
-    test::SuiteEnv::SetUp();
-    detail::reset_message_tables();
-  }
   // "@tmp" and "@txt" are the suite's two directories.
   std::string at(std::string s) const {
     for (const auto& [key, value] : {std::pair{"@tmp", tmp.path().string()}, std::pair{"@txt", txt_dir()}})
@@ -110,17 +107,48 @@ void DriverCases::run(const Words& raw) {
     test::write_bytes(w[1], test::record_file(records));
   } else if (op == "chop") {
     test::Bytes b = test::read_bytes(w.at(1));
-    b.pop_back();
+    b.resize(b.size() - (w.size() > 2 ? std::stoul(w[2]) : 1));
     test::write_bytes(w[1], b);
+  } else if (op == "poke") {  // PATH OFFSET HEX: the bytes from OFFSET on, the file grown if need be
+    test::Bytes b = test::read_bytes(w.at(1));
+    for (std::size_t at = std::stoul(w.at(2)), i = 0; i + 1 < w.at(3).size(); i += 2, ++at) {
+      b.resize(std::max(b.size(), at + 1));
+      b[at] = static_cast<std::uint8_t>(std::stoul(w[3].substr(i, 2), nullptr, 16));
+    }
+    test::write_bytes(w[1], b);
+  } else if (op == "write-records") {  // PATH then each record's length (bytes 1, 8, 15, ...)
+    RecordWriter writer;
+    EXPECT_TRUE(writer.create(w.at(1)));
+    for (std::size_t i = 2; i < w.size(); ++i) {
+      test::Bytes r(std::stoul(w[i]));
+      for (std::size_t k = 0; k < r.size(); ++k) r[k] = static_cast<std::uint8_t>(k * 7 + 1);
+      EXPECT_TRUE(writer.write(r));
+    }
+    EXPECT_TRUE(writer.close());
+  } else if (op == "read-records") {  // PATH then "end N" (records), or [open-]fault KIND RECORD
+    const char* const kinds[] = {"none",    "unreadable",   "unwritable", "disk-full", "not-record-file",
+                                 "damaged", "short-record", "non-finite"};
+    RecordReader reader;
+    const bool opened = reader.open(w.at(1));
+    test::Bytes head(12);
+    std::size_t length = 0, records = 0;
+    ReadStatus s = ReadStatus::kFault;
+    while (opened && (s = reader.read(head, length)) == ReadStatus::kRecord) ++records;
+    const RecordFaultInfo& f = reader.fault();
+    EXPECT_EQ(s == ReadStatus::kEnd ? "end " + std::to_string(records)
+                                    : (opened ? "fault " : "open-fault ") + std::string(kinds[static_cast<int>(f.fault)]) +
+                                          " " + std::to_string(f.record) + " " + f.path,
+              w.at(2) + " " + w.at(3) + (w.size() > 4 ? " " + w[4] + " " + w[1] : ""));
   } else if (op == "remove") std::filesystem::remove(w.at(1));
   else if (op == "mkdir") std::filesystem::create_directories(w.at(1));
   else if (op == "present") EXPECT_EQ(std::filesystem::exists(w.at(1)) ? "yes" : "no", w.at(2));
   else if (op == "same") EXPECT_EQ(test::read_bytes(w.at(1)), test::read_bytes(w.at(2)));
   else if (op == "size") EXPECT_EQ(test::read_bytes(w.at(1)).size(), std::stoul(w.at(2)));
-  else if (op == "hex" || op == "head") {  // the whole file, or its first bytes
+  else if (op == "hex" || op == "head" || op == "at") {  // the whole file, its first bytes, or those from OFFSET
     std::string hex;
     for (std::uint8_t b : test::read_bytes(w.at(1))) hex += {"0123456789abcdef"[b >> 4], "0123456789abcdef"[b & 15]};
-    EXPECT_EQ(op == "hex" ? hex : hex.substr(0, w.at(2).size()), w.at(2));
+    const std::string& want = w.at(op == "at" ? 3 : 2);
+    EXPECT_EQ(op == "hex" ? hex : hex.substr(op == "at" ? 2 * std::stoul(w[2]) : 0, want.size()), want);
   } else if (op == "file-exists") {
     file_exists(name.data(), length, yes);
     EXPECT_EQ(yes ? "yes" : "no", w.at(2));
@@ -204,7 +232,7 @@ void DriverCases::run(const Words& raw) {
 TEST_P(DriverCases, Run) { test::run_script(GetParam(), [this](const Words& w) { run(w); }); }
 
 INSTANTIATE_TEST_SUITE_P(Data, DriverCases,
-                         ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool", "levels"})),
+                         ::testing::ValuesIn(test::load_script_cases({"names", "messages", "zonetool", "levels", "records"})),
                          test::case_name);
 
 }  // namespace

@@ -2,20 +2,13 @@
 // cutting and padding, and the not-found text of a missing general file.
 #include <gtest/gtest.h>
 
-#include "driver/detail/message_tables.hpp"
 #include "driver/message_text.hpp"
 #include "suite_env.hpp"
 
 namespace zt {
 namespace {
 
-class MessageText : public test::SuiteEnv {
- protected:
-  void SetUp() override {
-    test::SuiteEnv::SetUp();
-    detail::reset_message_tables();
-  }
-};
+class MessageText : public test::SuiteEnv {};
 
 TEST_F(MessageText, BufferFormCutsPadsAndMeasures) {
   const std::string f = tmp.file("long.txt");

@@ -1,7 +1,7 @@
 // A suite environment for tests that expand names: $TMP is a scratch
-// directory (KVLTMPDIR), ?TXT a second one (TXTPATH), KVLLANG "fr", and an
+// directory (KVLTMPDIR), ?TXT a second one (TXTPATH), KVLLANG "fr", an
 // installation directory with an empty configuration so that undefined
-// variables never reach a real one.
+// variables never reach a real one, and no message texts read yet.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -10,6 +10,7 @@
 #include <filesystem>
 #include <string>
 
+#include "driver/detail/message_tables.hpp"
 #include "test_files.hpp"
 
 namespace zt::test {
@@ -25,6 +26,7 @@ class SuiteEnv : public ::testing::Test {
     ::setenv("TXTPATH", txt_dir().c_str(), 1);
     ::setenv("KVLLANG", "fr", 1);
     ::unsetenv("KVLNULL");
+    detail::reset_message_tables();
   }
   std::string txt_dir() const { return (home.path() / "txt").string(); }
   std::string txt(const std::string& name) const { return txt_dir() + "/" + name; }

@@ -1,8 +1,7 @@
-// The status marker, the message file and the console echo, as the calling
-// suite reads them.
+// The error report's ends of the process: a stop that leaves the empty
+// marker, and the fatal report with its exit status (the marker, the
+// message file and the console echo of a running process: data/report.cases).
 #include "runtime/error_report.hpp"
-
-#include <unistd.h>
 
 #include <cctype>
 #include <cstdlib>
@@ -20,38 +19,19 @@ class ErrorReportTest : public testing::RuntimeTest {
     RuntimeTest::SetUp();
     std::filesystem::create_directories(path("tmp"));
     set_env("KVLTMPDIR", path("tmp"));
-    marker_ = "tmp/erreur.tmp." + std::to_string(::getpid());
   }
-  std::int32_t message(const std::string& text) {
-    const auto length = static_cast<std::int32_t>(text.size());
-    return report_message(text.data(), length);
-  }
-  std::string marker_;
 };
-
-TEST_F(ErrorReportTest, MarkerLivesUntilNormalEnd) {
-  ASSERT_EQ(report_begin(nullptr), 0);
-  EXPECT_EQ(read_file(marker_), "");
-  EXPECT_EQ(report_end(), 0);
-  EXPECT_FALSE(exists(marker_));
-  EXPECT_EQ(report_end(), 0);  // already gone: no failure
-  write_file(marker_, "old text");
-  ASSERT_EQ(report_begin("start"), 0);  // truncates
-  EXPECT_EQ(read_file(marker_), "start");
-  const std::string status = "status text   ";
-  EXPECT_EQ(report_status(status.data(), static_cast<std::int32_t>(status.size())), 0);
-  EXPECT_EQ(read_file(marker_), "status text");
-}
 
 TEST_F(ErrorReportTest, StopOnErrorLeavesEmptyMarker) {
   EXPECT_EXIT(
       {
+        const std::int32_t length = 23;
         report_begin(nullptr);
-        message("Pas de Zones de Reprise");
+        report_message("Pas de Zones de Reprise", length);
         std::exit(0);
       },
       ::testing::ExitedWithCode(0), "");
-  EXPECT_EQ(read_file(marker_.substr(0, marker_.rfind('.'))), std::nullopt);
+  EXPECT_EQ(read_file("tmp/erreur.tmp"), std::nullopt);
   // The child's marker carries the child's pid: exactly one marker, empty.
   int markers = 0;
   for (const auto& entry : std::filesystem::directory_iterator(path("tmp"))) {
@@ -62,37 +42,6 @@ TEST_F(ErrorReportTest, StopOnErrorLeavesEmptyMarker) {
   }
   EXPECT_EQ(markers, 1);
   EXPECT_EQ(read_file("tmp/kvlerror.prg"), "Pas de Zones de Reprise");
-}
-
-TEST_F(ErrorReportTest, MessagesGoToConsoleAndMessageFile) {
-  ::testing::internal::CaptureStdout();
-  EXPECT_EQ(message("A"), 0);
-  EXPECT_EQ(message("B   "), 0);
-  EXPECT_EQ(message("\tC\t "), 0);  // only spaces are trailing blanks
-  EXPECT_EQ(::testing::internal::GetCapturedStdout(), "A\nB\n\tC\t\n");
-  EXPECT_EQ(read_file("tmp/kvlerror.prg"), "AB\tC\t");
-}
-
-TEST_F(ErrorReportTest, BlankMessageCreatesMessageFileSilently) {
-  ::testing::internal::CaptureStdout();
-  EXPECT_EQ(message("     "), 0);
-  const std::int32_t zero = 0;
-  EXPECT_EQ(report_message(nullptr, zero), 0);
-  EXPECT_EQ(::testing::internal::GetCapturedStdout(), "");
-  EXPECT_EQ(read_file("tmp/kvlerror.prg"), "");
-  EXPECT_EQ(report_mark_empty(), 0);
-  EXPECT_EQ(read_file("tmp/errvide.tmp"), "");
-}
-
-// Regression: a status marker that cannot be created must be a reliable -1,
-// never a marker at the filesystem root or a silent success.
-TEST_F(ErrorReportTest, BeginFailsWhenMarkerCannotBeCreated) {
-  set_env("KVLTMPDIR", path("missing"));
-  EXPECT_EQ(report_begin(nullptr), -1);
-  EXPECT_EQ(message("x"), -1);
-  unset_env("KVLTMPDIR");  // and no workzone either
-  EXPECT_EQ(report_begin(nullptr), -1);
-  EXPECT_FALSE(fatals.empty());
 }
 
 TEST_F(ErrorReportTest, FatalReportAndExitStatus) {

@@ -1,6 +1,7 @@
 // Path expansion beyond the cases of data/expansion.cases: arguments no text
 // can carry, deep and doubling references, the zone hook, random texts, the
-// small-buffer hunting aids, and the default fatal end of a missing workzone.
+// small-buffer hunting aids, and the default fatal end of a missing workzone
+// (and of a tracked block's fault).
 #include "runtime/path_expansion.hpp"
 
 #include <cstring>
@@ -8,6 +9,7 @@
 #include <string>
 
 #include "runtime/environment.hpp"
+#include "runtime/tracked_alloc.hpp"
 #include "runtime_fixture.hpp"
 
 namespace zt {
@@ -128,6 +130,14 @@ TEST_F(ExpansionTest, DefaultFatalHandlerEndsWithStatusMinusOne) {
         temp_directory();
       },
       ::testing::ExitedWithCode(255), "KVLZONE is not defined");
+  // The tracked allocator's faults end the same way.
+  EXPECT_EXIT(
+      {
+        set_fatal_handler(nullptr);
+        int local = 0;
+        tracked_free(&local);
+      },
+      ::testing::ExitedWithCode(255), "Trying to free unallocated or corrupt memory");
 }
 
 }  // namespace

@@ -1,5 +1,6 @@
 // Binary record readers beyond the cases of data/readers.cases: open
-// statuses, the sequential reader's segmented read and its damage.
+// statuses no file name can give, the sequential reader's segmented read and
+// its damage.
 #include "runtime/record_readers.hpp"
 
 #include <gtest/gtest.h>
@@ -38,7 +39,6 @@ TEST_F(RecordReaders, OpenStatuses) {
   CKvlBinaryResFileReader r;
   EXPECT_EQ(r.openPoints(nullptr), -1);
   EXPECT_EQ(r.openPoints(""), -1);
-  EXPECT_EQ(r.openPoints(dir.file("missing").c_str()), -2);
   // A socket has a size but cannot be opened as a file, even by root.
   const std::string sock = dir.file("sock");
   const int fd = socket(AF_UNIX, SOCK_STREAM, 0);
@@ -48,11 +48,6 @@ TEST_F(RecordReaders, OpenStatuses) {
   ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr), 0);
   EXPECT_EQ(r.openPoints(sock.c_str()), -3);
   ::close(fd);
-  const std::pair<std::string, int> cases[] = {{"", -4}, {"K", -4}, {"k\x82", -5}, {"K\x08" "abc", -6}};
-  for (const auto& [bytes, status] : cases) {
-    EXPECT_EQ(r.openPoints(write("f", bytes).c_str()), status) << bytes;
-    EXPECT_FALSE(r.isOpen());
-  }
   EXPECT_EQ(r.close(), 0);
   EXPECT_EQ(r.readBytes(nullptr, 1), -2);
   EXPECT_EQ(r.seek(0, 0), -1);
@@ -63,12 +58,6 @@ TEST_F(RecordReaders, SegmentedRecordsAndSkipping) {
   for (size_t i = 0; i < big.size(); ++i) big[i] = static_cast<char>(i * 7);
   const std::string exact(128, 'a');
   const std::string bytes = file_of({big, big, exact, "xy"});
-  // The layout itself: 129-byte continuation marks, then the rest's length.
-  ASSERT_EQ(bytes.size(), 1 + 306 * 2 + 130 + 4 + 1u);
-  EXPECT_EQ(static_cast<unsigned char>(bytes[1]), 129);
-  EXPECT_EQ(static_cast<unsigned char>(bytes[131]), 129);
-  EXPECT_EQ(static_cast<unsigned char>(bytes[261]), 44);
-
   CZi4UnformattedSequentialFileReader r;
   ASSERT_EQ(r.openSequential(write("seg", bytes).c_str()), 0);
   EXPECT_EQ(r.nextRecord(nullptr, 0), 300);

@@ -2,6 +2,7 @@
 // named test in a fresh RuntimeTest, its commands in order (described at the
 // top of data/expansion.cases).
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cstring>
@@ -12,10 +13,13 @@
 #include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
+#include "runtime/dynamic_storage.hpp"
 #include "runtime/environment.hpp"
+#include "runtime/error_report.hpp"
 #include "runtime/path_expansion.hpp"
 #include "runtime/progress.hpp"
 #include "runtime/record_readers.hpp"
+#include "runtime/tracked_alloc.hpp"
 #include "runtime_fixture.hpp"
 #include "support/case_script.hpp"
 #include "support/record_bytes.hpp"
@@ -28,12 +32,26 @@ using test::Words;
 
 class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInterface<ScriptCase> {
  protected:
-  // "@" before "/" or at the end of a word is the test directory; a relative
-  // path lies in it.
+  // "@" before "/" or at the end of a word is the test directory (a relative
+  // path lies in it), "<pid>" this process's id, "<serial>" the serial of the
+  // last tracked block, "<maximum>" the permanent maximum the case set,
+  // "{N*TEXT}" TEXT N times.
   std::string at(const std::string& s) const {
     std::string out;
     for (std::size_t i = 0; i < s.size(); ++i)
       out += s[i] == '@' && (i + 1 == s.size() || s[i + 1] == '/') ? dir_ : s.substr(i, 1);
+    const std::pair<const char*, std::string> named[] = {{"<pid>", std::to_string(::getpid())},
+                                                         {"<serial>", std::to_string(tracked_counters().next_serial - 1)},
+                                                         {"<maximum>", std::to_string(maximum_)}};
+    for (const auto& [key, value] : named)
+      for (std::size_t i; (i = out.find(key)) != std::string::npos;) out.replace(i, std::strlen(key), value);
+    for (std::size_t b = out.find('{'); b != std::string::npos; b = out.find('{', b + 1)) {
+      const std::size_t star = out.find_first_not_of("0123456789", b + 1), e = out.find('}', b);
+      if (star == b + 1 || star == std::string::npos || out[star] != '*' || e == std::string::npos) continue;
+      std::string text;
+      for (int n = std::stoi(out.substr(b + 1, star - b - 1)); n > 0; --n) text += out.substr(star + 1, e - star - 1);
+      out.replace(b, e - b + 1, text);
+    }
     return out;
   }
   std::string in_dir(const std::string& s) const { return (std::filesystem::path(dir_) / at(s)).string(); }
@@ -60,6 +78,12 @@ class RuntimeCases : public testing::RuntimeTest, public ::testing::WithParamInt
   std::size_t messages_seen_ = 0;
   ConfigTable table_;
   std::size_t warnings_seen_ = 0, fatals_seen_ = 0;
+  std::unique_ptr<DynamicStorage, void (*)(DynamicStorage*)> arena_{nullptr, ds_destroy};
+  TrackedCounters counted_{};
+  std::uint64_t maximum_ = 0;  // as the case set it
+  std::map<std::string, void*> blocks_;  // tracked blocks by name; "local" is no block
+  int local_ = 0;
+  void* block(const std::string& name) { return name == "local" ? &local_ : blocks_[name]; }
 };
 
 void RuntimeCases::run(const Words& raw) {
@@ -71,7 +95,7 @@ void RuntimeCases::run(const Words& raw) {
   if (op == "env") set_env(w.at(1), w.at(2));
   else if (op == "unenv") unset_env(w.at(1));
   else if (op == "file") write_file(w.at(1), w.at(2));
-  else if (op == "config") write_install_config(w.at(1));
+  else if (op == "config") write_file("home/config/environ.cfg", w.at(1));  // the installation's own
   else if (op == "mkdir") std::filesystem::create_directories(in_dir(w.at(1)));
   else if (op == "remove") std::filesystem::remove(in_dir(w.at(1)));
   else if (op == "exists") {
@@ -104,6 +128,7 @@ void RuntimeCases::run(const Words& raw) {
     for (std::size_t i = 1; i + 1 < w.size(); ++i)
       EXPECT_EQ(load_messages(in_dir(w[i]), table_) ? "yes" : "no", w.back());
   } else if (op == "value") EXPECT_EQ(shown(table_.value(w.at(1), w.at(2))), w.at(3));
+  else if (op == "value-cut") EXPECT_LE(table_.value(w.at(1), w.at(2)).value_or("").size(), kMaxResolvedValue);
   else if (op == "origin") EXPECT_EQ(table_.origin(w.at(1), w.at(2)), w.at(3));
   else if (op == "installed-origin") EXPECT_EQ(configuration().origin(w.at(1), w.at(2)), w.at(3));
   else if (op == "environment") load_environment();
@@ -142,6 +167,7 @@ void RuntimeCases::run(const Words& raw) {
     EXPECT_EQ(reader_->openPoints(in_dir(w.at(1)).c_str()), status(2));
   } else if (op == "get") {  // the reader's NAME is VALUE
     const std::map<std::string, std::function<double()>> get = {
+        {"isOpen", [&] { return reader_->isOpen(); }},
         {"recordSize", [&] { return reader_->recordSize(); }},
         {"recordCount", [&] { return reader_->recordCount(); }},
         {"hasCode", [&] { return reader_->hasCode(); }},
@@ -174,6 +200,52 @@ void RuntimeCases::run(const Words& raw) {
     ::testing::internal::CaptureStdout();
     progress(status(1), status(2));
     EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(3));
+  } else if (op == "report") {  // begin|status|message TEXT|- STATUS, or end|mark-empty STATUS
+    const char* text = w.size() > 3 && w[2] != "-" ? w[2].c_str() : nullptr;
+    const auto n = static_cast<std::int32_t>(text ? w[2].size() : 0);
+    const std::string& call = w.at(1);
+    EXPECT_EQ(call == "begin" ? report_begin(text) : call == "status" ? report_status(text, n)
+              : call == "message" ? report_message(text, n) : call == "end" ? report_end() : report_mark_empty(),
+              status(w.size() - 1));
+  } else if (op == "capture") ::testing::internal::CaptureStdout();
+  else if (op == "stdout") EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(1));
+  else if (op == "counters") counted_ = tracked_counters();
+  else if (op == "counted") {  // BYTES PERMANENT SERIALS since "counters" ("*": not checked)
+    const TrackedCounters now = tracked_counters();
+    const std::uint64_t change[] = {now.bytes_in_use - counted_.bytes_in_use,
+                                    now.permanent_bytes - counted_.permanent_bytes, now.next_serial - counted_.next_serial};
+    for (std::size_t i = 1; i < 4; ++i) {
+      if (w.at(i) != "*") { EXPECT_EQ(change[i - 1], std::stoull(w[i])) << "counter " << i; }
+    }
+  } else if (op == "alloc" || op == "realloc") {  // NAME temporary|permanent SIZE yes|no
+    const bool permanent = w.at(2) == "permanent";
+    const std::uint64_t n = std::stoull(w.at(3));
+    void* p = op == "alloc" ? (permanent ? permanent_alloc(n) : _Wmalloc(n))
+                            : _Wrealloc(permanent ? kBlockPermanent : kBlockTemporary, block(w[1]), n);
+    EXPECT_EQ(p ? "yes" : "no", w.at(4));
+    if (p) blocks_[w[1]] = p;
+  } else if (op == "free") EXPECT_EQ(tracked_free(block(w.at(1))), status(2));
+  else if (op == "fill") std::memset(block(w.at(1)), std::stoi(w.at(2)), std::stoul(w.at(3)));
+  else if (op == "byte") EXPECT_EQ(static_cast<unsigned char*>(block(w.at(1)))[std::stoul(w.at(2))], std::stoi(w.at(3)));
+  else if (op == "maximum") {  // N, or +N above the permanent bytes now
+    const std::uint64_t above = w.at(1)[0] == '+' ? tracked_counters().permanent_bytes : 0;
+    set_permanent_maximum(maximum_ = above + std::stoull(w[1].substr(above ? 1 : 0)));
+  } else if (op == "arena") {  // SIZE yes|no: the case's new arena, or none made
+    arena_.reset(ds_create(std::stoll(w.at(1))));
+    EXPECT_EQ(arena_ ? "yes" : "no", w.at(2));
+  } else if (op == "arena-string") EXPECT_EQ(ds_store_string(arena_.get(), w.at(1)), status(2));
+  else if (op == "arena-reserve") EXPECT_EQ(ds_reserve(arena_.get(), std::stoll(w.at(1))), status(2));
+  else if (op == "arena-growth") arena_->growth = status(1);
+  else if (op == "arena-trim") ds_trim(arena_.get());
+  else if (op == "arena-size") {  // USED|* CAPACITY
+    if (w.at(1) != "*") { EXPECT_EQ(arena_->used, status(1)); }
+    count(static_cast<std::size_t>(arena_->capacity), w.at(2));
+  } else if (op == "arena-at") {  // HANDLE then <none>, "?" (something) or the string there
+    const auto* p = static_cast<const char*>(ds_deref(arena_.get(), status(1)));
+    EXPECT_EQ(!p ? "<none>" : w.at(2) == "?" ? "?" : std::string(p), w.at(2));
+  } else if (op == "warning-start") {
+    ASSERT_FALSE(warnings.empty());
+    EXPECT_EQ(warnings.back().rfind(w.at(1), 0), 0u) << warnings.back();
   } else if (op == "warning") next(warnings, warnings_seen_, w.at(1));
   else if (op == "fatal") next(fatals, fatals_seen_, w.at(1));
   else if (op == "warnings") count(warnings.size(), w.at(1));
@@ -186,7 +258,7 @@ TEST_P(RuntimeCases, Run) { test::run_script(GetParam(), [this](const Words& w) 
 
 INSTANTIATE_TEST_SUITE_P(Data, RuntimeCases,
                          ::testing::ValuesIn(test::load_script_cases(
-                             {"expansion", "configuration", "workzone", "progress", "readers"})),
+                             {"expansion", "configuration", "workzone", "progress", "readers", "report", "storage", "tracked"})),
                          test::case_name);
 
 }  // namespace

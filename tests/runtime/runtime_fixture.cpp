@@ -26,8 +26,7 @@ const char* const kRuntimeVariables[] = {
 void RuntimeTest::SetUp() {
   dir_ = scratch_.path().string();
   for (const char* name : kRuntimeVariables) unset_env(name);
-  std::filesystem::create_directories(path("home/config"));
-  write_install_config("");
+  write_file("home/config/environ.cfg", "");
   set_env("KVLHOME", path("home"));
   fatals.clear();
   warnings.clear();
@@ -68,16 +67,8 @@ void RuntimeTest::write_file(const std::string& relative, const std::string& con
 }
 
 std::optional<std::string> RuntimeTest::read_file(const std::string& relative) const {
-  if (!exists(relative)) return std::nullopt;
+  if (!std::filesystem::exists(path(relative))) return std::nullopt;
   return test::read_text(path(relative));
-}
-
-bool RuntimeTest::exists(const std::string& relative) const {
-  return std::filesystem::exists(path(relative));
-}
-
-void RuntimeTest::write_install_config(const std::string& content) const {
-  write_file("home/config/environ.cfg", content);
 }
 
 }  // namespace zt::testing

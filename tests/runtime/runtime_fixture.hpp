@@ -27,9 +27,6 @@ class RuntimeTest : public ::testing::Test {
   std::string path(const std::string& relative) const { return dir_ + "/" + relative; }
   void write_file(const std::string& relative, const std::string& content) const;
   std::optional<std::string> read_file(const std::string& relative) const;
-  bool exists(const std::string& relative) const;
-  // Writes the installation's own environ.cfg (home is path("home")).
-  void write_install_config(const std::string& content) const;
 
   static std::vector<std::string> fatals;
   static std::vector<std::string> warnings;

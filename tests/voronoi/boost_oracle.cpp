@@ -39,16 +39,6 @@ bool Near(const std::vector<Pt>& b, Pt p, double tol) {
   return false;
 }
 
-// 1e-9 of the extent of the points (at least of 1).
-double ExtentTolerance(const std::vector<Pt>& pts) {
-  double minX = 1e300, maxX = -1e300, minY = 1e300, maxY = -1e300;
-  for (const Pt& p : pts) {
-    minX = std::min(minX, p.x), maxX = std::max(maxX, p.x);
-    minY = std::min(minY, p.y), maxY = std::max(maxY, p.y);
-  }
-  return 1e-9 * std::max({maxX - minX, maxY - minY, 1.0});
-}
-
 // The four corner points of the computed diagram, in user coordinates.
 struct Corners {
   std::vector<Pt> points;
@@ -160,7 +150,7 @@ Match ComparePoints(const std::vector<BPoint>& input) {
     const BPoint& s = input[v.incident_edge()->cell()->source_index()];
     return std::hypot(p.x - s.x(), p.y - s.y());
   };
-  return MatchBothWays(bd, clearance, nodes, ExtentTolerance(pts));
+  return MatchBothWays(bd, clearance, nodes, 1e-9 * std::max(Extent(pts), 1.0));
 }
 
 TEST(BoostOracle, RandomIntegerPoints) {
@@ -288,7 +278,7 @@ Match ComparePolygons(const std::vector<Polygon>& polys) {
     const double ax = double(s.low().x()), ay = double(s.low().y()), bx = double(s.high().x()), by = double(s.high().y());
     return std::fabs((bx - ax) * (p.y - ay) - (by - ay) * (p.x - ax)) / std::hypot(bx - ax, by - ay);
   };
-  return MatchBothWays(bd, clearance, nodes, ExtentTolerance(pts));
+  return MatchBothWays(bd, clearance, nodes, 1e-9 * std::max(Extent(pts), 1.0));
 }
 
 // Runs `rounds` random polygon sets, keeping the simple ones; the counts

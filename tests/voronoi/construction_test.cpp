@@ -17,19 +17,14 @@ class PointSets : public CaseRows {};
 TEST_P(PointSets, KeepTheInvariantsAndTheExpectations) {
   const Keys k(row().field(1));
   Store(Generate(row().field(0)));
-  CheckingObserver obs;
-  obs.every = static_cast<int>(k.num("every", 1));
-  obs.allUpTo = static_cast<int>(k.num("allUpTo", 0));
-  if (obs.every > 0) obs.Attach();
-  const bool computed = ComputePoints();
-  ASSERT_EQ(computed, k.num("computed", 1) != 0);
-  if (!computed) {
+  const std::string error = CheckedCompute(true, int(k.num("every", 1)), k.num("brute", 1) != 0, int(k.num("allUpTo", 0)));
+  if (k.num("computed", 1) == 0) {
+    EXPECT_EQ(error, "not computed");
     EXPECT_FALSE(VD_IsUpToDate());
     EXPECT_EQ(VD_GetNodeCount(), 0);
     return;
   }
-  EXPECT_EQ(obs.firstError, "");
-  EXPECT_EQ(FinalCheck(k.num("brute", 1) != 0), "");
+  ASSERT_EQ(error, "");
   const vd::Engine& g = vd::Vd();
   const std::pair<const char*, double> values[] = {
       {"nodes", VD_GetNodeCount()},    {"edges", VD_GetEdgeCount()},  {"dups", VD_GetDuplicateCount()},

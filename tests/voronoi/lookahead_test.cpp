@@ -6,15 +6,13 @@
 // from that engine.
 #include <gtest/gtest.h>
 
-#include <unistd.h>
-
 #include <cstdint>
 #include <cstdio>
-#include <fstream>
 #include <string>
 #include <utility>
 #include <vector>
 
+#include "support/scratch_dir.hpp"
 #include "support/subprocess.hpp"
 
 namespace {
@@ -50,11 +48,10 @@ std::string RestartingInput() {
 }
 
 TEST(PointLookahead, DiagramWithRestartsIsThatOfOneDrawAtATime) {
-  const std::string file = testing::TempDir() + "zt_lookahead_" + std::to_string(getpid()) + ".txt";
-  std::ofstream(file) << RestartingInput();
+  const zt::test::ScratchDir dir;
+  zt::test::write_text(dir.file("in.txt"), RestartingInput());
   const zt::test::CommandRun r =
-      zt::test::run_command(zt::test::zonetool_path() + " voronoi " + file + " 2>/dev/null");
-  std::remove(file.c_str());
+      zt::test::run_command(zt::test::zonetool_path() + " voronoi " + dir.file("in.txt") + " 2>/dev/null");
   ASSERT_EQ(r.status, 0);
   ASSERT_NE(r.out.find("restarts 10 recovery 0\n"), std::string::npos) << r.out.substr(r.out.size() - 60);
   EXPECT_EQ(Fnv1a(r.out), 0x6ef67cf29e2a727dull);

@@ -37,15 +37,6 @@ inline InputSites SitesOf(const std::vector<Contour>& contours) {
   return in;
 }
 
-inline double Extent(const InputSites& in) {
-  double x0 = INFINITY, x1 = -INFINITY, y0 = INFINITY, y1 = -INFINITY;
-  for (const Pt& p : in.points) {
-    x0 = std::min(x0, p.x), x1 = std::max(x1, p.x);
-    y0 = std::min(y0, p.y), y1 = std::max(y1, p.y);
-  }
-  return std::max(x1 - x0, y1 - y0);
-}
-
 inline double DistToSegment(const Pt& p, const Seg2& s) {
   const double dx = s.b.x - s.a.x, dy = s.b.y - s.a.y;
   const double l2 = dx * dx + dy * dy;

@@ -30,25 +30,10 @@ Contour StarPolygon(int n, std::uint32_t seed, Pt centre = {0.5, 0.5}, double rm
   return c;
 }
 
-// Stores the sites of a generator list (see data/segment_diagrams.txt): its
-// contours first, then its loose points, open segments and links.
-void StoreList(const std::string& list);
-
-// Computes with the checker after every `every`-th insertion; "" or the
-// first error, of the diagram or of its segment edges.
-std::string RunChecked(const std::string& list, int every = 1, bool bruteForce = true) {
-  StoreList(list);
-  const std::string error = CheckedCompute(false, every, bruteForce);
-  return error.empty() ? vd::CheckSegmentEdges() : error;
-}
-
-bool Cross(Pt a, Pt b, Pt c, Pt d) {
-  const auto o = [](Pt p, Pt q, Pt r) { return (q.x - p.x) * (r.y - p.y) - (q.y - p.y) * (r.x - p.x); };
-  return o(a, b, c) * o(a, b, d) < 0 && o(c, d, a) * o(c, d, b) < 0;
-}
-
 // A random simple polygon: random points, crossings removed by 2-opt moves.
 Contour RandomSimplePolygon(int n, std::uint32_t seed) {
+  const auto o = [](Pt p, Pt q, Pt r) { return (q.x - p.x) * (r.y - p.y) - (q.y - p.y) * (r.x - p.x); };
+  const auto cross = [&](Pt a, Pt b, Pt c, Pt d) { return o(a, b, c) * o(a, b, d) < 0 && o(c, d, a) * o(c, d, b) < 0; };
   std::mt19937 rng(seed);
   std::uniform_real_distribution<double> u(0.0, 1.0);
   Contour c(n);
@@ -58,7 +43,7 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
     for (int i = 0; i < n; ++i) {
       for (int j = i + 2; j < n; ++j) {
         if (i == 0 && j == n - 1) continue;
-        if (Cross(c[i], c[i + 1], c[j], c[(j + 1) % n])) {
+        if (cross(c[i], c[i + 1], c[j], c[(j + 1) % n])) {
           std::reverse(c.begin() + i + 1, c.begin() + j + 1);
           changed = true;
         }
@@ -68,6 +53,8 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
   return c;
 }
 
+// Stores the sites of a generator list (see data/segment_diagrams.txt): its
+// contours first, then its loose points, open segments and links.
 void StoreList(const std::string& list) {
   std::vector<Contour> contours;
   std::vector<std::pair<std::string, std::vector<double>>> extras;
@@ -138,7 +125,10 @@ class SegmentDiagrams : public CaseRows {};
 
 TEST_P(SegmentDiagrams, AreSound) {
   const Keys k(row().field(1));
-  EXPECT_EQ(RunChecked(row().field(0), int(k.num("every", 1)), k.num("brute", 1) != 0), "");
+  StoreList(row().field(0));
+  // The checker after every `every`-th insertion and in full, then the segment edges.
+  const std::string error = CheckedCompute(false, int(k.num("every", 1)), k.num("brute", 1) != 0);
+  EXPECT_EQ(error.empty() ? vd::CheckSegmentEdges() : error, "");
   const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
   EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? VD_GetRestartCount() > 0 : VD_GetRestartCount() == 0))
       << VD_GetRestartCount();

@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <random>
@@ -90,6 +91,16 @@ inline std::vector<Pt> Generate(const std::string& list) {
   return pts;
 }
 
+// The larger side of the points' bounding box.
+inline double Extent(const std::vector<Pt>& pts) {
+  double x0 = INFINITY, x1 = -INFINITY, y0 = INFINITY, y1 = -INFINITY;
+  for (const Pt& p : pts) {
+    x0 = std::min(x0, p.x), x1 = std::max(x1, p.x);
+    y0 = std::min(y0, p.y), y1 = std::max(y1, p.y);
+  }
+  return std::max(x1 - x0, y1 - y0);
+}
+
 // Resets the engine (initialising it once) and stores the points with their
 // order number as tag.
 inline void Store(const std::vector<Pt>& pts) {
@@ -117,32 +128,6 @@ inline void StoreContours(const std::vector<Contour>& contours, std::int32_t poi
 inline bool ComputePoints() { return VD_ComputeDiagram(false, 1, true, false, 0, 0, 0.0, 0.0, true); }
 inline bool ComputeSegments() { return VD_ComputeDiagram(false, 1, false, false, 0, 0, 0.0, 0.0, true); }
 
-// Runs the checker after every insertion (local emptiness) and in full
-// (brute force) at the end; the first failure is kept.
-struct CheckingObserver {
-  std::string firstError;
-  std::int32_t insertions = 0;
-  std::int32_t every = 1;        // check after every `every`-th insertion ...
-  std::int32_t allUpTo = 0;      // ... but after each of the first `allUpTo`
-
-  static void Hook(void* self, std::int32_t) {
-    auto* o = static_cast<CheckingObserver*>(self);
-    ++o->insertions;
-    if (!o->firstError.empty()) return;
-    if (o->insertions > o->allUpTo && o->insertions % o->every != 0) return;
-    o->firstError = vd::CheckDiagram();
-    if (!o->firstError.empty()) o->firstError = "after insertion " + std::to_string(o->insertions) + ": " + o->firstError;
-  }
-  void Attach() {
-    vd::Vd().insertionObserver = &Hook;
-    vd::Vd().insertionObserverContext = this;
-  }
-  ~CheckingObserver() {
-    vd::Vd().insertionObserver = nullptr;
-    vd::Vd().insertionObserverContext = nullptr;
-  }
-};
-
 inline std::string FinalCheck(bool bruteForce = true) {
   vd::CheckOptions o;
   o.bruteForce = bruteForce;
@@ -150,16 +135,28 @@ inline std::string FinalCheck(bool bruteForce = true) {
   return vd::CheckDiagram(o);
 }
 
-// Computes the stored sites with the checker after insertions (every
-// `every`-th, each of the first `allUpTo`; none for 0) and in full at the
-// end: "" or the first error.
+// Computes the stored sites with the checker (local emptiness) after
+// insertions (every `every`-th, each of the first `allUpTo`; none for 0) and
+// in full at the end: "" or the first error.
 inline std::string CheckedCompute(bool pointsOnly = true, int every = 1, bool bruteForce = true, int allUpTo = 0) {
-  CheckingObserver obs;
-  obs.every = every;
-  obs.allUpTo = allUpTo;
-  if (every > 0) obs.Attach();
-  if (!VD_ComputeDiagram(false, 1, pointsOnly, false, 0, 0, 0.0, 0.0, true)) return "not computed";
-  return obs.firstError.empty() ? FinalCheck(bruteForce) : obs.firstError;
+  struct Observer {
+    std::string error;
+    std::int32_t insertions, every, allUpTo;
+    static void Hook(void* self, std::int32_t) {
+      auto* o = static_cast<Observer*>(self);
+      ++o->insertions;
+      if (!o->error.empty() || (o->insertions > o->allUpTo && o->insertions % o->every != 0)) return;
+      o->error = vd::CheckDiagram();
+      if (!o->error.empty()) o->error = "after insertion " + std::to_string(o->insertions) + ": " + o->error;
+    }
+  } obs{"", 0, every, allUpTo};
+  vd::Vd().insertionObserver = every > 0 ? &Observer::Hook : nullptr;
+  vd::Vd().insertionObserverContext = &obs;
+  const bool computed = VD_ComputeDiagram(false, 1, pointsOnly, false, 0, 0, 0.0, 0.0, true);
+  vd::Vd().insertionObserver = nullptr;
+  vd::Vd().insertionObserverContext = nullptr;
+  if (!computed) return "not computed";
+  return obs.error.empty() ? FinalCheck(bruteForce) : obs.error;
 }
 
 // The computed diagram as numbers: every node (live, x, y, r) and edge

@@ -3,14 +3,11 @@
 // offset store, messages) and the figures of a printed diagram.
 #include <gtest/gtest.h>
 
-#include <unistd.h>
-
-#include <algorithm>
-#include <fstream>
 #include <sstream>
 #include <string>
 
 #include "support/case_rows.hpp"
+#include "support/scratch_dir.hpp"
 #include "support/subprocess.hpp"
 
 namespace zt::vdtest {
@@ -28,16 +25,11 @@ std::string Unescape(const std::string& s) {
   return out;
 }
 
-// Runs `zonetool <subcommand> <input file> <args>`; one input file per test
-// and process, as ctest runs the cases side by side.
+// Runs `zonetool <subcommand> <input file> <args>` on an input file of its own.
 ToolRun Zonetool(const std::string& subcommand, const std::string& text, const std::string& args = "") {
-  std::string name = testing::UnitTest::GetInstance()->current_test_info()->name();
-  std::replace(name.begin(), name.end(), '/', '_');
-  std::ostringstream file, command;
-  file << testing::TempDir() << "zt_" << subcommand << "_" << name << "_" << getpid() << ".txt";
-  std::ofstream(file.str()) << text;
-  command << test::zonetool_path() << " " << subcommand << " " << file.str() << " " << args << " 2>&1";
-  return test::run_command(command.str());
+  test::ScratchDir dir;
+  test::write_text(dir.file("in.txt"), text);
+  return test::run_command(test::zonetool_path() + " " + subcommand + " " + dir.file("in.txt") + " " + args + " 2>&1");
 }
 
 class ZonetoolCases : public CaseRows {};
