@@ -51,6 +51,10 @@ function(zt_add_test_suite name)
       add_dependencies(${name} ${prog})
     endif()
   endforeach()
+  # Data rows are named tests, listed when the suite is linked: a changed
+  # data file relinks the suite, so the list follows the data.
+  file(GLOB data LIST_DIRECTORIES false CONFIGURE_DEPENDS ${CMAKE_CURRENT_SOURCE_DIR}/data/*)
+  set_property(TARGET ${name} APPEND PROPERTY LINK_DEPENDS ${data})
   include(GoogleTest)
   gtest_discover_tests(${name} DISCOVERY_TIMEOUT 60 PROPERTIES TIMEOUT 600)
 endfunction()
