@@ -17,6 +17,12 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
   // Slots advance in order, so the searches run in draw order.
   for (int i = 0; i < count_; ++i) {
     Slot& s = At(i);
+    if (s.stage == kDrawn && i >= kSearchedSlots && i <= kCellsSlot) {
+      // Its record was requested an insertion ago (or, on the first call,
+      // just now).
+      s.x = g.points[s.point].x;
+      s.y = g.points[s.point].y;
+    }
     if (i < kSearchedSlots) {
       if (s.stage == kSearched) continue;
       s.nearest = FindAndInsertNearest(s.point);
@@ -27,8 +33,6 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
       PrefetchNearestEntries(s.x, s.y);
       s.stage = kEntriesRequested;
     } else if (i <= kCellsSlot && s.stage < kCellsRequested) {
-      s.x = g.points[s.point].x;
-      s.y = g.points[s.point].y;
       PrefetchNearestCells(s.x, s.y);
       s.pathNode = NearestPathStart();
       s.stage = kCellsRequested;
