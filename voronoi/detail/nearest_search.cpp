@@ -68,7 +68,6 @@ class NearestPointSearch {
   void Build(std::int32_t total, double minX, double minY, double maxX, double maxY);
   void Insert(std::int32_t p);
   std::int32_t FindAndInsert(std::int32_t p, double& dist2);
-  SearchStats Stats() const { return {quadtree_, cols_, rows_}; }
   void PrefetchCells(double x, double y, bool entries) const;
   std::int32_t PathStart() const { return quadtree_ && !quad_.empty() ? 0 : -1; }
   std::int32_t PathStep(std::int32_t node, double x, double y) const;
@@ -393,11 +392,6 @@ void ReleaseNearestSearch() {
   Engine& g = Vd();
   delete g.search;
   g.search = nullptr;
-}
-
-SearchStats NearestSearchStats() {
-  const Engine& g = Vd();
-  return g.search ? g.search->Stats() : SearchStats{};
 }
 
 }  // namespace zt::vd

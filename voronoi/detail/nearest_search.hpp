@@ -14,12 +14,6 @@ namespace zt::vd {
 // Squared distance at or below which two points are the same point.
 inline constexpr double kCoincidentDist2 = 1e-22;
 
-struct SearchStats {
-  bool quadtree = false;  // the structure switched to the point quadtree
-  std::int32_t gridColumns = 0;
-  std::int32_t gridRows = 0;
-};
-
 // Builds the structure over the bounding box of the engine's points for
 // `totalPoints` points (dummies included). Replaces any previous one.
 void BuildNearestSearch(std::int32_t totalPoints, double minX, double minY, double maxX,
@@ -46,6 +40,5 @@ void PrefetchNearestEntries(double x, double y);
 std::int32_t NearestPathStart();
 std::int32_t NearestPathStep(std::int32_t node, double x, double y);
 void ReleaseNearestSearch();
-SearchStats NearestSearchStats();
 
 }  // namespace zt::vd
