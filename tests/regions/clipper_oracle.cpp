@@ -23,6 +23,7 @@
 
 #include "region_test_support.hpp"
 #include "support/clipper_paths.hpp"
+#include "support/segment_distance.hpp"
 
 namespace zt::test {
 namespace {
@@ -132,20 +133,6 @@ Contour star(std::mt19937_64& rng, double cx, double cy, double rmin, double rma
   return c;
 }
 
-// Distance from (cx, cy) to the nearest edge of c.
-double inner_radius(const Contour& c, double cx, double cy) {
-  double best = 1e300;
-  for (std::size_t i = 0; i < c.size(); ++i) {
-    const Pt& p = c[i];
-    const Pt& q = c[(i + 1) % c.size()];
-    const double dx = q.x - p.x, dy = q.y - p.y;
-    double t = ((cx - p.x) * dx + (cy - p.y) * dy) / (dx * dx + dy * dy);
-    t = std::clamp(t, 0.0, 1.0);
-    best = std::min(best, std::hypot(p.x + t * dx - cx, p.y + t * dy - cy));
-  }
-  return best;
-}
-
 // Star-shaped contours (at most 0.7 pi between neighbours seen from the
 // centre, so the centre lies inside) with optional holes strictly inside.
 Region random_general(std::mt19937_64& rng) {
@@ -160,7 +147,7 @@ Region random_general(std::mt19937_64& rng) {
     const double rmax = parts == 2 ? 18 : 10 + 30 * u(rng);
     const double rmin = rmax * (0.4 + 0.4 * u(rng));
     r.push_back(star(rng, cx, cy, rmin, rmax, nv(rng), true));
-    const double room = inner_radius(r.back(), cx, cy);
+    const double room = ring_distance(Pt{cx, cy}, r.back());
     if (u(rng) < 0.4) r.push_back(star(rng, cx, cy, room * 0.2, room * 0.8, nv(rng), false));
   }
   return r;

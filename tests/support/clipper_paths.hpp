@@ -10,6 +10,8 @@
 #include <utility>
 #include <vector>
 
+#include "segment_distance.hpp"  // beside this file: benchmarks include it too
+
 namespace zt::test {
 
 namespace cl = ClipperLib;
@@ -49,12 +51,7 @@ struct Edge {
 
 inline double distance_to(double x, double y, const std::vector<Edge>& edges) {
   double best = 1e300;
-  for (const Edge& e : edges) {
-    const double dx = e.bx - e.ax, dy = e.by - e.ay;
-    const double len2 = dx * dx + dy * dy;
-    const double t = std::clamp(len2 > 0 ? ((x - e.ax) * dx + (y - e.ay) * dy) / len2 : 0.0, 0.0, 1.0);
-    best = std::min(best, std::hypot(x - e.ax - t * dx, y - e.ay - t * dy));
-  }
+  for (const Edge& e : edges) best = std::min(best, segment_distance(x, y, e.ax, e.ay, e.bx, e.by));
   return best;
 }
 

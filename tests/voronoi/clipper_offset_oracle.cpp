@@ -70,8 +70,7 @@ std::vector<Ring> ClipperOffsetOf(const std::vector<Ring>& rings, double delta) 
 
 double DistToRings(const Pt& p, const std::vector<Ring>& rings) {
   double m = INFINITY;
-  for (const Ring& r : rings)
-    for (std::size_t i = 0; i < r.size(); ++i) m = std::min(m, vdtest::DistToSegment(p, {r[i], r[(i + 1) % r.size()]}));
+  for (const Ring& r : rings) m = std::min(m, test::ring_distance(p, r));
   return m;
 }
 

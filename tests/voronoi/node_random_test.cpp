@@ -11,21 +11,15 @@
 #include <string>
 
 #include "support/case_rows.hpp"
+#include "support/segment_distance.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
 
 namespace zt::vd::geo {
 namespace {
 
-// Oracle distance to a closed segment, written apart from the product's.
-double seg_dist(Point2d q, Point2d a, Point2d b) {
-  const double dx = b.x - a.x, dy = b.y - a.y;
-  double t = ((q.x - a.x) * dx + (q.y - a.y) * dy) / (dx * dx + dy * dy);
-  t = t < 0 ? 0 : (t > 1 ? 1 : t);
-  return std::hypot(q.x - a.x - t * dx, q.y - a.y - t * dy);
-}
 double site_dist(const SiteRef& s, Point2d q) {
-  return s.kind == kKindPnt ? std::hypot(q.x - s.pnt.p.x, q.y - s.pnt.p.y) : seg_dist(q, s.seg.p1, s.seg.p2);
+  return s.kind == kKindPnt ? std::hypot(q.x - s.pnt.p.x, q.y - s.pnt.p.y) : test::segment_distance(q, s.seg.p1, s.seg.p2);
 }
 // A segment site claims only the points whose foot lies on it.
 double claim_dist(const SiteRef& s, Point2d q) {

@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "support/segment_distance.hpp"
 #include "vd_test_util.hpp"
 
 namespace zt::vdtest {
@@ -37,18 +38,10 @@ inline InputSites SitesOf(const std::vector<Contour>& contours) {
   return in;
 }
 
-inline double DistToSegment(const Pt& p, const Seg2& s) {
-  const double dx = s.b.x - s.a.x, dy = s.b.y - s.a.y;
-  const double l2 = dx * dx + dy * dy;
-  double u = l2 > 0 ? ((p.x - s.a.x) * dx + (p.y - s.a.y) * dy) / l2 : 0.0;
-  u = std::clamp(u, 0.0, 1.0);
-  return std::hypot(p.x - (s.a.x + u * dx), p.y - (s.a.y + u * dy));
-}
-
 inline double Clearance(const InputSites& in, const Pt& p) {
   double m = INFINITY;
   for (const Pt& q : in.points) m = std::min(m, std::hypot(p.x - q.x, p.y - q.y));
-  for (const Seg2& s : in.segments) m = std::min(m, DistToSegment(p, s));
+  for (const Seg2& s : in.segments) m = std::min(m, test::segment_distance(p, s.a, s.b));
   return m;
 }
 
