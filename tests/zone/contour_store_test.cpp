@@ -73,20 +73,18 @@ TEST_F(ContourStoreTest, OnlyADropBeyondTheToleranceOpensALevel) {
 TEST_F(ContourStoreTest, LookupCursorOnlyMovesForward) {
   ASSERT_EQ(load(record_bytes({{0, 0, 10}, {0, 0, 5}, {0, 0, 0}}, 12)), 0);
   ASSERT_EQ(store_.levelCount, 3);
-  EXPECT_EQ(find_contour_level(store_, 10.00005), 0);
-  EXPECT_EQ(find_contour_level(store_, 10.0), 0);  // the same z twice
-  EXPECT_EQ(store_.levelCursor, 0);
-  EXPECT_EQ(find_contour_level(store_, 7.0), -1);  // between 10 and 5
-  EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(find_contour_level(store_, 10.0), -1);  // above the cursor's level
-  EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(find_contour_level(store_, std::nan("")), -1);
-  EXPECT_EQ(find_contour_level(store_, 1e300), -1);
-  EXPECT_EQ(store_.levelCursor, 1);
-  EXPECT_EQ(find_contour_level(store_, 4.99995), 1);
-  EXPECT_EQ(find_contour_level(store_, -3.0), -1);  // below everything
-  EXPECT_EQ(store_.levelCursor, 3);
-  EXPECT_EQ(find_contour_level(store_, 0.0), -1);
+  // Each lookup in turn: z, the level found, the cursor after it.
+  const struct { double z; int level, cursor; } steps[] = {
+      {10.00005, 0, 0}, {10.0, 0, 0},  // the same z twice
+      {7.0, -1, 1},                    // between 10 and 5
+      {10.0, -1, 1},                   // above the cursor's level
+      {std::nan(""), -1, 1}, {1e300, -1, 1}, {4.99995, 1, 1},
+      {-3.0, -1, 3},  // below everything
+      {0.0, -1, 3}};
+  for (const auto& s : steps) {
+    EXPECT_EQ(find_contour_level(store_, s.z), s.level) << s.z;
+    EXPECT_EQ(store_.levelCursor, s.cursor) << s.z;
+  }
 }
 
 TEST_F(ContourStoreTest, FilesWithoutPointRecords) {
