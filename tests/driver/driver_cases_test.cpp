@@ -14,7 +14,7 @@
 #include "driver/record_files.hpp"
 #include "driver/record_stream.hpp"
 #include "suite_env.hpp"
-#include "support/case_script.hpp"
+#include "support/case_rows.hpp"
 #include "support/subprocess.hpp"
 
 namespace zt {

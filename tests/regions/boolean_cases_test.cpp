@@ -20,7 +20,7 @@ namespace {
 std::vector<TaggedPoint> records(std::string text, char sep = ' ') {
   std::replace(text.begin(), text.end(), sep, ' ');
   std::vector<TaggedPoint> out;
-  for (const std::string& w : Words(text)) {
+  for (const std::string& w : Split(text)) {
     const std::vector<double> v = Nums(w);
     out.push_back(w == "S" ? TaggedPoint::separator()
                            : TaggedPoint(v.size() > 2 ? static_cast<std::int32_t>(v[2]) : 0, v.at(0), v.at(1)));
@@ -32,7 +32,7 @@ std::vector<TaggedPoint> records(std::string text, char sep = ' ') {
 void operand(const std::string& field, TaggedPointList& l) {
   std::istringstream in(field);
   for (std::string c; std::getline(in, c, ';');) {
-    const bool open = Words(c).back() == "open";
+    const bool open = Split(c).back() == "open";
     std::vector<TaggedPoint> points = records(open ? c.substr(0, c.rfind("open")) : c);
     if (!open) points.push_back(points.front());
     for (const TaggedPoint& p : points) l.AddDoubling(p);

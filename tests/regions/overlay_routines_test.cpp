@@ -39,7 +39,7 @@ TaggedPoint record(const std::string& t) {
 class OverlayRoutines : public test::CaseRows {};
 
 TEST_P(OverlayRoutines, AsListed) {
-  const std::vector<std::string> call = test::Words(row().field(0)), want = test::Words(row().field(1));
+  const std::vector<std::string> call = test::Split(row().field(0)), want = test::Split(row().field(1));
   if (call[0] == "segment") {
     Point2d r1{-9, -9}, r2{-9, -9};
     SegmentDirection a, b;

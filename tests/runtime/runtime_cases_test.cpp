@@ -21,7 +21,7 @@
 #include "runtime/record_readers.hpp"
 #include "runtime/tracked_alloc.hpp"
 #include "runtime_fixture.hpp"
-#include "support/case_script.hpp"
+#include "support/case_rows.hpp"
 #include "support/record_bytes.hpp"
 
 namespace zt {

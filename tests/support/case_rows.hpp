@@ -1,8 +1,12 @@
-// Tests kept as data: rows of text files in the suite's data folder
-// (ZT_TEST_DATA_DIR), one case a line, fields split by '|', blank lines and
-// lines starting with '#' skipped. The first field names the case (letters,
-// digits, '_'); gtest shows it when the row fails. A file that cannot be
-// read gives one failing row.
+// Tests kept as data in the suite's data folder (ZT_TEST_DATA_DIR), in two
+// forms. Rows: one case a line, fields split by '|', blank lines and lines
+// starting with '#' skipped; the first field names the case (letters,
+// digits, '_'), which gtest shows when the row fails; a file that cannot be
+// read gives one failing row. Scripts: a .cases file holds "case NAME"
+// lines, each followed by its commands, one a line; "#" lines are comments;
+// words are blank-separated, and a quoted word may hold blanks and \n \r \t
+// \" \\ \xHH. A suite runs each case as one named TEST_P, its commands in
+// order.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -12,8 +16,10 @@
 #include <cstdlib>
 #include <fstream>
 #include <map>
+#include <ostream>
 #include <sstream>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace zt::test {
@@ -58,7 +64,8 @@ inline double Num(const std::string& word) {
   return sum;
 }
 
-inline std::vector<std::string> Words(const std::string& text) {
+// The blank-separated words of a text.
+inline std::vector<std::string> Split(const std::string& text) {
   std::istringstream s(text);
   std::vector<std::string> w;
   for (std::string x; s >> x;) w.push_back(x);
@@ -68,7 +75,7 @@ inline std::vector<std::string> Words(const std::string& text) {
 // The words of a text separated by blanks or commas.
 inline std::vector<std::string> List(std::string text) {
   std::replace(text.begin(), text.end(), ',', ' ');
-  return Words(text);
+  return Split(text);
 }
 
 inline std::vector<double> Nums(const std::string& text) {
@@ -91,7 +98,7 @@ inline std::string Unescape(const std::string& s) {
 struct Keys {
   std::map<std::string, std::string> kv;
   explicit Keys(const std::string& text) {
-    for (const std::string& w : Words(text)) {
+    for (const std::string& w : Split(text)) {
       const auto eq = w.find('=');
       kv[w.substr(0, eq)] = eq == std::string::npos ? "" : w.substr(eq + 1);
     }
@@ -105,14 +112,78 @@ struct Keys {
 inline void PrintTo(const Row& r, std::ostream* os) { *os << r.name; }
 
 // The fixture of a row-driven suite: an unreadable file fails its row.
-class CaseRows : public testing::TestWithParam<Row> {
+class CaseRows : public ::testing::TestWithParam<Row> {
  protected:
   void SetUp() override { ASSERT_EQ(GetParam().error, ""); }
   const Row& row() const { return GetParam(); }
 };
 
-inline auto RowsOf(const std::string& file) { return testing::ValuesIn(ReadRows(file)); }
-inline std::string RowName(const testing::TestParamInfo<Row>& info) { return info.param.name; }
+inline auto RowsOf(const std::string& file) { return ::testing::ValuesIn(ReadRows(file)); }
+inline std::string RowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
+
+// ---- Scripts
+
+using Words = std::vector<std::string>;
+
+struct ScriptCase {
+  std::string name, where;                  // "<file>_<case>", "<file>:<line>"
+  std::vector<std::pair<int, Words>> lines;  // commands with their line numbers
+};
+
+inline void PrintTo(const ScriptCase& c, std::ostream* os) { *os << c.where; }
+
+inline Words split_words(const std::string& line) {
+  Words out;
+  for (std::size_t i = 0; i < line.size();) {
+    if (line[i] == ' ') { ++i; continue; }
+    std::string w;
+    if (line[i] != '"') {
+      while (i < line.size() && line[i] != ' ') w += line[i++];
+    } else {
+      for (++i; i < line.size() && line[i] != '"'; ++i) {
+        if (line[i] != '\\' || i + 1 == line.size()) { w += line[i]; continue; }
+        const char e = line[++i];
+        if (e == 'x') w += static_cast<char>(std::stoi(line.substr(i + 1, 2), nullptr, 16)), i += 2;
+        else w += e == 'n' ? '\n' : e == 'r' ? '\r' : e == 't' ? '\t' : e;
+      }
+      ++i;
+    }
+    out.push_back(w);
+  }
+  return out;
+}
+
+// The cases of ZT_TEST_DATA_DIR/<file>.cases for each file.
+inline std::vector<ScriptCase> load_script_cases(const std::vector<std::string>& files) {
+  std::vector<ScriptCase> cases;
+  for (const std::string& file : files) {
+    std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/" + file + ".cases");
+    std::string line;
+    for (int n = 1; std::getline(in, line); ++n) {
+      const Words w = split_words(line);
+      if (w.empty() || w[0][0] == '#') continue;
+      if (w[0] != "case") {
+        if (!cases.empty()) cases.back().lines.emplace_back(n, w);
+        continue;
+      }
+      std::string name = file, where = file;
+      cases.push_back({name.append("_").append(w.at(1)), where.append(":").append(std::to_string(n)), {}});
+    }
+  }
+  return cases;
+}
+
+// Runs a case's commands in order, each failure naming the case and line.
+template <class Run>
+void run_script(const ScriptCase& c, Run run) {
+  SCOPED_TRACE(c.where);
+  for (const auto& [line, words] : c.lines) {
+    SCOPED_TRACE("line " + std::to_string(line));
+    run(words);
+  }
+}
+
+inline std::string case_name(const ::testing::TestParamInfo<ScriptCase>& info) { return info.param.name; }
 
 }  // namespace zt::test
 

@@ -20,7 +20,7 @@ std::map<std::string, SiteRef> ReadSites(const std::string& text) {
   std::map<int, PointSite> points;
   std::istringstream s(text);
   for (std::string part; std::getline(s, part, ';');) {
-    const std::string name = vdtest::Words(part).at(0);
+    const std::string name = vdtest::Split(part).at(0);
     const std::vector<double> v = Nums(vdtest::Trim(part).substr(name.size()));
     const std::int32_t index = std::stoi(name.substr(1));
     if (name[0] == 'p') {

@@ -32,7 +32,7 @@ class OffsetCases : public CaseRows {};
 
 TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
   const std::string sites = row().field(0);
-  const std::vector<std::string> request = Words(row().field(1));
+  const std::vector<std::string> request = Split(row().field(1));
   const Keys want(row().field(2));
   InputSites in;
   if (sites.rfind("contour", 0) == 0) {

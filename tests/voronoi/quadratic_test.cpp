@@ -16,7 +16,7 @@ class Quadratic : public vdtest::CaseRows {};
 
 TEST_P(Quadratic, FindsItsRoots) {
   const std::vector<double> c = vdtest::Nums(row().field(0));
-  const std::vector<std::string> want = vdtest::Words(row().field(1));
+  const std::vector<std::string> want = vdtest::Split(row().field(1));
   const double tol = vdtest::Num(row().field(2));
   const QuadRoots r = solve_quadratic({c.at(0), c.at(1), c.at(2)});
   ASSERT_EQ(r.count, std::stoi(want.at(0)));

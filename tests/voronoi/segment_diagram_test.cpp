@@ -60,7 +60,7 @@ void StoreList(const std::string& list) {
   std::vector<std::pair<std::string, std::vector<double>>> extras;
   std::istringstream s(list);
   for (std::string part; std::getline(s, part, ';');) {
-    std::vector<std::string> w = Words(part);
+    std::vector<std::string> w = Split(part);
     const bool reversed = w.at(0) == "rev";
     if (reversed) w.erase(w.begin());
     std::vector<double> a;

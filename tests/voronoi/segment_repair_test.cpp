@@ -24,13 +24,13 @@ TEST_P(SegmentRepair, LeavesTheExpectedInput) {
   VD_Reset();
   const std::vector<double> xy = Nums(row().field(0));
   for (std::size_t i = 0; i + 1 < xy.size(); i += 2) API_AddPoint(xy[i], xy[i + 1], 10 + static_cast<int>(i / 2));
-  for (const std::string& s : Words(row().field(1))) API_AddSegment(std::stoi(s), std::stoi(s.substr(s.find('-') + 1)), 77);
+  for (const std::string& s : Split(row().field(1))) API_AddSegment(std::stoi(s), std::stoi(s.substr(s.find('-') + 1)), 77);
   vd::ComputeSegmentLineData();
   vd::Engine& g = vd::Vd();
   g.restartPending = false;
   std::istringstream calls(row().field(2));
   for (std::string call; std::getline(calls, call, ';');) {
-    const std::vector<std::string> w = Words(call);
+    const std::vector<std::string> w = Split(call);
     const int a = std::stoi(w.at(1)), b = w.at(2) == "=" || w.at(2) == "all" ? 0 : std::stoi(w[2]);
     bool answer = false;
     if (w[0] == "suspect") {

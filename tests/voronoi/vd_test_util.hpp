@@ -46,7 +46,7 @@ inline std::vector<Pt> Generate(const std::string& list) {
   std::vector<Pt> pts;
   std::istringstream s(list);
   for (std::string part; std::getline(s, part, ';');) {
-    const std::vector<std::string> w = Words(part);
+    const std::vector<std::string> w = Split(part);
     std::vector<double> a;
     for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
     const int n = a.empty() ? 0 : static_cast<int>(a[0]);

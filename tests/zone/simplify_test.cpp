@@ -158,7 +158,7 @@ std::vector<Point2d> points(const std::string& field) {
     return up ? std::nextafter(v, INFINITY) : v;
   };
   std::vector<Point2d> out;
-  for (const std::string& p : test::Words(field))
+  for (const std::string& p : test::Split(field))
     out.push_back({num(p.substr(0, p.find(','))), num(p.substr(p.find(',') + 1))});
   return out;
 }
@@ -167,7 +167,7 @@ class SimplifyExact : public test::CaseRows {};
 
 // "x,y,tag ..." with S for a separator.
 void tagged(const std::string& field, TaggedPointList& l) {
-  for (const std::string& p : test::Words(field)) {
+  for (const std::string& p : test::Split(field)) {
     const std::vector<double> v = test::Nums(p);
     l.Add(p == "S" ? TaggedPoint::separator() : TaggedPoint(static_cast<std::int32_t>(v.at(2)), v.at(0), v.at(1)));
   }
