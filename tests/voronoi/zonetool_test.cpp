@@ -15,16 +15,6 @@ namespace {
 
 using ToolRun = test::CommandRun;
 
-std::string Unescape(const std::string& s) {
-  std::string out;
-  for (std::size_t i = 0; i < s.size(); ++i) {
-    const bool escape = s[i] == '\\' && i + 1 < s.size() && s[i + 1] == 'n';
-    out += escape ? '\n' : s[i];
-    i += escape;
-  }
-  return out;
-}
-
 // Runs `zonetool <subcommand> <input file> <args>` on an input file of its own.
 ToolRun Zonetool(const std::string& subcommand, const std::string& text, const std::string& args = "") {
   test::ScratchDir dir;
