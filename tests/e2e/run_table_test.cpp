@@ -12,18 +12,11 @@ namespace zt::e2e {
 namespace {
 
 using test::Unescape;
-
-// The trimmed parts of `s` between `sep`.
-std::vector<std::string> split(const std::string& s, char sep) {
-  std::istringstream in(s);
-  std::vector<std::string> out;
-  for (std::string part; std::getline(in, part, sep);) out.push_back(test::Trim(part));
-  return out;
-}
+using test::Parts;
 
 std::vector<float> numbers(const std::string& list, char sep) {
   std::vector<float> out;
-  for (const std::string& n : split(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
+  for (const std::string& n : Parts(list, sep)) out.push_back(std::strtof(n.c_str(), nullptr));
   return out;
 }
 
@@ -39,7 +32,7 @@ Bytes recipe(const std::string& r, Bytes old) {
   }
   if (kind == "raw") {
     std::vector<Bytes> recs;
-    for (const std::string& x : split(arg, ','))
+    for (const std::string& x : Parts(arg, ','))
       recs.push_back(x == "sep" ? test::separator() : Bytes(std::stoul(x), 0));
     return test::record_file(recs);
   }
@@ -54,9 +47,9 @@ Bytes recipe(const std::string& r, Bytes old) {
     return old;
   }
   std::vector<Contour> contours;  // Z@X,Y;X,Y/...
-  for (const std::string& c : split(r, '/')) {
+  for (const std::string& c : Parts(r, '/')) {
     contours.push_back({std::strtof(c.c_str(), nullptr), {}});
-    for (const std::string& p : split(c.substr(c.find('@') + 1), ';')) {
+    for (const std::string& p : Parts(c.substr(c.find('@') + 1), ';')) {
       const std::vector<float> xy = numbers(p, ',');
       contours.back().points.push_back({xy.at(0), xy.at(1)});
     }
@@ -65,7 +58,7 @@ Bytes recipe(const std::string& r, Bytes old) {
 }
 
 void set_up(ProgramRun& r, const std::string& setup) {
-  for (const std::string& step : split(setup, ' ')) {
+  for (const std::string& step : Parts(setup, ' ')) {
     if (step.empty()) continue;
     if (step == "params" || step == "usual") r.parameters();
     if (step == "usual") {
@@ -152,7 +145,7 @@ TEST_P(RunTable, EndsAsListed) {
     ASSERT_EQ(how, "either");
     EXPECT_TRUE(status == 0 || (status >= 1 && status <= 2) || status == 255) << status;
   }
-  for (const std::string& one : split(row().field(2), ';'))
+  for (const std::string& one : Parts(row().field(2), ';'))
     if (!one.empty()) check(r, zones, one);
 }
 

@@ -30,8 +30,7 @@ std::vector<TaggedPoint> records(std::string text, char sep = ' ') {
 
 // Contours separated by ';', each closed unless its last word is "open".
 void operand(const std::string& field, TaggedPointList& l) {
-  std::istringstream in(field);
-  for (std::string c; std::getline(in, c, ';');) {
+  for (const std::string& c : Parts(field, ';')) {
     const bool open = Split(c).back() == "open";
     std::vector<TaggedPoint> points = records(open ? c.substr(0, c.rfind("open")) : c);
     if (!open) points.push_back(points.front());

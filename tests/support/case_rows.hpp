@@ -35,15 +35,21 @@ inline std::string Trim(const std::string& s) {
   return b == std::string::npos ? "" : s.substr(b, e - b + 1);
 }
 
+// The trimmed parts of a text between separators.
+inline std::vector<std::string> Parts(const std::string& text, char sep) {
+  std::istringstream s(text);
+  std::vector<std::string> out;
+  for (std::string part; std::getline(s, part, sep);) out.push_back(Trim(part));
+  return out;
+}
+
 inline std::vector<Row> ReadRows(const std::string& file) {
   std::ifstream in(std::string(ZT_TEST_DATA_DIR) + "/" + file);
   if (!in) return {Row{"UnreadableCaseFile", "cannot read " + file, {}}};
   std::vector<Row> rows;
   for (std::string line; std::getline(in, line);) {
     if (Trim(line).empty() || Trim(line)[0] == '#') continue;
-    std::istringstream s(line);
-    Row r;
-    for (std::string f; std::getline(s, f, '|');) r.fields.push_back(Trim(f));
+    Row r{"", "", Parts(line, '|')};
     r.name = r.fields.front();
     r.fields.erase(r.fields.begin());
     rows.push_back(r);

@@ -18,8 +18,7 @@ using vdtest::Nums;
 std::map<std::string, SiteRef> ReadSites(const std::string& text) {
   std::map<std::string, SiteRef> sites;
   std::map<int, PointSite> points;
-  std::istringstream s(text);
-  for (std::string part; std::getline(s, part, ';');) {
+  for (const std::string& part : vdtest::Parts(text, ';')) {
     const std::string name = vdtest::Split(part).at(0);
     const std::vector<double> v = Nums(vdtest::Trim(part).substr(name.size()));
     const std::int32_t index = std::stoi(name.substr(1));

@@ -37,8 +37,7 @@ TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
   InputSites in;
   if (sites.rfind("contour", 0) == 0) {
     std::vector<Contour> cs;
-    std::istringstream s(sites);
-    for (std::string part; std::getline(s, part, ';');) {
+    for (const std::string& part : Parts(sites, ';')) {
       const std::vector<double> v = Nums(Trim(part).substr(7));
       cs.emplace_back();
       for (std::size_t i = 0; i + 1 < v.size(); i += 2) cs.back().push_back({v[i], v[i + 1]});

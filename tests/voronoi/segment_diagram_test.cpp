@@ -58,8 +58,7 @@ Contour RandomSimplePolygon(int n, std::uint32_t seed) {
 void StoreList(const std::string& list) {
   std::vector<Contour> contours;
   std::vector<std::pair<std::string, std::vector<double>>> extras;
-  std::istringstream s(list);
-  for (std::string part; std::getline(s, part, ';');) {
+  for (const std::string& part : Parts(list, ';')) {
     std::vector<std::string> w = Split(part);
     const bool reversed = w.at(0) == "rev";
     if (reversed) w.erase(w.begin());

@@ -28,8 +28,7 @@ TEST_P(SegmentRepair, LeavesTheExpectedInput) {
   vd::ComputeSegmentLineData();
   vd::Engine& g = vd::Vd();
   g.restartPending = false;
-  std::istringstream calls(row().field(2));
-  for (std::string call; std::getline(calls, call, ';');) {
+  for (const std::string& call : Parts(row().field(2), ';')) {
     const std::vector<std::string> w = Split(call);
     const int a = std::stoi(w.at(1)), b = w.at(2) == "=" || w.at(2) == "all" ? 0 : std::stoi(w[2]);
     bool answer = false;

@@ -44,8 +44,7 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
 //   jitter seed k          moves every coordinate so far by up to k ulps
 inline std::vector<Pt> Generate(const std::string& list) {
   std::vector<Pt> pts;
-  std::istringstream s(list);
-  for (std::string part; std::getline(s, part, ';');) {
+  for (const std::string& part : Parts(list, ';')) {
     const std::vector<std::string> w = Split(part);
     std::vector<double> a;
     for (std::size_t i = 1; i < w.size(); ++i) a.push_back(Num(w[i]));
