@@ -192,8 +192,3 @@ void run_script(const ScriptCase& c, Run run) {
 inline std::string case_name(const ::testing::TestParamInfo<ScriptCase>& info) { return info.param.name; }
 
 }  // namespace zt::test
-
-// The Voronoi suites name these from their own namespace.
-namespace zt::vdtest {
-using namespace zt::test;
-}  // namespace zt::vdtest

@@ -20,7 +20,7 @@
 
 #include "vd_test_util.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 // ---- Matching our nodes against their vertices: the corner points of our
@@ -333,4 +333,4 @@ TEST(BoostSegmentOracle, AxisAlignedStaircase) {
 }
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test

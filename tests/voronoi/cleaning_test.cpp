@@ -15,8 +15,8 @@ namespace {
 using namespace vd;
 
 // Stores points and segments as a caller would, with dummy slots in place.
-void StoreSites(const std::vector<vdtest::Pt>& pts, const std::vector<std::pair<int, int>>& segs) {
-  vdtest::Store(pts);
+void StoreSites(const std::vector<test::Pt>& pts, const std::vector<std::pair<int, int>>& segs) {
+  test::Store(pts);
   for (auto [a, b] : segs) ASSERT_GE(API_AddSegment(a + 2, b + 2, 100 + a), 0);
   AddDummySlots();
 }

@@ -18,7 +18,7 @@
 namespace zt {
 namespace {
 
-using vdtest::Pt;
+using test::Pt;
 using Ring = std::vector<Pt>;
 
 constexpr double kBoundaryTolerance = 0.01;
@@ -84,12 +84,12 @@ double OneWay(const std::vector<Ring>& from, const std::vector<Ring>& to) {
 TEST(ClipperOffsetOracle, PocketsWithIslandsInsideAndOutside) {
   std::mt19937 rng(23);
   for (int trial = 0; trial < 40; ++trial) {
-    std::vector<Ring> rings{vdtest::Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
+    std::vector<Ring> rings{test::Star(rng, 0, 0, 70, 100, 10 + trial % 30, false)};
     const int islands = trial % 4;
     for (int h = 0; h < islands; ++h) {
       const double a = 2 * std::numbers::pi * h / std::max(islands, 1);
       const double off = islands == 1 ? 0.0 : 35.0;
-      rings.push_back(vdtest::Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
+      rings.push_back(test::Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
     }
     std::uniform_real_distribution<double> td(0.5, 12.0);
     const double t = td(rng);

@@ -9,7 +9,7 @@
 #include "support/case_rows.hpp"
 #include "vd_test_util.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 class PointSets : public CaseRows {};
@@ -146,4 +146,4 @@ TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
 }
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test

@@ -12,7 +12,7 @@
 namespace zt {
 namespace {
 
-using namespace vdtest;
+using namespace test;
 using namespace vd;
 
 // A small live diagram to operate on.

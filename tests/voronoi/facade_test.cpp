@@ -7,7 +7,7 @@
 namespace zt {
 namespace {
 
-using namespace vdtest;
+using namespace test;
 
 TEST(Facade, InitialiseTwiceAndResetBeforeInitialise) {
   VD_Terminate();

@@ -11,16 +11,16 @@
 namespace zt::vd::geo {
 namespace {
 
-using vdtest::Keys;
-using vdtest::Nums;
+using test::Keys;
+using test::Nums;
 
 // The sites of a row by name: "p2", "s0", "arc".
 std::map<std::string, SiteRef> ReadSites(const std::string& text) {
   std::map<std::string, SiteRef> sites;
   std::map<int, PointSite> points;
-  for (const std::string& part : vdtest::Parts(text, ';')) {
-    const std::string name = vdtest::Split(part).at(0);
-    const std::vector<double> v = Nums(vdtest::Trim(part).substr(name.size()));
+  for (const std::string& part : test::Parts(text, ';')) {
+    const std::string name = test::Split(part).at(0);
+    const std::vector<double> v = Nums(test::Trim(part).substr(name.size()));
     const std::int32_t index = std::stoi(name.substr(1));
     if (name[0] == 'p') {
       points[index] = {index, {v.at(0), v.at(1)}};
@@ -41,7 +41,7 @@ EdgeEnd End(const std::string& text) {
 
 std::int32_t KindOf(const std::string& w) { return w == "pnt" ? kKindPnt : w == "seg" ? kKindSeg : -2; }
 
-class NodeExamples : public vdtest::CaseRows {};
+class NodeExamples : public test::CaseRows {};
 
 TEST_P(NodeExamples, GiveTheirNodeOrNameTheirSuspects) {
   auto sites = ReadSites(row().field(0));
@@ -62,7 +62,7 @@ TEST_P(NodeExamples, GiveTheirNodeOrNameTheirSuspects) {
   }
   if (want.has("suspect")) {
     ASSERT_TRUE(suspect.set);
-    const std::vector<std::string> p = vdtest::List(want.str("suspect"));
+    const std::vector<std::string> p = test::List(want.str("suspect"));
     if (p.size() == 4) {
       EXPECT_EQ(suspect.site1, std::stoi(p[0]));
       EXPECT_EQ(suspect.kind1, KindOf(p[1]));
@@ -77,7 +77,7 @@ TEST_P(NodeExamples, GiveTheirNodeOrNameTheirSuspects) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, NodeExamples, vdtest::RowsOf("node_examples.txt"), vdtest::RowName);
+INSTANTIATE_TEST_SUITE_P(Data, NodeExamples, test::RowsOf("node_examples.txt"), test::RowName);
 
 TEST(NodeExamples, TheSamePointTwiceIsNoConstruction) {
   const PointSite p{6, {0.5, 0.5}};

@@ -126,7 +126,7 @@ void make_sites(Builder& B, const std::string& sites, SiteRef& a, SiteRef& b, Si
   }
 }
 
-class NodeRandom : public vdtest::CaseRows {};
+class NodeRandom : public test::CaseRows {};
 
 TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
   Builder B{std::mt19937_64(1234 + std::stoi(row().field(0))), {}, 0};
@@ -187,7 +187,7 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
   EXPECT_GT(used, 1500);
 }
 
-INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom, vdtest::RowsOf("node_random.txt"), vdtest::RowName);
+INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom, test::RowsOf("node_random.txt"), test::RowName);
 
 }  // namespace
 }  // namespace zt::vd::geo

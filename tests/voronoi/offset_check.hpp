@@ -15,7 +15,7 @@
 #include "support/segment_distance.hpp"
 #include "vd_test_util.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 
 struct Seg2 {
   Pt a, b;
@@ -158,4 +158,4 @@ std::vector<P> Star(std::mt19937& rng, double cx, double cy, double rmin, double
   return c;
 }
 
-}  // namespace zt::vdtest
+}  // namespace zt::test

@@ -13,7 +13,7 @@
 #include "support/scratch_dir.hpp"
 #include "voronoi/detail/engine_state.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 constexpr double kTol = 1e-9;
@@ -308,4 +308,4 @@ TEST(PolygonOffsets, RequestedFileHoldsTheStore) {
 }
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test

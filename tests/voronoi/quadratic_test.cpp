@@ -12,22 +12,22 @@
 namespace zt::vd::geo {
 namespace {
 
-class Quadratic : public vdtest::CaseRows {};
+class Quadratic : public test::CaseRows {};
 
 TEST_P(Quadratic, FindsItsRoots) {
-  const std::vector<double> c = vdtest::Nums(row().field(0));
-  const std::vector<std::string> want = vdtest::Split(row().field(1));
-  const double tol = vdtest::Num(row().field(2));
+  const std::vector<double> c = test::Nums(row().field(0));
+  const std::vector<std::string> want = test::Split(row().field(1));
+  const double tol = test::Num(row().field(2));
   const QuadRoots r = solve_quadratic({c.at(0), c.at(1), c.at(2)});
   ASSERT_EQ(r.count, std::stoi(want.at(0)));
   const double roots[] = {std::min(r.t1, r.t2), std::max(r.t1, r.t2)};
   for (std::size_t i = 1; i < want.size(); ++i) {
     const double root = r.count == 1 ? r.t1 : roots[i - 1];
-    EXPECT_TRUE(want[i] == "*" || std::fabs(root - vdtest::Num(want[i])) <= tol) << i << ": " << root;
+    EXPECT_TRUE(want[i] == "*" || std::fabs(root - test::Num(want[i])) <= tol) << i << ": " << root;
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, Quadratic, vdtest::RowsOf("quadratic.txt"), vdtest::RowName);
+INSTANTIATE_TEST_SUITE_P(Data, Quadratic, test::RowsOf("quadratic.txt"), test::RowName);
 
 TEST(QuadraticNormalisation, StopsAndCounts) {
   QuadCoefs q{1.0 / (128.0 * 128.0 * 128.0), 0.0, 0.0};

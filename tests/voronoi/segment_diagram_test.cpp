@@ -12,7 +12,7 @@
 #include "vd_test_util.hpp"
 #include "voronoi/detail/segment_checks.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 // A star-shaped simple polygon: sorted random angles, random radii.
@@ -153,4 +153,4 @@ TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
 }
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test

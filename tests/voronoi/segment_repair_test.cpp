@@ -13,7 +13,7 @@
 #include "voronoi/detail/preprocess.hpp"
 #include "voronoi/detail/segment_repair.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 // The cases of data/segment_repair.txt.
@@ -74,4 +74,4 @@ TEST_P(SegmentRepair, LeavesTheExpectedInput) {
 INSTANTIATE_TEST_SUITE_P(Data, SegmentRepair, RowsOf("segment_repair.txt"), RowName);
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test

@@ -18,7 +18,7 @@
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/engine.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 
 struct Pt {
   double x, y;
@@ -178,4 +178,4 @@ inline std::string CheckedRun(const std::vector<Pt>& pts) {
   return CheckedCompute();
 }
 
-}  // namespace zt::vdtest
+}  // namespace zt::test

@@ -10,7 +10,7 @@
 #include "support/scratch_dir.hpp"
 #include "support/subprocess.hpp"
 
-namespace zt::vdtest {
+namespace zt::test {
 namespace {
 
 using ToolRun = test::CommandRun;
@@ -60,4 +60,4 @@ TEST(ZonetoolVoronoi, PrintsNodesEdgesAndFigures) {
 }
 
 }  // namespace
-}  // namespace zt::vdtest
+}  // namespace zt::test
