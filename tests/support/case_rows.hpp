@@ -90,12 +90,14 @@ inline std::vector<double> Nums(const std::string& text) {
   return v;
 }
 
-// A field with \n, \r, \t and \s (a space) escapes.
+// A field with \n, \r, \t, \s (a space) and \xHH escapes; any other
+// escaped character stands for itself.
 inline std::string Unescape(const std::string& s) {
   std::string out;
   for (std::size_t i = 0; i < s.size(); ++i) {
     if (s[i] != '\\' || i + 1 == s.size()) out += s[i];
-    else ++i, out += s[i] == 'n' ? '\n' : s[i] == 'r' ? '\r' : s[i] == 't' ? '\t' : s[i] == 's' ? ' ' : s[i];
+    else if (s[++i] == 'x') out += static_cast<char>(std::stoi(s.substr(i + 1, 2), nullptr, 16)), i += 2;
+    else out += s[i] == 'n' ? '\n' : s[i] == 'r' ? '\r' : s[i] == 't' ? '\t' : s[i] == 's' ? ' ' : s[i];
   }
   return out;
 }
@@ -145,14 +147,10 @@ inline Words split_words(const std::string& line) {
     std::string w;
     if (line[i] != '"') {
       while (i < line.size() && line[i] != ' ') w += line[i++];
-    } else {
-      for (++i; i < line.size() && line[i] != '"'; ++i) {
-        if (line[i] != '\\' || i + 1 == line.size()) { w += line[i]; continue; }
-        const char e = line[++i];
-        if (e == 'x') w += static_cast<char>(std::stoi(line.substr(i + 1, 2), nullptr, 16)), i += 2;
-        else w += e == 'n' ? '\n' : e == 'r' ? '\r' : e == 't' ? '\t' : e;
-      }
-      ++i;
+    } else {  // up to the closing quote, escapes skipped
+      std::size_t end = ++i;
+      while (end < line.size() && line[end] != '"') end += line[end] == '\\' ? 2 : 1;
+      w = Unescape(line.substr(i, end - i)), i = end + 1;
     }
     out.push_back(w);
   }
