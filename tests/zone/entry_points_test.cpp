@@ -141,13 +141,6 @@ TEST_F(EntryPoints, AFullDiskFailsTheLevel) {
   EXPECT_EQ(add(10.0f, rest), -1);
 }
 
-std::vector<std::pair<float, std::vector<Point2f>>> g_contours;
-void keep_contour(const std::int32_t& n, const Point2f* p, const float& z, const std::int32_t&,
-                  std::int32_t& ierr) {
-  g_contours.emplace_back(z, std::vector<Point2f>(p, p + n));
-  ierr = 0;
-}
-
 // The pocket [0, 100]^2 with rest material [40, 60]^2, offset distance 1,
 // merge radius 2, on the real engines: one closed contour whose box is
 // [38.96, 61.04]^2 within 0.01.
@@ -157,15 +150,12 @@ TEST_F(EntryPoints, WholeRunOfTheSmallCase) {
   write_file("grid.tmp", "0 0 0 0 0.1 0 2 0");
   ASSERT_EQ(init({0.0f}), 0);
   ASSERT_EQ(add(0.0f, rest), 0);
-  std::vector<Point2f> buffer(16);
   std::int32_t ierr = -1;
-  g_contours.clear();
-  ::testing::internal::CaptureStdout();
-  wf_fin_czone(buffer, 5, ierr, keep_contour);
-  ::testing::internal::GetCapturedStdout();
+  const WrittenZones zones = finish_zones(5, ierr, std::vector<Point2f>(16));
   ASSERT_EQ(ierr, 0);
-  ASSERT_EQ(g_contours.size(), 1u);
-  const auto& c = g_contours[0].second;
+  ASSERT_EQ(zones.size(), 1u);
+  ASSERT_EQ(zones.begin()->second.size(), 1u);
+  const auto& c = zones.begin()->second[0];
   EXPECT_EQ(c.front().x, c.back().x);
   EXPECT_EQ(c.front().y, c.back().y);
   for (int i = 0; i < 4; ++i) EXPECT_NEAR(box_of(c)[i], i < 2 ? 38.96 : 61.04, 0.01) << i;

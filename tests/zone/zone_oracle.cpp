@@ -33,13 +33,6 @@ std::vector<Poly> to_float(const std::vector<RefPoly>& polys) {
   return out;
 }
 
-std::map<float, std::vector<Poly>> g_written;
-void keep_contour(const std::int32_t& n, const Point2f* p, const float& z, const std::int32_t&,
-                  std::int32_t& ierr) {
-  g_written[z].emplace_back(p, p + n);
-  ierr = 0;
-}
-
 class ZoneOracle : public ZoneTmpTest {};
 
 TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
@@ -50,7 +43,6 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
     SCOPED_TRACE("case " + std::to_string(c));
     TearDown();
     SetUp();
-    g_written.clear();
     const std::vector<RefLevel> levels = e2e::pocket_case(rng, {60, 0.4f, 0.4f, 2, false, false});
     std::vector<LevelContours> file;
     std::vector<float> zs;
@@ -82,17 +74,14 @@ TEST_F(ZoneOracle, FinalZonesAgreeWithClipper) {
       worstLevel = std::max(worstLevel, d);
       ++compared;
     }
-    std::vector<Point2f> buffer;
-    ::testing::internal::CaptureStdout();
-    wf_fin_czone(buffer, 3, ierr, keep_contour);
-    ::testing::internal::GetCapturedStdout();
+    const WrittenZones written = finish_zones(3, ierr);
     ASSERT_EQ(ierr, 0);
     const auto ref = e2e::reference_zones(levels, kOffsetDistance, kMergeRadius, 1);
     for (const RefLevel& l : levels) {
       const auto r = ref.find(l.z);
-      const auto o = g_written.find(l.z);
-      ASSERT_EQ(r != ref.end() && !r->second.empty(), o != g_written.end()) << "level " << l.z;
-      if (o == g_written.end()) continue;
+      const auto o = written.find(l.z);
+      ASSERT_EQ(r != ref.end() && !r->second.empty(), o != written.end()) << "level " << l.z;
+      if (o == written.end()) continue;
       EXPECT_EQ(o->second.size(), r->second.size()) << "level " << l.z;
       const double d = test::boundary_distance(o->second, r->second);
       EXPECT_LE(d, kBoundaryDistance) << "level " << l.z;

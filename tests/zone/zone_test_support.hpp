@@ -18,6 +18,7 @@
 
 #include "support/record_bytes.hpp"
 #include "support/scratch_dir.hpp"
+#include "zone/entry_points.hpp"
 #include "zone/offset_engine.hpp"
 #include "zone/zone_context.hpp"
 
@@ -222,6 +223,22 @@ inline std::array<float, 4> box_of(const std::vector<Point2f>& pts) {
     if (p.x < 99990.0f) b = {std::min(b[0], p.x), std::min(b[1], p.y), std::max(b[2], p.x), std::max(b[3], p.y)};
   }
   return b;
+}
+
+// The zones wf_fin_czone writes (handed `buffer`), by z in the order written,
+// its console output dropped; ierr as it leaves it.
+using WrittenZones = std::map<float, std::vector<std::vector<Point2f>>>;
+inline WrittenZones finish_zones(std::int32_t unit, std::int32_t& ierr, std::vector<Point2f> buffer = {}) {
+  static WrittenZones written;
+  written.clear();
+  ::testing::internal::CaptureStdout();
+  wf_fin_czone(buffer, unit, ierr, [](const std::int32_t& n, const Point2f* p, const float& z, const std::int32_t&,
+                                      std::int32_t& e) {
+    written[z].emplace_back(p, p + n);
+    e = 0;
+  });
+  ::testing::internal::GetCapturedStdout();
+  return written;
 }
 
 }  // namespace zt::testing
