@@ -60,15 +60,13 @@ void RunBoost(const std::vector<BPoint>& pts) {
 
 void BM_Ours(benchmark::State& state) {
   const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(pts); });
-  for (auto _ : state) RunOurs(pts);
+  zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunOurs(pts); });
   state.counters["restarts"] = zt::VD_GetRestartCount();
 }
 
 void BM_Boost(benchmark::State& state) {
   const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunBoost(pts); });
-  for (auto _ : state) RunBoost(pts);
+  zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunBoost(pts); });
 }
 
 // Arguments: (0 uniform | 1 clustered, number of points).

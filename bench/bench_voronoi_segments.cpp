@@ -76,16 +76,14 @@ void RunBoost(const std::vector<Polygon>& polys) {
 
 void BM_Ours(benchmark::State& state) {
   const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(polys); });
-  for (auto _ : state) RunOurs(polys);
+  zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunOurs(polys); });
   state.counters["restarts"] = zt::VD_GetRestartCount();
   state.counters["recovery"] = zt::VD_InRecoveryMode();
 }
 
 void BM_Boost(benchmark::State& state) {
   const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
-  state.counters["peak_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunBoost(polys); });
-  for (auto _ : state) RunBoost(polys);
+  zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunBoost(polys); });
 }
 
 // Arguments: (0 star | 1 pocket with 20 islands, number of segments).

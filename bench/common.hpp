@@ -1,11 +1,13 @@
 // Helpers shared by the benchmarks: the peak memory of one run, measured in
 // a child process so that earlier runs and the benchmark's own caches do not
-// count.
+// count, and a timed case that reports it.
 #pragma once
 
 #include <malloc.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include <benchmark/benchmark.h>
 
 #include <fstream>
 #include <functional>
@@ -48,6 +50,14 @@ inline double peak_mb(const std::function<void()>& release, const std::function<
   int status = 0;
   waitpid(pid, &status, 0);
   return mb;
+}
+
+// A timed case: `run` as many times as the benchmark asks, with the peak
+// memory of one run (see peak_mb) as the counter peak_MB.
+inline void timed_case(benchmark::State& state, const std::function<void()>& release,
+                       const std::function<void()>& run) {
+  state.counters["peak_MB"] = peak_mb(release, run);
+  for (auto _ : state) run();
 }
 
 }  // namespace zt::bench
