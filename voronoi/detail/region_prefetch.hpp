@@ -68,6 +68,7 @@ class RegionPrefetch {
     if (edge_ != kOutward) g.edges.Prefetch(edge_);
   }
 
+ private:
   // Second round: the far ends of the edges leaving the region's nodes, the
   // nodes a growing tree tests next.
   void StepOutward(Engine& g) {
@@ -80,7 +81,6 @@ class RegionPrefetch {
     g.nodes.Prefetch(OtherNode(g.edges[o.edge], o.node));
   }
 
- private:
   static constexpr std::int32_t kReadStart = -2;
   static constexpr std::int32_t kOutward = -3;
   static constexpr int kMaxOutward = 12;
