@@ -40,6 +40,8 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
 //   lattice side step      a side x side lattice
 //   collinear n seed       points on one line
 //   dice n seed max        n points of integer coordinates 0 to max
+//   blocks n seed side     n integer points in five squares of that side far
+//                          apart: the quadtree, with ties and duplicates
 //   ring n r               n points evenly on the circle of radius r about the origin
 //   jitter seed k          moves every coordinate so far by up to k ulps
 inline std::vector<Pt> Generate(const std::string& list) {
@@ -74,6 +76,11 @@ inline std::vector<Pt> Generate(const std::string& list) {
     } else if (w[0] == "dice") {
       std::uniform_int_distribution<int> u(0, static_cast<int>(a.at(2)));
       for (int i = 0; i < n; ++i) pts.push_back({double(u(rng)), double(u(rng))});
+    } else if (w[0] == "blocks") {
+      std::uniform_int_distribution<int> far(0, 1 << 20), in(0, static_cast<int>(a.at(2)));
+      Pt corners[5];
+      for (Pt& c : corners) c = {double(far(rng)), double(far(rng))};
+      for (int i = 0; i < n; ++i) pts.push_back({corners[i % 5].x + in(rng), corners[i % 5].y + in(rng)});
     } else if (w[0] == "ring") {
       for (int i = 0; i < n; ++i) pts.push_back({a[1] * std::cos(i * M_PI / (n / 2)), a[1] * std::sin(i * M_PI / (n / 2))});
     } else if (w[0] == "jitter") {

@@ -81,7 +81,9 @@ class NearestPointSearch {
   std::int32_t GridNearest(double x, double y, double& bestD2) const;
   void Record(std::int32_t p);
   void SwitchToQuadtree();
-  void QuadInsert(std::int32_t p);
+  // Enters p below node `from` (the root, or the end of the path a search
+  // for p just took: the tree has not changed since).
+  void QuadInsert(std::int32_t p, std::int32_t from = 0);
   std::int32_t QuadNearest(double x, double y, double& bestD2);
 
   std::int32_t total_ = 0;
@@ -107,9 +109,9 @@ class NearestPointSearch {
     double d2;
     std::int32_t node;
     Box box;
-    bool operator>(const Candidate& o) const { return d2 > o.d2; }
   };
   std::vector<Candidate> heap_;
+  std::vector<std::int32_t> path_;
 
  public:
   ~NearestPointSearch() {
@@ -280,12 +282,12 @@ void NearestPointSearch::SwitchToQuadtree() {
   for (std::int32_t q : sample_) QuadInsert(q);
 }
 
-void NearestPointSearch::QuadInsert(std::int32_t p) {
+void NearestPointSearch::QuadInsert(std::int32_t p, std::int32_t from) {
   const PointRecord& pt = Vd().points[p];
   const std::int32_t fresh = static_cast<std::int32_t>(quad_.size());
   quad_.push_back(QuadNode{pt.x, pt.y, p, {-1, -1, -1, -1}});
   if (fresh == 0) return;
-  std::int32_t n = 0;
+  std::int32_t n = from;
   for (;;) {
     const QuadNode& at = quad_[n];
     const int quadrant = (pt.x >= at.x ? 1 : 0) + (pt.y >= at.y ? 2 : 0);
@@ -297,48 +299,62 @@ void NearestPointSearch::QuadInsert(std::int32_t p) {
   }
 }
 
+// The path the query would be inserted along gives a close first bound;
+// then the subtrees off the path are searched nearest first. Subtrees at
+// exactly the bound's distance are kept, so that ties go to the lowest
+// point index whatever the order of the visits.
 std::int32_t NearestPointSearch::QuadNearest(double x, double y, double& bestD2) {
-  bestD2 = std::numeric_limits<double>::infinity();
-  if (quad_.empty()) return -1;
+  const double inf = std::numeric_limits<double>::infinity();
+  bestD2 = inf;
   std::int32_t best = -1;
   const auto visit = [&](const QuadNode& qn) {
     const double dx = qn.x - x, dy = qn.y - y;
     const double d2 = dx * dx + dy * dy;
-    if (d2 < bestD2) {
+    if (d2 < bestD2 || (d2 == bestD2 && qn.point < best)) {
       bestD2 = d2;
       best = qn.point;
     }
   };
-  // The path the query would be inserted along gives a close first bound,
-  // so the best-first search below opens few subtrees.
-  for (std::int32_t n = 0; n >= 0;) {
-    const QuadNode& qn = quad_[n];
-    visit(qn);
-    n = qn.child[(x >= qn.x ? 1 : 0) + (y >= qn.y ? 2 : 0)];
-  }
-  const double inf = std::numeric_limits<double>::infinity();
-  heap_.clear();
-  heap_.push_back(Candidate{0.0, 0, Box{-inf, -inf, inf, inf}});
-  const auto greater = std::greater<Candidate>();
-  while (!heap_.empty()) {
-    std::pop_heap(heap_.begin(), heap_.end(), greater);
-    const Candidate c = heap_.back();
-    heap_.pop_back();
-    if (c.d2 >= bestD2) break;
-    const QuadNode& qn = quad_[c.node];
-    visit(qn);
+  const auto farther = [](const Candidate& a, const Candidate& b) { return a.d2 > b.d2; };
+  // Queues the children of qn within box, but the one in quadrant skip.
+  const auto queue = [&](const QuadNode& qn, const Box& box, int skip) {
     for (int q = 0; q < 4; ++q) {
       const std::int32_t ch = qn.child[q];
-      if (ch < 0) continue;
-      Box b = c.box;
+      if (ch < 0 || q == skip) continue;
+      Box b = box;
       if (q & 1) b.x0 = qn.x; else b.x1 = qn.x;
       if (q & 2) b.y0 = qn.y; else b.y1 = qn.y;
       const double cd2 = Dist2ToBox(x, y, b);
-      if (cd2 < bestD2) {
-        heap_.push_back(Candidate{cd2, ch, b});
-        std::push_heap(heap_.begin(), heap_.end(), greater);
-      }
+      if (cd2 > bestD2) continue;
+      __builtin_prefetch(quad_.data() + ch);
+      heap_.push_back(Candidate{cd2, ch, b});
+      std::push_heap(heap_.begin(), heap_.end(), farther);
     }
+  };
+  path_.clear();
+  for (std::int32_t n = quad_.empty() ? -1 : 0; n >= 0;) {
+    const QuadNode& qn = quad_[n];
+    visit(qn);
+    path_.push_back(n);
+    n = qn.child[(x >= qn.x ? 1 : 0) + (y >= qn.y ? 2 : 0)];
+  }
+  heap_.clear();
+  Box box{-inf, -inf, inf, inf};
+  for (const std::int32_t n : path_) {
+    const QuadNode& qn = quad_[n];
+    const int q = (x >= qn.x ? 1 : 0) + (y >= qn.y ? 2 : 0);
+    queue(qn, box, q);
+    if (q & 1) box.x0 = qn.x; else box.x1 = qn.x;
+    if (q & 2) box.y0 = qn.y; else box.y1 = qn.y;
+  }
+  while (!heap_.empty()) {
+    std::pop_heap(heap_.begin(), heap_.end(), farther);
+    const Candidate c = heap_.back();
+    heap_.pop_back();
+    if (c.d2 > bestD2) break;
+    const QuadNode& qn = quad_[c.node];
+    visit(qn);
+    queue(qn, c.box, -1);
   }
   return best;
 }
@@ -358,7 +374,8 @@ std::int32_t NearestPointSearch::FindAndInsert(std::int32_t p, double& dist2) {
   // A coincident point is never entered, wherever its twin was found: the
   // caller merges it, and a merged point must not be found later.
   if (best >= 0 && dist2 <= kCoincidentDist2) return best;
-  Insert(p);
+  if (quadtree_) QuadInsert(p, path_.empty() ? 0 : path_.back());
+  else Insert(p);
   return best;
 }
 

@@ -3,8 +3,9 @@
 // too clustered for a grid.
 //
 // Promise: FindAndInsert returns the inserted point nearest to the query
-// (exact squared distance in double precision, ties to the first found); a
-// query within kCoincidentDist2 of an inserted point is not inserted.
+// (exact squared distance in double precision; ties go to the first found
+// on the grid, to the lowest point index in the quadtree); a query within
+// kCoincidentDist2 of an inserted point is not inserted.
 #pragma once
 
 #include <cstdint>
