@@ -3,17 +3,22 @@
 // whose near-coincident pairs force ten restarts in the middle of the point
 // phase, zonetool voronoi must print, byte for byte, what the engine printed
 // when it drew and searched one point at a time. The digest below was taken
-// from that engine.
+// from that engine. Underneath, the generator of the order must give the
+// sequence of a plain generator however its values are peeked at and given
+// back.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdint>
 #include <cstdio>
+#include <random>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "support/scratch_dir.hpp"
 #include "support/subprocess.hpp"
+#include "voronoi/detail/engine_state.hpp"
 
 namespace {
 
@@ -55,6 +60,34 @@ TEST(PointLookahead, DiagramWithRestartsIsThatOfOneDrawAtATime) {
   ASSERT_EQ(r.status, 0);
   ASSERT_NE(r.out.find("restarts 10 recovery 0\n"), std::string::npos) << r.out.substr(r.out.size() - 60);
   EXPECT_EQ(Fnv1a(r.out), 0x6ef67cf29e2a727dull);
+}
+
+// A random script of draws, peeks and give-backs against the plain
+// sequence: pos values are consumed, `back` of them given back and not yet
+// drawn again.
+TEST(OrderRandom, PeeksAndGiveBacksKeepTheSequenceOfOneDrawAtATime) {
+  std::mt19937 plain(0);
+  std::vector<std::uint32_t> seq(20000);
+  for (auto& v : seq) v = static_cast<std::uint32_t>(plain());
+  zt::vd::OrderRandom r;
+  r.seed(0);
+  std::mt19937 script(7);
+  std::size_t pos = 0;
+  int back = 0;
+  while (pos + zt::vd::OrderRandom::kMaxPeek < seq.size()) {
+    const unsigned op = script() % 8;
+    if (op < 5) {
+      ASSERT_EQ(r(), seq[pos]) << "draw " << pos;
+      ++pos;
+      back = std::max(back - 1, 0);
+    } else if (op < 7) {
+      const int j = static_cast<int>(script() % zt::vd::OrderRandom::kMaxPeek);
+      ASSERT_EQ(r.Peek(j), seq[pos + j]) << "peek " << j << " at " << pos;
+    } else {
+      const int k = std::min<int>(static_cast<int>(script() % 8), zt::vd::OrderRandom::kMaxGivenBack - back);
+      for (int i = 0; i < k && pos > 0; ++i, ++back) r.GiveBack(seq[--pos]);
+    }
+  }
 }
 
 }  // namespace

@@ -42,27 +42,49 @@ struct SuspectPair {
 // The generator of the insertion orders. The point phase draws a few
 // entries ahead of its insertions; values drawn but not used when a restart
 // ends the phase are given back, so the next draws repeat them in their
-// order and the sequence of values is that of drawing one at a time.
+// order and the sequence of values is that of drawing one at a time. A draw
+// may also peek at values to come, to request the entries they will take.
 struct OrderRandom {
   static constexpr int kMaxGivenBack = 8;
+  static constexpr int kMaxPeek = 16;
 
   std::mt19937 gen{0};
-  std::uint32_t givenBack[kMaxGivenBack] = {};
-  int givenBackCount = 0;  // a stack: the value given back last comes first
+  // Values given back (first) and peeked at (after them), in the order the
+  // next calls return them.
+  std::uint32_t pending[kMaxGivenBack + kMaxPeek + 1] = {};
+  int front = 0;
+  int count = 0;
 
   void seed(std::uint32_t s) {
     gen.seed(s);
-    givenBackCount = 0;
+    count = 0;
   }
   std::uint32_t operator()() {
-    if (givenBackCount > 0) return givenBack[--givenBackCount];
-    return static_cast<std::uint32_t>(gen());
+    if (count == 0) return static_cast<std::uint32_t>(gen());
+    const std::uint32_t v = pending[front];
+    front = (front + 1) % kPending;
+    --count;
+    return v;
   }
   // Values are given back newest first.
   void GiveBack(std::uint32_t v) {
-    assert(givenBackCount < kMaxGivenBack);
-    givenBack[givenBackCount++] = v;
+    assert(count < kPending);
+    front = (front + kPending - 1) % kPending;
+    pending[front] = v;
+    ++count;
   }
+  // The value the call after the next j calls will return (0 <= j < kMaxPeek).
+  std::uint32_t Peek(int j) {
+    assert(j >= 0 && j < kMaxPeek && count <= kMaxGivenBack + kMaxPeek);
+    while (count <= j) {
+      pending[(front + count) % kPending] = static_cast<std::uint32_t>(gen());
+      ++count;
+    }
+    return pending[(front + j) % kPending];
+  }
+
+ private:
+  static constexpr int kPending = kMaxGivenBack + kMaxPeek + 1;
 };
 
 struct Engine {

@@ -7,6 +7,12 @@
 
 namespace zt::vd {
 
+namespace {
+// How many draws ahead the entries are requested.
+constexpr int kDrawPrefetch = 12;
+static_assert(kDrawPrefetch <= OrderRandom::kMaxPeek);
+}  // namespace
+
 void BuildOrder(std::int32_t first, std::int32_t end) {
   Engine& g = Vd();
   g.insertionOrder.count = 0;
@@ -22,6 +28,14 @@ Draw DrawNext() {
   const std::int32_t at = static_cast<std::int32_t>(r % static_cast<std::uint32_t>(g.orderRemaining));
   const std::int32_t v = g.insertionOrder[at];
   g.insertionOrder[at] = g.insertionOrder[--g.orderRemaining];
+  // The entry a draw this far ahead takes lies in a large array at a
+  // random place: request it now (a swap before then may change what it
+  // holds, not where it is).
+  if (g.orderRemaining > kDrawPrefetch) {
+    const std::uint32_t later = g.random.Peek(kDrawPrefetch - 1);
+    g.insertionOrder.Prefetch(
+        static_cast<std::int32_t>(later % static_cast<std::uint32_t>(g.orderRemaining - (kDrawPrefetch - 1))));
+  }
   return Draw{v, r};
 }
 
