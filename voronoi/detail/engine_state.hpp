@@ -47,11 +47,12 @@ struct SuspectPair {
 struct OrderRandom {
   static constexpr int kMaxGivenBack = 8;
   static constexpr int kMaxPeek = 16;
+  static constexpr int kPending = kMaxGivenBack + kMaxPeek + 1;
 
   std::mt19937 gen{0};
   // Values given back (first) and peeked at (after them), in the order the
-  // next calls return them.
-  std::uint32_t pending[kMaxGivenBack + kMaxPeek + 1] = {};
+  // next calls return them: a ring from `front`.
+  std::uint32_t pending[kPending] = {};
   int front = 0;
   int count = 0;
 
@@ -75,16 +76,13 @@ struct OrderRandom {
   }
   // The value the call after the next j calls will return (0 <= j < kMaxPeek).
   std::uint32_t Peek(int j) {
-    assert(j >= 0 && j < kMaxPeek && count <= kMaxGivenBack + kMaxPeek);
+    assert(j >= 0 && j < kMaxPeek && count < kPending);
     while (count <= j) {
       pending[(front + count) % kPending] = static_cast<std::uint32_t>(gen());
       ++count;
     }
     return pending[(front + j) % kPending];
   }
-
- private:
-  static constexpr int kPending = kMaxGivenBack + kMaxPeek + 1;
 };
 
 struct Engine {

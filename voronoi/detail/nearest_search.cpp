@@ -111,7 +111,7 @@ class NearestPointSearch {
     Box box;
   };
   std::vector<Candidate> heap_;
-  std::vector<std::int32_t> path_;
+  std::vector<std::int32_t> path_;  // of the last search, root first
 
  public:
   ~NearestPointSearch() {
