@@ -1,7 +1,8 @@
 // The diagram of points beside Boost.Polygon's Voronoi diagram on the same
 // integer input in the same run: 1e5 and 1e6 uniform points, 1e5 clustered
 // points. Each case also reports the peak memory of one construction
-// (growth of the resident set's high-water mark, in a child process).
+// (growth of the resident set's high-water mark, in a child process), and
+// BM_OursOverBoost runs the two in turn and reports the ratio of times.
 #include <benchmark/benchmark.h>
 
 #include <boost/polygon/voronoi.hpp>
@@ -69,10 +70,16 @@ void BM_Boost(benchmark::State& state) {
   zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunBoost(pts); });
 }
 
+void BM_OursOverBoost(benchmark::State& state) {
+  const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  zt::bench::paired_case(state, zt::VD_Terminate, [&] { RunOurs(pts); }, [&] { RunBoost(pts); });
+}
+
 // Arguments: (0 uniform | 1 clustered, number of points).
 #define CASES ->Args({0, 100000})->Args({0, 1000000})->Args({1, 100000})->Unit(benchmark::kMillisecond)
 BENCHMARK(BM_Ours) CASES;
 BENCHMARK(BM_Boost) CASES;
+BENCHMARK(BM_OursOverBoost) CASES->MinTime(8);
 
 }  // namespace
 

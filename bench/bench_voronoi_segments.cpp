@@ -2,7 +2,8 @@
 // the same integer input in the same run: star-shaped simple polygons of
 // 2e4 and 1e5 segments, and a pocket with 20 islands. Each case reports the
 // peak memory of one construction (growth of the resident set's high-water
-// mark, in a child process) and our restarts.
+// mark, in a child process) and our restarts, and BM_OursOverBoost runs the
+// two in turn and reports the ratio of times.
 #include <benchmark/benchmark.h>
 
 #include <boost/polygon/segment_data.hpp>
@@ -86,10 +87,16 @@ void BM_Boost(benchmark::State& state) {
   zt::bench::timed_case(state, zt::VD_Terminate, [&] { RunBoost(polys); });
 }
 
+void BM_OursOverBoost(benchmark::State& state) {
+  const auto& polys = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  zt::bench::paired_case(state, zt::VD_Terminate, [&] { RunOurs(polys); }, [&] { RunBoost(polys); });
+}
+
 // Arguments: (0 star | 1 pocket with 20 islands, number of segments).
 #define CASES ->Args({0, 20000})->Args({0, 100000})->Args({1, 20000})->Unit(benchmark::kMillisecond)
 BENCHMARK(BM_Ours) CASES;
 BENCHMARK(BM_Boost) CASES;
+BENCHMARK(BM_OursOverBoost) CASES->MinTime(8);
 
 }  // namespace
 

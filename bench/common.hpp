@@ -1,6 +1,7 @@
 // Helpers shared by the benchmarks: the peak memory of one run, measured in
 // a child process so that earlier runs and the benchmark's own caches do not
-// count, and a timed case that reports it.
+// count, a timed case that reports it, and a paired case that times ours and
+// a peer in turn and reports their ratio.
 #pragma once
 
 #include <malloc.h>
@@ -9,9 +10,12 @@
 
 #include <benchmark/benchmark.h>
 
+#include <algorithm>
+#include <chrono>
 #include <fstream>
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace zt::bench {
 
@@ -58,6 +62,35 @@ inline void timed_case(benchmark::State& state, const std::function<void()>& rel
                        const std::function<void()>& run) {
   state.counters["peak_MB"] = peak_mb(release, run);
   for (auto _ : state) run();
+}
+
+// Ours and the peer in turn on the same input, one pair per iteration, each
+// from fresh memory (`release` runs after ours; the peer frees its own). On
+// a shared machine whose speed drifts by tens of percent between runs, the
+// two halves of a pair see the same machine, so the ratio within pairs is
+// the figure to quote. Counters: ours_ms and peer_ms (the best of each),
+// ratio (best over best) and ratio_median (the median within pairs).
+inline void paired_case(benchmark::State& state, const std::function<void()>& release,
+                        const std::function<void()>& ours, const std::function<void()>& peer) {
+  const auto seconds = [](const std::function<void()>& run) {
+    const auto start = std::chrono::steady_clock::now();
+    run();
+    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+  };
+  std::vector<double> a, b, within;
+  for (auto _ : state) {
+    a.push_back(seconds(ours));
+    release();
+    b.push_back(seconds(peer));
+    within.push_back(a.back() / b.back());
+  }
+  if (within.empty()) return;
+  std::sort(within.begin(), within.end());
+  const double bestA = *std::min_element(a.begin(), a.end()), bestB = *std::min_element(b.begin(), b.end());
+  state.counters["ours_ms"] = 1e3 * bestA;
+  state.counters["peer_ms"] = 1e3 * bestB;
+  state.counters["ratio"] = bestA / bestB;
+  state.counters["ratio_median"] = within[within.size() / 2];
 }
 
 }  // namespace zt::bench
