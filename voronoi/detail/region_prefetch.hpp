@@ -70,7 +70,7 @@ class RegionPrefetch {
 
  private:
   // Second round: the far ends of the edges leaving the region's nodes, the
-  // nodes a growing tree tests next.
+  // nodes a growing tree tests next, and their edges.
   void StepOutward(Engine& g) {
     if (outwardCount_ == 0) {
       edge_ = kNone;
@@ -78,7 +78,13 @@ class RegionPrefetch {
     }
     const Outward o = outward_[--outwardCount_];
     if (!g.edges.Valid(o.edge)) return;
-    g.nodes.Prefetch(OtherNode(g.edges[o.edge], o.node));
+    const EdgeRecord& e = g.edges[o.edge];
+    const std::int32_t far = OtherNode(e, o.node);
+    g.nodes.Prefetch(far);
+    // A tree that takes the far node reads its other two edges next; their
+    // indices are in this record already.
+    g.edges.Prefetch(CcwAt(e, far));
+    g.edges.Prefetch(CwAt(e, far));
   }
 
   static constexpr std::int32_t kReadStart = -2;
