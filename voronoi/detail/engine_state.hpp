@@ -45,7 +45,7 @@ struct SuspectPair {
 // order and the sequence of values is that of drawing one at a time. A draw
 // may also peek at values to come, to request the entries they will take.
 struct OrderRandom {
-  static constexpr int kMaxGivenBack = 8;
+  static constexpr int kMaxGivenBack = 16;
   static constexpr int kMaxPeek = 16;
   static constexpr int kPending = kMaxGivenBack + kMaxPeek + 1;
 

@@ -6,15 +6,18 @@
 // order a few entries ahead and moves each drawn point through stages, one
 // insertion apart, so that its loads are requested long before they are
 // needed (slot i is inserted i insertions from now):
-//   slot 7: drawn, its point record requested;
-//   slot 6: the heads of the grid cells around it requested (with the
+//   slot 9: drawn, its point record requested;
+//   slot 8: the heads of the grid cells around it requested (with the
 //           quadtree: a walk down the path a search for it takes started,
 //           which goes on from checkpoints until the search; a quadtree
 //           is deep, so the walk starts early);
-//   slot 3: the first entries of those cells requested;
-//   slot 2: its nearest point looked up (which enters it into the search)
+//   slot 6: the first entries of those cells requested;
+//   slot 4: its nearest point looked up (which enters it into the search)
 //           and a walk of that point's region started;
-//   slots 2..0: the walk goes on from checkpoints of the insertions between.
+//   slots 4..0: the walk goes on from checkpoints of the insertions between.
+// The depths were measured: the walk needs about four insertions' worth of
+// checkpoints to hide its loads; deeper, the regions it warmed are more
+// often changed or evicted before their insertion.
 //
 // Promise: the points come out in the order DrawNext gives, each with the
 // nearest point a search just before its insertion would find. Searches run
@@ -53,10 +56,10 @@ class PointLookahead {
 
  private:
   enum Stage { kDrawn, kCellsRequested, kEntriesRequested, kSearched };
-  static constexpr int kSlots = 8;
-  static constexpr int kSearchedSlots = 3;  // slots 0..2
-  static constexpr int kEntriesSlot = 3;
-  static constexpr int kCellsSlot = 6;
+  static constexpr int kSlots = 10;
+  static constexpr int kSearchedSlots = 5;  // slots 0..4
+  static constexpr int kEntriesSlot = 6;
+  static constexpr int kCellsSlot = 8;
   static_assert(kSlots - 1 <= OrderRandom::kMaxGivenBack);
 
   struct Slot {
