@@ -11,7 +11,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

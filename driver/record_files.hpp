@@ -10,7 +10,7 @@
 
 #include <cstdint>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

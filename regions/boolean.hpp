@@ -27,7 +27,7 @@
 // One operation per thread at a time; each thread keeps its own engine.
 #pragma once
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

@@ -17,7 +17,7 @@
 #include <memory>
 
 #include "runtime/record_readers.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

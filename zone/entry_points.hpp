@@ -12,7 +12,7 @@
 #include <cstdint>
 #include <vector>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 #include "zone/zone_context.hpp"
 
 namespace zt {

@@ -11,7 +11,7 @@
 
 #include <cstdint>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 #include "zone/zone_context.hpp"
 
 namespace zt {

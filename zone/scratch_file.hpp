@@ -10,7 +10,7 @@
 #include <cstdint>
 #include <cstdio>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

@@ -25,7 +25,7 @@
 #include <utility>
 #include <vector>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt {
 

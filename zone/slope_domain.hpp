@@ -13,7 +13,7 @@
 
 #include <cstdint>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 #include "zone/offset_engine.hpp"
 #include "zone/offset_handler.hpp"
 #include "zone/simplify.hpp"

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "zone/contour_store.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 #include "zone/scratch_file.hpp"
 
 namespace zt {

@@ -16,7 +16,7 @@
 
 #include "regions/detail/pool.hpp"
 #include "regions/detail/records.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::detail {
 

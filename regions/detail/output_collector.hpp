@@ -8,7 +8,7 @@
 
 #include <cstdint>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::detail {
 

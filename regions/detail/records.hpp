@@ -4,7 +4,7 @@
 
 #include <cstdint>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::detail {
 

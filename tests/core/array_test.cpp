@@ -4,7 +4,7 @@
 #include <cstdint>
 #include <functional>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 using zt::Array;
 using zt::TaggedPoint;

@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "regions/boolean.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::test {
 

@@ -26,7 +26,7 @@
 
 #include "driver/logical_units.hpp"
 #include "driver/record_files.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace {
 

@@ -13,7 +13,7 @@
 #include <cstdint>
 
 #include "voronoi/detail/records.hpp"
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::vd::geo {
 

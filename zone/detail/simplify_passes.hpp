@@ -6,7 +6,7 @@
 #include <utility>
 #include <vector>
 
-#include "zone/core/points.hpp"
+#include "core/points.hpp"
 
 namespace zt::detail {
 

@@ -8,7 +8,7 @@
 
 #include <cstdint>
 
-#include "zone/core/array_impl.hpp"
+#include "core/array_impl.hpp"
 
 namespace zt {
 
