@@ -11,23 +11,13 @@
 #include <vector>
 
 #include "support/case_rows.hpp"
+#include "support/segment_distance.hpp"
 
 namespace zt {
 namespace {
 
 // Slack for the triangle-inequality bound: sqrt and the projection round.
 constexpr double kBoundSlack = 1e-12;
-
-double dist2(Point2d a, Point2d b) { return (a.x - b.x) * (a.x - b.x) + (a.y - b.y) * (a.y - b.y); }
-
-double seg_dist2(Point2d p, Point2d a, Point2d b) {
-  const double dx = b.x - a.x, dy = b.y - a.y;
-  const double len2 = dx * dx + dy * dy;
-  double t = len2 > 0 ? ((p.x - a.x) * dx + (p.y - a.y) * dy) / len2 : 0.0;
-  if (t <= 0) return dist2(p, a);
-  if (t >= 1) return dist2(p, b);
-  return dist2(p, {a.x + t * dx, a.y + t * dy});
-}
 
 ::testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
   bool same = got.size() == want.size();
@@ -55,8 +45,8 @@ void check_bound(const std::vector<Point2d>& in, const std::vector<Point2d>& kep
   for (int i = 0; i < static_cast<int>(in.size()); ++i) {
     while (next < index.size() && index[next] < i) ++next;
     if (next < index.size() && index[next] == i) continue;
-    const double d = next == 0 ? std::sqrt(dist2(in[i], kept[0]))
-                               : std::sqrt(seg_dist2(in[i], kept[next - 1], kept[next]));
+    const double d = next == 0 ? std::hypot(in[i].x - kept[0].x, in[i].y - kept[0].y)
+                               : test::segment_distance(in[i], kept[next - 1], kept[next]);
     ASSERT_LE(d, bound * (1 + kBoundSlack) + kBoundSlack) << "dropped point " << i;
   }
 }
