@@ -34,6 +34,7 @@ BooleanEngine::~BooleanEngine() {
   delete[] splitScratch;
   delete[] pointScratch;
   delete[] pending;
+  delete[] overlaps;
 }
 
 void reset_set(BooleanEngine& e, PolygonSet& set) {

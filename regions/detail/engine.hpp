@@ -98,6 +98,11 @@ struct SplitCandidate {
   SplitPoint* split = nullptr;
 };
 
+struct EdgeOverlap {
+  Edge* a = nullptr;
+  Edge* b = nullptr;
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
@@ -125,6 +130,10 @@ struct BooleanEngine {
   // The crossings found on one edge while its split list is settled.
   SplitCandidate* splitScratch = nullptr;
   std::int32_t splitScratchCapacity = 0;
+  // Pairs of edges found running along each other.
+  EdgeOverlap* overlaps = nullptr;
+  std::int32_t overlapCount = 0;
+  std::int32_t overlapCapacity = 0;
   // Shared vertices waiting for their sweep.
   Vertex** pending = nullptr;
   std::int32_t pendingCapacity = 0;

@@ -36,16 +36,20 @@ std::int32_t result_of(const StarRule& r, std::int32_t a, std::int32_t b) {
   return a & (1 - b);
 }
 
-bool agrees(const HalfEdge* h, std::int32_t keep, std::int32_t other, std::int32_t left) {
+// The other operand's status is the same all along a chain, as every
+// meeting of the operands is a shared vertex. The side the result lies on
+// is not: where a contour crosses itself between two shared vertices, the
+// chain passes from one side of its own operand's region to the other, so
+// the first verdict on it stands.
+bool agrees(const HalfEdge* h, std::int32_t keep, std::int32_t other) {
   if (h->keep != keep) return false;
-  if (other >= 0 && h->otherState >= 0 && h->otherState != other) return false;
-  return keep == 0 || left < 0 || h->resultLeft < 0 || h->resultLeft == left;
+  return other < 0 || h->otherState < 0 || h->otherState == other;
 }
 
 void mark(HalfEdge* h, std::int32_t keep, std::int32_t other, std::int32_t left) {
   h->keep = keep;
   if (other >= 0) h->otherState = other;
-  if (keep == 1 && left >= 0) h->resultLeft = left;
+  if (keep == 1 && left >= 0 && h->resultLeft < 0) h->resultLeft = left;
 }
 
 // Verdict for h and its twin, carried along the contour up to the next
@@ -57,10 +61,10 @@ int propagate(HalfEdge* h0, std::int32_t keep, std::int32_t other, std::int32_t 
   const std::int32_t twinLeft = left < 0 ? -1 : 1 - left;
   HalfEdge* h = h0;
   for (;;) {
-    if (h->keep != kUndecided) return agrees(h, keep, other, left) ? 0 : -1;
+    if (h->keep != kUndecided) return agrees(h, keep, other) ? 0 : -1;
     mark(h, keep, other, left);
     HalfEdge* t = h->twin;
-    if (t->keep != kUndecided && !agrees(t, keep, other, twinLeft)) return -1;
+    if (t->keep != kUndecided && !agrees(t, keep, other)) return -1;
     mark(t, keep, other, twinLeft);
     if (t->origin->owner == kSharedOwner) {
       far = t->origin;
