@@ -48,27 +48,46 @@ bool keep_flags_for(const char* op, KeepFlags& flags) {
   }
 }
 
-// The cheap check of a result: when both operands are closed contours only,
-// every result contour must close on its first point; a chain that stops
-// short means the overlay's pieces did not fit together.
-bool result_is_consistent(BooleanEngine& e, const TaggedPointList& out, std::int32_t from) {
+bool all_closed(const BooleanEngine& e) {
   for (const PolygonSet* set : {&e.a, &e.b})
     for (std::int32_t i = 0; i < set->contours.count(); ++i)
-      if (!set->contours[i].closed) return true;
-  std::int32_t first = -1;
-  for (std::int32_t i = from; i < out.count(); ++i) {
-    const TaggedPoint& p = out[i];
+      if (!set->contours[i].closed) return false;
+  return true;
+}
+
+// The cheap check of a result when both operands are closed contours only:
+// every result contour must close on its first point (a chain that stops
+// short means the overlay's pieces did not fit together). Contours of fewer
+// than three distinct points bound nothing (two sides of a sliver the
+// collector merged into one) and are dropped.
+bool close_result(TaggedPointList& out) {
+  std::int32_t write = 0, first = -1, distinct = 0;
+  for (std::int32_t i = 0; i < out.count(); ++i) {
+    const TaggedPoint p = out[i];
     if (p.tag != kSeparatorTag) {
-      if (first < 0) first = i;
+      if (first < 0) {
+        first = write;
+        distinct = 1;
+      } else if (p.x != out[write - 1].x || p.y != out[write - 1].y) {
+        ++distinct;
+      }
+      out[write++] = p;
       continue;
     }
     if (first < 0) continue;
     const TaggedPoint& q = out[first];
-    const TaggedPoint& r = out[i - 1];
-    if (i - first < 4 || q.x != r.x || q.y != r.y) return false;
+    const TaggedPoint& r = out[write - 1];
+    if (q.x != r.x || q.y != r.y) return false;
+    if (distinct < 4) {
+      write = first;  // a closed contour of at most two distinct points
+    } else {
+      out[write++] = p;
+    }
     first = -1;
   }
-  return first < 0;
+  if (first >= 0) return false;
+  out.SetCount(write);
+  return true;
 }
 
 // An operand that is an empty region: the result is the other operand's
@@ -118,7 +137,7 @@ int attempt(const TaggedPointList& a, const TaggedPointList& b, const char* op, 
   // A difference's contours follow the pieces they start from; union and
   // intersection start each contour where the result lies on its left.
   if (emit_result(e, keep.aInsideB == keep.bInsideA) != 0) return kInconsistent;
-  return result_is_consistent(e, out, 0) ? 0 : kInconsistent;
+  return !all_closed(e) || close_result(out) ? 0 : kInconsistent;
 }
 
 }  // namespace

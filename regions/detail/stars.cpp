@@ -203,12 +203,18 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
     const std::int32_t afterA = stateA ^ (countA & 1), afterB = stateB ^ (countB & 1);
     const std::int32_t resultBefore = result_of(rule, stateA, stateB), resultAfter = result_of(rule, afterA, afterB);
     // One entry of the group carries a change of the result: A's copy when
-    // both operands' boundaries run along the piece.
+    // both operands' boundaries run along the piece; of several, the one
+    // already kept from its far end, else one not yet decided.
     std::int32_t kept = -1;
     if (resultBefore != resultAfter) {
       const std::int32_t from = countA & 1 ? 1 : 2;
-      for (std::int32_t k = i; k < j && kept < 0; ++k)
-        if (operand_of(pool[k]) == from) kept = k;
+      std::int32_t best = -1;
+      for (std::int32_t k = i; k < j; ++k) {
+        const HalfEdge* h = pool[k].half;
+        if (operand_of(pool[k]) != from || h->edge->open) continue;
+        const std::int32_t score = h->keep == 1 ? 2 : h->keep == kUndecided ? 1 : 0;
+        if (score > best) best = score, kept = k;
+      }
     }
     for (std::int32_t k = i; k < j; ++k) {
       StarEntry& s = pool[k];
