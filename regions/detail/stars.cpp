@@ -1,9 +1,14 @@
 // Classification at the shared vertices. The half-edges leaving a shared
 // vertex are swept counter-clockwise while the inside/outside status of each
-// operand is toggled at its own half-edges; each half-edge is kept or dropped
-// from the other operand's status, the verdict is carried along its chain up
-// to the next shared vertex, and the kept half-edges are paired as output
-// partners.
+// operand (even-odd) is toggled at its own pieces: half-edges running along
+// one piece form a group that toggles only when it holds an odd number of
+// them, so doubled segments and spikes bound nothing. Each operand's status
+// is anchored on a piece of the other operand decided at its far end, or on
+// a ray parity, never on the direction of one half-edge. A group is kept
+// (one half-edge of it) where the result changes across it; the verdict, the
+// other operand's status and the side the result lies on are carried along
+// the chain to the next shared vertex, which is swept next, and the kept
+// half-edges are paired as output partners.
 #include <cmath>
 #include <new>
 #include <utility>
