@@ -18,6 +18,8 @@
 // machine).
 //
 //   bench_restzones                              runs the benchmarks
+//   bench_restzones --write-mold DIR             writes the mold's input files to
+//                                                DIR (to profile the program on it)
 //   bench_restzones --reference DIR plain|tuned  (internal) a Clipper side on DIR
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
@@ -406,6 +408,13 @@ BENCHMARK(BM_MoldBesideTunedClipper)->Iterations(1)->UseManualTime()->Unit(bench
 
 int main(int argc, char** argv) {
   if (argc == 4 && std::strcmp(argv[1], "--reference") == 0) return run_reference(argv[2], argv[3]);
+  if (argc == 3 && std::strcmp(argv[1], "--write-mold") == 0) {
+    const std::filesystem::path dir = prepare_case("bench_mold", make_mold());
+    std::filesystem::create_directories(argv[2]);
+    std::filesystem::copy(dir, argv[2], std::filesystem::copy_options::overwrite_existing);
+    std::filesystem::remove_all(dir);
+    return 0;
+  }
   g_self = std::filesystem::canonical("/proc/self/exe").string();
   benchmark::Initialize(&argc, argv);
   benchmark::RunSpecifiedBenchmarks();

@@ -1,11 +1,11 @@
-// The process-wide Voronoi engine behind OffsetEngine, and the stand-in
+// The calling thread's Voronoi engine behind OffsetEngine, and the stand-in
 // switch for tests.
 #include "voronoi/engine.hpp"
 #include "zone/offset_engine.hpp"
 
 namespace zt {
 
-bool engineReady = false;
+thread_local bool engineReady = false;
 
 namespace {
 
