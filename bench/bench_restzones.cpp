@@ -411,7 +411,7 @@ int main(int argc, char** argv) {
   if (argc == 3 && std::strcmp(argv[1], "--write-mold") == 0) {
     const std::filesystem::path dir = prepare_case("bench_mold", make_mold());
     std::filesystem::create_directories(argv[2]);
-    std::filesystem::copy(dir, argv[2], std::filesystem::copy_options::overwrite_existing);
+    std::filesystem::copy(dir, argv[2], std::filesystem::copy_options::overwrite_existing | std::filesystem::copy_options::recursive);
     std::filesystem::remove_all(dir);
     return 0;
   }
