@@ -18,8 +18,10 @@
 // machine).
 //
 //   bench_restzones                              runs the benchmarks
-//   bench_restzones --write-mold DIR             writes the mold's input files to
-//                                                DIR (to profile the program on it)
+//   bench_restzones --write-mold DIR [straight]  writes the mold's input files to
+//                                                DIR (to profile the program on it);
+//                                                straight: vertical walls, every
+//                                                level alike
 //   bench_restzones --reference DIR plain|tuned  (internal) a Clipper side on DIR
 #include <benchmark/benchmark.h>
 #include <fcntl.h>
@@ -132,10 +134,11 @@ RefPoly rounded_rectangle(double cx, double cy, double hx, double hy, double r, 
   return p;
 }
 
-std::vector<RefLevel> make_mold() {
+// Straight: vertical walls, the same rest material on every level.
+std::vector<RefLevel> make_mold(bool straight = false) {
   std::vector<RefLevel> levels;
   for (int k = 0; k < kMoldLevels; ++k) {
-    const double draft = 0.02 * (k + 1), band = 1.5 + 0.5 * (k % 3);
+    const double draft = straight ? 0.0 : 0.02 * (k + 1), band = straight ? 2.0 : 1.5 + 0.5 * (k % 3);
     const double hx = 100 - draft, hy = 70 - draft, r = 8;
     RefLevel l{static_cast<float>(-(k + 1)), {}, {}};
     l.finishing.push_back(rounded_rectangle(0, 0, hx, hy, r, kCavityFilletPoints, kCavitySidePoints, false));
@@ -160,7 +163,7 @@ std::vector<RefLevel> make_mold() {
       }
       add(p);
     }
-    const double w = 0.3 + 0.1 * (k % 2);
+    const double w = straight ? 0.3 : 0.3 + 0.1 * (k % 2);
     {  // strip along the bottom wall
       RefPoly p;
       for (int i = 0; i <= kStripPoints; ++i) p.push_back({-60 + 100.0 * i / kStripPoints, -hy});
@@ -177,7 +180,7 @@ std::vector<RefLevel> make_mold() {
     for (const auto& b : blobs) {
       RefPoly p;
       for (int i = 0; i < kBlobPoints; ++i) {
-        const double a = 2 * kPi * i / kBlobPoints, rr = 4 + 0.3 * (k % 4) + 1.5 * std::sin(5 * a);
+        const double a = 2 * kPi * i / kBlobPoints, rr = 4 + (straight ? 0 : 0.3 * (k % 4)) + 1.5 * std::sin(5 * a);
         p.push_back({b[0] + rr * std::cos(a), b[1] + rr * std::sin(a)});
       }
       add(p);
@@ -408,8 +411,8 @@ BENCHMARK(BM_MoldBesideTunedClipper)->Iterations(1)->UseManualTime()->Unit(bench
 
 int main(int argc, char** argv) {
   if (argc == 4 && std::strcmp(argv[1], "--reference") == 0) return run_reference(argv[2], argv[3]);
-  if (argc == 3 && std::strcmp(argv[1], "--write-mold") == 0) {
-    const std::filesystem::path dir = prepare_case("bench_mold", make_mold());
+  if ((argc == 3 || argc == 4) && std::strcmp(argv[1], "--write-mold") == 0) {
+    const std::filesystem::path dir = prepare_case("bench_mold", make_mold(argc == 4 && std::strcmp(argv[3], "straight") == 0));
     std::filesystem::create_directories(argv[2]);
     std::filesystem::copy(dir, argv[2], std::filesystem::copy_options::overwrite_existing | std::filesystem::copy_options::recursive);
     std::filesystem::remove_all(dir);

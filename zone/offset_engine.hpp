@@ -49,6 +49,8 @@ class OffsetEngine {
 // The engine in use: the calling thread's Voronoi engine unless a test stood
 // another in.
 OffsetEngine& offset_engine();
+// The calling thread's Voronoi engine, whatever stands in.
+OffsetEngine& voronoi_offset_engine();
 // Stands `engine` in (nullptr: the Voronoi engine again); returns the
 // previous stand-in or nullptr.
 OffsetEngine* set_offset_engine(OffsetEngine* engine);

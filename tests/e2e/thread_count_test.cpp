@@ -1,7 +1,9 @@
 // restzones on 1, 2 and 8 threads (RESTZONES_THREADS): the same temp1,
-// temp2, stock2.bin and console, byte for byte, on the bundled example and
-// on a generated part whose levels differ (levels without rest material,
-// with too few records, with zones that the finishing region cuts away).
+// temp2, stock2.bin and console, byte for byte, on the bundled example, on a
+// generated part whose levels differ (levels without rest material, with too
+// few records, with zones that the finishing region cuts away) and on one
+// whose levels are all alike (each thread reuses the offsets it remembers
+// for other levels than the one-thread run does).
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -39,10 +41,11 @@ void copy_example(const ProgramRun& r) {
 // A pocket with a wavy wall on every level; per level some of: a band along
 // the wall, a blob in the floor, a piece outside the pocket (its zones are
 // cut away), nothing, or a contour of three records (too few to count).
-void fill_part(const ProgramRun& r) {
+void fill_part(const ProgramRun& r, bool alike) {
   std::vector<Contour> finishing, stock;
-  for (int k = 0; k < kPartLevels; ++k) {
-    const float z = -static_cast<float>(k);
+  for (int level = 0; level < kPartLevels; ++level) {
+    const float z = -static_cast<float>(level);
+    const int k = alike ? 3 : level;  // level 3 has a band and a blob
     Contour wall{z, {}}, band{z, {}}, blob{z, {}};
     for (int i = 0; i <= 360; ++i) {
       const double a = 2 * kPi * (i % 360) / 360, rw = 50 - 0.1 * k + 2 * std::sin(7 * a);
@@ -93,7 +96,11 @@ void expect_same_for_every_thread_count(const std::function<void(const ProgramRu
 TEST(ThreadCount, ExampleIsTheSameOnEveryThreadCount) { expect_same_for_every_thread_count(copy_example, 2); }
 
 TEST(ThreadCount, GeneratedPartIsTheSameOnEveryThreadCount) {
-  expect_same_for_every_thread_count(fill_part, kPartLevels - 1);
+  expect_same_for_every_thread_count([](const ProgramRun& r) { fill_part(r, false); }, kPartLevels - 1);
+}
+
+TEST(ThreadCount, PartOfLevelsAlikeIsTheSameOnEveryThreadCount) {
+  expect_same_for_every_thread_count([](const ProgramRun& r) { fill_part(r, true); }, kPartLevels);
 }
 
 }  // namespace

@@ -62,6 +62,8 @@ OffsetEngine* g_standIn = nullptr;
 
 OffsetEngine& offset_engine() { return g_standIn ? *g_standIn : g_voronoi; }
 
+OffsetEngine& voronoi_offset_engine() { return g_voronoi; }
+
 OffsetEngine* set_offset_engine(OffsetEngine* engine) {
   OffsetEngine* previous = g_standIn;
   g_standIn = engine;
