@@ -17,6 +17,17 @@ void append_rest_material(TaggedPointList& list, const Point2f* points, std::int
   }
 }
 
+// Whether the list holds an edge: two consecutive points of one polyline
+// that differ. Without one the zone region is empty.
+bool has_edge(const TaggedPointList& list) {
+  for (std::int32_t i = 1; i < list.count(); ++i) {
+    const TaggedPoint& a = list[i - 1];
+    const TaggedPoint& b = list[i];
+    if (a.tag != kSeparatorTag && b.tag != kSeparatorTag && (a.x != b.x || a.y != b.y)) return true;
+  }
+  return false;
+}
+
 }  // namespace
 
 std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
@@ -42,8 +53,9 @@ std::int32_t zone_from_contours(ZoneContext& work, TaggedPointList& contour, con
   work.zonePoints.SetCapacity(kLevelListCapacity);
   work.zonePoints.Clear();
   build_level_zones(work, points, count);
-  if (rg_boolean(contour, work.zonePoints, "i", &contour) != 0) return -1;
   result.clear();
+  if (!has_edge(work.zonePoints)) return 0;
+  if (rg_boolean(contour, work.zonePoints, "i", &contour) != 0) return -1;
   result.reserve(static_cast<std::size_t>(contour.count()));
   for (const TaggedPoint& p : contour) {
     result.push_back({static_cast<float>(p.x), static_cast<float>(p.y)});
