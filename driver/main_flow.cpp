@@ -97,6 +97,22 @@ void show_banner() {
   std::fflush(stdout);
 }
 
+// The stock levels, read from stock1.bin in level order: a level goes to the
+// zone builder only with more than kMinLevelRecords records; each level done
+// advances the progress bar.
+struct StockLevels final : LevelSource {
+  const std::int32_t unit = free_unit();
+  std::int32_t count() const override { return g_stockLevels.count(); }
+  bool read(std::int32_t i, float& z, std::vector<Point2f>& points) override {
+    z = g_stockLevels.z[static_cast<std::size_t>(i - 1)];
+    std::int32_t first = 0, last = 0;
+    if (!find_level(z, g_stockLevels, first, last)) return false;
+    read_level_points(unit, first, last, points);
+    return static_cast<std::int32_t>(points.size()) > kMinLevelRecords;
+  }
+  void done(std::int32_t i) override { progress(count(), i); }
+};
+
 }  // namespace
 
 RunEnd restzones_main() {
@@ -127,22 +143,11 @@ RunEnd restzones_main() {
   const std::int32_t levels = g_stockLevels.count();
   progress(levels, 0);
 
-  const std::int32_t stockUnit = free_unit();
-  open_unformatted(stockUnit, stockName.data(), stockName.length(), kOpenRead, ierr);
-  for (std::int32_t i = 1; i <= levels; ++i) {
-    const float z = g_stockLevels.z[static_cast<std::size_t>(i - 1)];
-    std::int32_t first = 0, last = 0;
-    if (find_level(z, g_stockLevels, first, last)) {
-      read_level_points(stockUnit, first, last, g_points);
-      const std::int32_t count = static_cast<std::int32_t>(g_points.size());
-      if (count > kMinLevelRecords) {
-        wf_add_level(z, g_points.data(), count, ierr);
-        if (ierr != 0) return stop_with(kMsgAddFailed);
-      }
-    }
-    progress(levels, i);
-  }
-  close_unit(stockUnit);
+  StockLevels stock;
+  open_unformatted(stock.unit, stockName.data(), stockName.length(), kOpenRead, ierr);
+  wf_add_levels(stock, ierr);
+  if (ierr != 0) return stop_with(kMsgAddFailed);
+  close_unit(stock.unit);
 
   // The result is written under a name of this process and takes its own
   // name only once complete: "$TMP/stock2.bin" is never a partial file, and

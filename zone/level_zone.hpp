@@ -12,6 +12,7 @@
 #pragma once
 
 #include <cstdint>
+#include <vector>
 
 #include "core/points.hpp"
 #include "zone/zone_context.hpp"
@@ -32,6 +33,14 @@ inline constexpr std::int32_t kRestPointTag = 0;
 // matches z, it has no records or cannot be read, or the intersection fails.
 std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
                                 std::int32_t count);
+
+// The two halves of compute_level_zone, for levels computed at once: the
+// reading of the finishing contours of z (one thread reads the file), 0 when
+// `contour` holds some; then the zones from them on the calling thread's
+// engines, with `work`'s lists and offset distance (`contour` is used up).
+std::int32_t read_level_contours(ZoneContext& context, double z, TaggedPointList& contour);
+std::int32_t zone_from_contours(ZoneContext& work, TaggedPointList& contour, const Point2f* points,
+                                std::int32_t count, std::vector<Point2f>& result);
 
 // Fills context.zonePoints with the thinned offset curves of the rest
 // material, or with the rest material itself when the engine cannot offset.

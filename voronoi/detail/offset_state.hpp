@@ -8,6 +8,7 @@
 
 #include <cstdint>
 
+#include "core/per_thread.hpp"
 #include "voronoi/detail/storage.hpp"
 
 namespace zt::vd {
@@ -64,11 +65,8 @@ struct OffsetState {
   std::int32_t dataGeneration = -1;      // generation of the per-edge data
 };
 
-// Created on first use, never destroyed.
-inline OffsetState& Offs() {
-  static OffsetState* const state = new OffsetState;
-  return *state;
-}
+// The calling thread's offset state, beside its engine (see Vd()).
+inline OffsetState& Offs() { return PerThread<OffsetState>::mine(); }
 
 // Empties the lists (memory kept) and forgets the prepared generation.
 void ResetOffsetState();
