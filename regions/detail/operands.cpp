@@ -133,17 +133,18 @@ std::int32_t drop_turnbacks(TaggedPoint* pts, std::int32_t n, bool closed) {
   std::int32_t m = 0;
   for (std::int32_t i = 0; i < n; ++i) {
     const TaggedPoint q = pts[i];
+    bool merged = false;
     for (;;) {
-      if (m > 0 && same_point(pts[m - 1], q)) break;
-      if (m >= 2 && turns_back(pts[m - 2], pts[m - 1], q)) {
-        pts[m] = q;
-        drop_turn(pts, m - 1);
-        --m;
-        continue;
+      if (m > 0 && same_point(pts[m - 1], q)) {
+        merged = true;
+        break;
       }
-      break;
+      if (m < 2 || !turns_back(pts[m - 2], pts[m - 1], q)) break;
+      pts[m] = q;
+      drop_turn(pts, m - 1);
+      --m;
     }
-    if (m > 0 && same_point(pts[m - 1], q)) {
+    if (merged) {
       pts[m - 1].tag = q.tag;
     } else {
       pts[m++] = q;

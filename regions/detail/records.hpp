@@ -81,7 +81,9 @@ struct StarEntry {
   std::int32_t keep = 0;
   double angle = 0.0;
   HalfEdge* half = nullptr;
-  StarEntry* next = nullptr;
+  Vertex* to = nullptr;        // the half-edge's far end
+  std::int32_t operand = 0;    // 1 or 2
+  std::int32_t open = 0;       // of an open polyline
 };
 
 inline constexpr std::int32_t kPointBlockSize = 512;

@@ -80,8 +80,8 @@ int propagate(HalfEdge* h0, std::int32_t keep, std::int32_t other, std::int32_t 
   }
 }
 
-Vertex* destination(const StarEntry& s) { return s.half->twin->origin; }
-std::int32_t operand_of(const StarEntry& s) { return s.half->side < 0 ? -s.half->side : s.half->side; }
+Vertex* destination(const StarEntry& s) { return s.to; }
+std::int32_t operand_of(const StarEntry& s) { return s.operand; }
 
 bool before(const StarEntry& a, const StarEntry& b) {
   return a.angle < b.angle || (a.angle == b.angle && destination(a)->serial < destination(b)->serial);
@@ -131,6 +131,18 @@ std::int32_t group_end(StarPool& pool, std::int32_t i, std::int32_t n) {
 // the ray runs just below the +x axis.
 std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int32_t n) {
   StarPool& pool = e.stars;
+  std::int32_t toggles = 0;
+  for (std::int32_t i = 0; i < n;) {
+    const std::int32_t j = group_end(pool, i, n);
+    std::int32_t count = 0;
+    for (std::int32_t k = i; k < j; ++k) count += operand_of(pool[k]) == x && !pool[k].open;
+    if (count == 0) {
+      for (std::int32_t k = i; k < j; ++k)
+        if (operand_of(pool[k]) != x && pool[k].half->otherState >= 0) return pool[k].half->otherState ^ toggles;
+    }
+    toggles ^= count & 1;
+    i = j;
+  }
   // The ray takes every point within eps of its line as lying above it, so
   // the entries towards +x that end within eps of that line (the last ones
   // in order) lie above it too.
@@ -140,20 +152,8 @@ std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int3
     if (!(to->x > v->x && std::fabs(to->y - v->y) <= e.eps)) break;
     --rayAt;
   }
-  std::int32_t toggles = 0, togglesAtRay = -1;
-  for (std::int32_t i = 0; i < n;) {
-    const std::int32_t j = group_end(pool, i, n);
-    std::int32_t count = 0;
-    for (std::int32_t k = i; k < j; ++k) count += operand_of(pool[k]) == x && !pool[k].half->edge->open;
-    if (count == 0) {
-      for (std::int32_t k = i; k < j; ++k)
-        if (operand_of(pool[k]) != x && pool[k].half->otherState >= 0) return pool[k].half->otherState ^ toggles;
-    }
-    if (togglesAtRay < 0 && i >= rayAt) togglesAtRay = toggles;
-    toggles ^= count & 1;
-    i = j;
-  }
-  if (togglesAtRay < 0) togglesAtRay = toggles;
+  std::int32_t togglesAtRay = 0;
+  for (std::int32_t k = 0; k < rayAt; ++k) togglesAtRay ^= operand_of(pool[k]) == x && !pool[k].open;
   PolygonSet& set = x == 1 ? e.a : e.b;
   return (count_ray_crossings(e, set, v->x, v->y, v) & 1) ^ togglesAtRay;
 }
@@ -184,7 +184,8 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
     const Vertex* to = h->twin->origin;
     const double dx = to->x - vertex->x, dy = to->y - vertex->y;
     const double len = std::sqrt(dx * dx + dy * dy);
-    *s = StarEntry{0, 0, pseudo_angle(dx / len, dy / len), h, nullptr};
+    *s = StarEntry{0, 0, pseudo_angle(dx / len, dy / len), h, h->twin->origin, h->side < 0 ? -h->side : h->side,
+                   h->edge->open};
   }
   const std::int32_t n = pool.count();
   if (n == 0) return 0;
@@ -199,7 +200,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
     const std::int32_t j = group_end(pool, i, n);
     std::int32_t countA = 0, countB = 0, open = 0;
     for (std::int32_t k = i; k < j; ++k) {
-      if (pool[k].half->edge->open) {
+      if (pool[k].open) {
         ++open;
       } else {
         (operand_of(pool[k]) == 1 ? countA : countB) += 1;
@@ -216,7 +217,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
       std::int32_t best = -1;
       for (std::int32_t k = i; k < j; ++k) {
         const HalfEdge* h = pool[k].half;
-        if (operand_of(pool[k]) != from || h->edge->open) continue;
+        if (operand_of(pool[k]) != from || pool[k].open) continue;
         const std::int32_t score = h->keep == 1 ? 2 : h->keep == kUndecided ? 1 : 0;
         if (score > best) best = score, kept = k;
       }
@@ -225,7 +226,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
       StarEntry& s = pool[k];
       const bool ofA = operand_of(s) == 1;
       const std::int32_t other = ofA ? (countB == 0 ? stateB : -1) : (countA == 0 ? stateA : -1);
-      if (s.half->edge->open && kept < 0 && countA + countB == 0 && open == 1) {
+      if (s.open && kept < 0 && countA + countB == 0 && open == 1) {
         // A lone piece of an open polyline is kept where the other
         // operand's status is the one its operand keeps.
         const std::int32_t flag = ofA ? rule.keepAInsideB : rule.keepBInsideA;
@@ -234,7 +235,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
       s.keep = k == kept ? 1 : 0;
       s.direction = k == kept ? (resultAfter == pairSide ? 1 : -1) : 0;
       Vertex* far = nullptr;
-      const std::int32_t left = k == kept && !s.half->edge->open ? resultAfter : -1;
+      const std::int32_t left = k == kept && !s.open ? resultAfter : -1;
       if (propagate(s.half, s.keep, other, left, far) != 0) return -1;
       if (far && far->sweepMark == 0 && !push_pending(e, pending, far)) return -1;
     }
@@ -249,7 +250,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
   std::int32_t openKept = 0;
   for (std::int32_t i = 0; i < n; ++i) {
     StarEntry& s = pool[i];
-    if (s.keep != 1 || !s.half->edge->open) continue;
+    if (s.keep != 1 || !s.open) continue;
     if (openKept < 2) openEnds[openKept] = &s;
     ++openKept;
     s.direction = kDoneMark;
@@ -267,7 +268,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
     std::int32_t j = i;
     for (std::int32_t step = 1; step < n; ++step) {
       j = ((j + s.direction) % n + n) % n;
-      if (pool[j].keep == 1 && !pool[j].half->edge->open) {
+      if (pool[j].keep == 1 && !pool[j].open) {
         partner = &pool[j];
         break;
       }

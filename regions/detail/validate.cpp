@@ -35,6 +35,8 @@ bool overlay_is_consistent(BooleanEngine& e, bool afterStars) {
     if (v->owner != kSharedOwner) return false;
     for (const HalfEdge* h = v->firstOut; h; h = h->nextOut) {
       if (h->keep == kUndecided) return false;
+      // A kept piece of an open polyline may end here without a partner.
+      if (h->keep == 1 && !h->link && h->edge->open) continue;
       if (h->keep == 1 && (!h->link || h->link->link != h || h->link->keep != 1)) return false;
     }
   }
