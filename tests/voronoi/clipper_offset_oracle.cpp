@@ -11,6 +11,7 @@
 #include <numbers>
 #include <random>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "offset_check.hpp"
@@ -169,7 +170,8 @@ TEST(DegenerateRestMaterial, EverySpikePlacementOnASquareKeepsItsCurves) {
 }
 
 // Levels of rest material as the suite hands them: squares with spikes,
-// loose two-point contours, squares sharing an edge or a corner. The curves
+// loose two-point contours, squares sharing an edge or a corner, four
+// squares two by two. The curves
 // do not depend on the order of the contours nor on where each closed
 // contour starts.
 TEST(DegenerateRestMaterial, SameCurvesWhateverTheOrderOfTheContours) {
@@ -193,6 +195,11 @@ TEST(DegenerateRestMaterial, SameCurvesWhateverTheOrderOfTheContours) {
       rings.push_back(sq);
       if (unit(rng) < 0.5) rings.push_back({{x + 4, y}, {x + 8, y}, {x + 8, y + 4}, {x + 4, y + 4}});
       else rings.push_back({{x + 4, y + 4}, {x + 8, y + 4}, {x + 8, y + 8}, {x + 4, y + 8}});
+    }
+    // Four squares touching by their edges, two by two.
+    for (const auto& [i, j] : {std::pair{0, 0}, {1, 0}, {0, 1}, {1, 1}}) {
+      const double x = 45.0 + 4 * i, y = 4.0 * j;
+      rings.push_back({{x, y}, {x + 4, y}, {x + 4, y + 4}, {x, y + 4}});
     }
     const int strokes = 1 + level % 3;
     for (int k = 0; k < strokes; ++k) {

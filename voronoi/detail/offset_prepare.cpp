@@ -147,7 +147,11 @@ void CollectPart(std::int32_t e0, std::int32_t start) {
 // open polyline) lies on both sides of it and decides nothing; the others
 // decide by their lengths, so the answer is the same whatever edge the part
 // was reached from. A part bordered only by such two-sided segments lies on
-// both sides: its offsets are strokes around them.
+// both sides: its offsets are strokes around them. One-sided segments
+// disagree where an edge shared by two touching contours was given both
+// ways and only the first direction kept: a tie then leaves the part out,
+// so a square whose neighbours' directions were kept for two of its edges
+// is still inside.
 bool PartOnSide(bool left) {
   Engine& g = Vd();
   OffsetState& o = Offs();
@@ -159,7 +163,8 @@ bool PartOnSide(bool left) {
     m = 0;
   }
   o.bordered.count = 0;
-  return left ? leftLength >= rightLength : rightLength >= leftLength;
+  if (leftLength == 0.0 && rightLength == 0.0) return true;
+  return left ? leftLength > rightLength : rightLength > leftLength;
 }
 
 }  // namespace
