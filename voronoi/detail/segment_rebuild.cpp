@@ -27,9 +27,9 @@ struct BoundaryEntry {
   std::int32_t onPoint;
 };
 
-RecordArray<BoundaryEntry> gBoundary;
-RecordArray<std::int32_t> gTreeEdges;
-RecordArray<std::int32_t> gNewEdges;
+thread_local ThreadScratch<BoundaryEntry> gBoundary;
+thread_local ThreadScratch<std::int32_t> gTreeEdges;
+thread_local ThreadScratch<std::int32_t> gNewEdges;
 
 bool InTree(std::int32_t n) { return Vd().nodes[n].status == DELETED; }
 
