@@ -235,7 +235,7 @@ Outcome RunIsolated(const Sites& s, int maxRestarts, std::string* detail = nullp
 //   segs i-j ...        segments between points by order number
 //   fan cx cy x y ...   a point and free segments from it to each x y
 //   family NAME seed    one input of a campaign family
-//   neardup pairs seed  pairs of points 1e-9 apart in the unit square
+//   neardup pairs seed  pairs of points 1e-12 apart in the unit square
 //   random n seed       n segments between random points of the unit square
 //   comb teeth width    a closed comb outline
 Sites Parse(const std::string& text) {
@@ -261,7 +261,7 @@ Sites Parse(const std::string& text) {
       for (int i = 0; i < static_cast<int>(a[0]); ++i) {
         const double x = U(r, 0, 1), y = U(r, 0, 1);
         s.Add(x, y);
-        s.Add(x + 1e-9, y);
+        s.Add(x + 1e-12, y);
       }
     } else if (w[0] == "random") {
       Rng r(static_cast<std::uint32_t>(a.at(1)));
