@@ -73,7 +73,11 @@ int emit_open_contour(BooleanEngine& e, const InputContour& c) {
 
 }  // namespace
 
-int emit_result(BooleanEngine& e) {
+void emit_whole_contours(const PolygonSet& set) {
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) emit_whole(set.contours[ci]);
+}
+
+int emit_result(BooleanEngine& e, bool resultOnLeft) {
   for (PolygonSet* set : {&e.a, &e.b}) {
     for (std::int32_t ci = 0; ci < set->contours.count(); ++ci) {
       const InputContour& c = set->contours[ci];
@@ -87,7 +91,9 @@ int emit_result(BooleanEngine& e) {
   }
   for (Vertex* v = e.grid.sharedHead; v; v = v->nextShared) {
     for (HalfEdge* h = v->firstOut; h; h = h->nextOut) {
-      if (h->keep == 1 && h->emitted != kDoneMark && h->side >= 1 && write_chain(e, h) != 0) return -1;
+      if (h->keep != 1 || h->emitted == kDoneMark) continue;
+      if (!(resultOnLeft ? h->resultLeft == 1 : h->side >= 1)) continue;
+      if (write_chain(e, h) != 0) return -1;
     }
   }
   return 0;

@@ -32,6 +32,9 @@ BooleanEngine::~BooleanEngine() {
   delete[] grid.buckets;
   delete[] boxScratch;
   delete[] splitScratch;
+  delete[] pointScratch;
+  delete[] pending;
+  delete[] overlaps;
 }
 
 void reset_set(BooleanEngine& e, PolygonSet& set) {
@@ -64,12 +67,16 @@ thread_local ThreadEngineHolder tl_engine;
 
 }  // namespace
 
-BooleanEngine* prepare_thread_engine() {
+BooleanEngine* thread_engine() {
   if (!tl_engine.engine) {
     if (!allocationAllowed()) return nullptr;
     tl_engine.engine.reset(new (std::nothrow) BooleanEngine());
-    return tl_engine.engine.get();
   }
+  return tl_engine.engine.get();
+}
+
+BooleanEngine* prepare_thread_engine() {
+  if (!tl_engine.engine) return thread_engine();
   BooleanEngine& e = *tl_engine.engine;
   reset_set(e, e.a);
   reset_set(e, e.b);

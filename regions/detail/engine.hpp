@@ -98,12 +98,18 @@ struct SplitCandidate {
   SplitPoint* split = nullptr;
 };
 
+struct EdgeOverlap {
+  Edge* a = nullptr;
+  Edge* b = nullptr;
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
   BoxTreeNode* root = nullptr;
   std::int32_t firstBox = 0;
   std::int32_t lastBox = -1;
+  bool cancelled = false;  // some contour of it bounded nothing and was dropped
 };
 
 struct BooleanEngine {
@@ -124,6 +130,18 @@ struct BooleanEngine {
   // The crossings found on one edge while its split list is settled.
   SplitCandidate* splitScratch = nullptr;
   std::int32_t splitScratchCapacity = 0;
+  // Pairs of edges found running along each other.
+  EdgeOverlap* overlaps = nullptr;
+  std::int32_t overlapCount = 0;
+  std::int32_t overlapCapacity = 0;
+  // Shared vertices waiting for their sweep.
+  Vertex** pending = nullptr;
+  std::int32_t pendingCapacity = 0;
+  // One contour's points while the parts that bound nothing are dropped.
+  TaggedPoint* pointScratch = nullptr;
+  std::int32_t pointScratchCapacity = 0;
+  // The result while it is written, when the caller's list is an operand.
+  TaggedPointList output;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
 
@@ -137,6 +155,9 @@ struct BooleanEngine {
 // The calling thread's engine, created on first use and reset for a new
 // operation (sets, pools, grid contents); null if it cannot be created.
 BooleanEngine* prepare_thread_engine();
+// The calling thread's engine as it is, created on first use; null if it
+// cannot be created.
+BooleanEngine* thread_engine();
 void reset_set(BooleanEngine& e, PolygonSet& set);
 
 // ---- operands (operands.cpp)
@@ -151,7 +172,12 @@ BoundingBox scan_bounding_box(const TaggedPointList& a, const TaggedPointList& b
 void set_normalisation(BooleanEngine& e, const BoundingBox& box);
 double snap_coordinate(double v);
 // Reads one operand into its set and finishes the set (vertices, edges, tree).
-int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner);
+// Points are normalised, and with coarseGrid rounded to a coarser grid (the
+// retry). Returns 0, -1 on failure, or kEmptyOperand when every contour
+// bounded nothing (an empty region, not an error).
+inline constexpr int kEmptyOperand = 1;
+int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner,
+                 bool coarseGrid = false);
 bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p);
 template <typename F>
 void for_each_stored_point(const InputContour& c, F&& f) {
@@ -197,13 +223,23 @@ bool contour_has_splits(BooleanEngine& e, InputContour& c);
 
 // ---- classification (stars.cpp, whole_contours.cpp)
 double pseudo_angle(double c, double s);
+struct StarRule {
+  std::int32_t keepAInsideB;
+  std::int32_t keepBInsideA;
+};
 int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t keepBInsideA);
 void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag);
-// Crossings of the ray from (px, py) towards +x with the set's edges.
-std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py);
+// Crossings of the ray from (px, py) towards +x with the set's edges,
+// leaving out the edges that start, end or are split at `skip`.
+std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py,
+                                 const Vertex* skip = nullptr);
 
 // ---- emission (emission.cpp)
-int emit_result(BooleanEngine& e);
+// resultOnLeft: contours start from kept half-edges with the result on
+// their left (union, intersection), else from those along their contour.
+int emit_result(BooleanEngine& e, bool resultOnLeft);
+// Every contour of the set as read, closed ones closed on their first point.
+void emit_whole_contours(const PolygonSet& set);
 
 // ---- debug validator (validate.cpp)
 // Checks the overlay's invariants that are cheap to check; after the star

@@ -31,11 +31,24 @@ void link_pair(HalfEdge* a, HalfEdge* b) {
   b->link = a;
 }
 
+// A vertex where more than two half-edges of one operand meet (a contour
+// touching itself or another contour of its operand, the ends of a doubled
+// segment) becomes a shared vertex, so that the pieces meeting there are
+// classified by a sweep rather than followed along one contour.
+void note_branching(BooleanEngine& e, Vertex* v) {
+  if (v->owner == kSharedOwner || !v->firstOut || !v->firstOut->nextOut) return;
+  v->owner = kSharedOwner;
+  v->nextShared = e.grid.sharedHead;
+  e.grid.sharedHead = v;
+}
+
 int make_pair(BooleanEngine& e, ContourCursor& cur, Vertex* u, Vertex* v, Edge* edge, std::int32_t owner) {
   HalfEdge* f = e.halves.take();
   if (!f) return -1;
   HalfEdge* r = e.halves.take();
   if (!r) return -1;
+  note_branching(e, u);
+  note_branching(e, v);
   *f = HalfEdge{owner, kUndecided, -1, u, r, u->firstOut, nullptr, edge};
   *r = HalfEdge{-owner, kUndecided, -1, v, f, v->firstOut, nullptr, edge};
   u->firstOut = f;

@@ -4,6 +4,7 @@
 // both edges (split_lists.cpp).
 #include <algorithm>
 #include <cmath>
+#include <new>
 
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
@@ -26,6 +27,61 @@ bool extents_apart(const Edge& a, const Edge& b) {
          std::min(b.start->y, b.end->y) > std::max(a.start->y, a.end->y) + m;
 }
 
+// Collinear overlaps found by the walk, to share their split points later.
+bool remember_overlap(BooleanEngine& e, Edge& a, Edge& b) {
+  if (e.overlapCount == e.overlapCapacity) {
+    if (!allocationAllowed()) return false;
+    const std::int32_t grown = e.overlapCapacity < 64 ? 64 : 2 * e.overlapCapacity;
+    EdgeOverlap* bigger = new (std::nothrow) EdgeOverlap[static_cast<std::size_t>(grown)];
+    if (!bigger) return false;
+    for (std::int32_t i = 0; i < e.overlapCount; ++i) bigger[i] = e.overlaps[i];
+    delete[] e.overlaps;
+    e.overlaps = bigger;
+    e.overlapCapacity = grown;
+  }
+  e.overlaps[e.overlapCount++] = EdgeOverlap{&a, &b};
+  return true;
+}
+
+// Where edges of both operands run along each other, a vertex that cuts one
+// of them inside the overlap (a corner of a third contour lying there) cuts
+// the other too: a piece must end wherever another piece along it ends, or
+// the sweep at that vertex misses it. Returns whether a split was added.
+int share_splits(BooleanEngine& e, const Edge& from, Edge& to, bool& added) {
+  const double dx = to.end->x - to.start->x, dy = to.end->y - to.start->y;
+  const double len2 = dx * dx + dy * dy;
+  const double len = std::sqrt(len2);
+  for (const SplitPoint* sp = from.splits; sp; sp = sp->next) {
+    Vertex* v = sp->vertex;
+    if (v == to.start || v == to.end) continue;
+    const double rx = v->x - to.start->x, ry = v->y - to.start->y;
+    const double t = (rx * dx + ry * dy) / len2;
+    if (!(t * len > e.eps && (1.0 - t) * len > e.eps)) continue;
+    if (std::fabs(rx * dy - ry * dx) >= e.eps * len) continue;
+    bool known = false;
+    for (const SplitPoint* q = to.splits; q && !known; q = q->next) known = q->vertex == v;
+    if (known) continue;
+    if (record_split(e.splits, to, t, v) != 0) return -1;
+    added = true;
+  }
+  return 0;
+}
+
+int share_overlap_splits(BooleanEngine& e) {
+  // Two rounds carry a cut across a chain of three overlapping edges.
+  for (int round = 0; round < 2; ++round) {
+    for (std::int32_t i = 0; i < e.overlapCount; ++i) {
+      Edge& a = *e.overlaps[i].a;
+      Edge& b = *e.overlaps[i].b;
+      bool toA = false, toB = false;
+      if (share_splits(e, a, b, toB) != 0 || share_splits(e, b, a, toA) != 0) return -1;
+      if (toA && settle_splits(e, a, e.eps) != 0) return -1;
+      if (toB && settle_splits(e, b, e.eps) != 0) return -1;
+    }
+  }
+  return 0;
+}
+
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
   pr.retryReversed = 0;
@@ -41,6 +97,7 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
     return 0;
   }
   if (k < 1) return 0;
+  if (k == 2 && !remember_overlap(e, first, second)) return -1;
   const double uAx = pr.dirA.dx / pr.dirA.length, uAy = pr.dirA.dy / pr.dirA.length;
   const double uBx = pr.dirB.dx / pr.dirB.length, uBy = pr.dirB.dy / pr.dirB.length;
   for (int r = 0; r < k; ++r) {
@@ -86,8 +143,10 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
 int find_intersections(BooleanEngine& e) {
   e.probe.mode = 1;
   if (!e.a.root || !e.b.root) return -1;
+  e.overlapCount = 0;
   int rc = walk(e, e.a.root, e.b.root);
   for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
+  if (rc == 0 && e.overlapCount > 0) rc = share_overlap_splits(e);
   e.halves.reset();
   e.stars.reset();
   return rc;

@@ -86,9 +86,104 @@ bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p) {
   return true;
 }
 
-int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner) {
+namespace {
+
+bool grow_point_scratch(BooleanEngine& e, std::int32_t n) {
+  if (n <= e.pointScratchCapacity) return true;
+  delete[] e.pointScratch;
+  e.pointScratch = nullptr;
+  e.pointScratchCapacity = 0;
+  if (!allocationAllowed()) return false;
+  e.pointScratch = new (std::nothrow) TaggedPoint[static_cast<std::size_t>(n)];
+  if (!e.pointScratch) return false;
+  e.pointScratchCapacity = n;
+  return true;
+}
+
+bool same_point(const TaggedPoint& p, const TaggedPoint& q) {
+  return std::fmax(std::fabs(p.x - q.x), std::fabs(p.y - q.y)) < kEngineEpsilon;
+}
+
+// The path p -> q -> r turns straight back at q: the shorter leg's far end
+// lies within the tolerance of the longer leg's line.
+bool turns_back(const TaggedPoint& p, const TaggedPoint& q, const TaggedPoint& r) {
+  const double ux = q.x - p.x, uy = q.y - p.y, vx = r.x - q.x, vy = r.y - q.y;
+  if (ux * vx + uy * vy >= 0.0) return false;
+  const double longer = std::fmax(std::sqrt(ux * ux + uy * uy), std::sqrt(vx * vx + vy * vy));
+  return std::fabs(ux * vy - uy * vx) <= kEngineEpsilon * longer;
+}
+
+// Drops q of p -> q -> r where the path turns straight back: p -> r covers
+// what is left once the overlap, run along in both directions, cancels out.
+// When r lies beyond p, p -> r runs along q -> r and takes its tag.
+void drop_turn(TaggedPoint* pts, std::int32_t at) {
+  const TaggedPoint& p = pts[at - 1];
+  const TaggedPoint& q = pts[at];
+  const TaggedPoint& r = pts[at + 1];
+  if ((r.x - p.x) * (q.x - p.x) + (r.y - p.y) * (q.y - p.y) < 0.0) pts[at - 1].tag = q.tag;
+}
+
+// Removes from pts[0..n) the points where the contour turns straight back
+// (spikes, there-and-back pieces, slivers thinner than the tolerance) and
+// merges consecutive points within the tolerance (the later tag stays, as
+// it is the tag of the edge that leaves the point). Closed contours are
+// treated cyclically; one left with fewer than three points bounds nothing
+// and comes back empty. Returns the new count.
+std::int32_t drop_turnbacks(TaggedPoint* pts, std::int32_t n, bool closed) {
+  std::int32_t m = 0;
+  for (std::int32_t i = 0; i < n; ++i) {
+    const TaggedPoint q = pts[i];
+    for (;;) {
+      if (m > 0 && same_point(pts[m - 1], q)) break;
+      if (m >= 2 && turns_back(pts[m - 2], pts[m - 1], q)) {
+        pts[m] = q;
+        drop_turn(pts, m - 1);
+        --m;
+        continue;
+      }
+      break;
+    }
+    if (m > 0 && same_point(pts[m - 1], q)) {
+      pts[m - 1].tag = q.tag;
+    } else {
+      pts[m++] = q;
+    }
+  }
+  if (!closed) return m;
+  // The seam: the last point against the first two, until nothing changes.
+  bool changed = true;
+  while (changed && m >= 3) {
+    changed = false;
+    if (same_point(pts[m - 1], pts[0])) {
+      --m;
+      changed = true;
+    } else if (turns_back(pts[m - 2], pts[m - 1], pts[0])) {
+      pts[m] = pts[0];
+      drop_turn(pts, m - 1);
+      --m;
+      changed = true;
+    } else if (turns_back(pts[m - 1], pts[0], pts[1])) {
+      if ((pts[1].x - pts[m - 1].x) * (pts[0].x - pts[m - 1].x) + (pts[1].y - pts[m - 1].y) * (pts[0].y - pts[m - 1].y) < 0.0)
+        pts[m - 1].tag = pts[0].tag;
+      for (std::int32_t k = 1; k < m; ++k) pts[k - 1] = pts[k];
+      --m;
+      changed = true;
+    }
+  }
+  return m >= 3 ? m : 0;
+}
+
+// Coordinates of the retry, rounded to multiples of this (normalised).
+inline constexpr double kCoarseGrid = 0x1p-36;
+
+double coarse(double v) { return std::round(v / kCoarseGrid) * kCoarseGrid; }
+
+}  // namespace
+
+int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner, bool coarseGrid) {
   reset_set(e, set);
   set.owner = owner;
+  set.cancelled = false;
   const std::int32_t n = list.count();
   std::int32_t i = 0;
   while (i < n) {
@@ -111,18 +206,44 @@ int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list,
     }
     if (end - begin < 2) continue;
 
+    // One spare slot: drop_turnbacks looks one point ahead.
+    if (!grow_point_scratch(e, end - begin + 1)) return -1;
+    TaggedPoint* pts = e.pointScratch;
+    for (std::int32_t k = begin; k < end; ++k) {
+      const TaggedPoint& p = list[k];
+      double x = (snap_coordinate(p.x) - e.offsetX) / e.scaleX;
+      double y = (snap_coordinate(p.y) - e.offsetY) / e.scaleY;
+      if (coarseGrid) x = coarse(x), y = coarse(y);
+      pts[k - begin] = TaggedPoint(p.tag, x, y);
+    }
+    const TaggedPoint first = pts[0];
+    const std::int32_t kept = drop_turnbacks(pts, end - begin, closed);
+    if (kept < 2) {
+      // A contour of two distinct points or more that bounds nothing.
+      for (std::int32_t k = begin + 1; k < end && !set.cancelled; ++k) {
+        const double x = (snap_coordinate(list[k].x) - e.offsetX) / e.scaleX;
+        const double y = (snap_coordinate(list[k].y) - e.offsetY) / e.scaleY;
+        set.cancelled = !same_point(first, TaggedPoint(0, coarseGrid ? coarse(x) : x, coarseGrid ? coarse(y) : y));
+      }
+      continue;
+    }
+
     InputContour* c = set.contours.take();
     if (!c) return -1;
     *c = InputContour{};
     c->closed = closed ? 1 : 0;
-    for (std::int32_t k = begin; k < end; ++k) {
-      const TaggedPoint& p = list[k];
-      const TaggedPoint stored(p.tag, (snap_coordinate(p.x) - e.offsetX) / e.scaleX,
-                               (snap_coordinate(p.y) - e.offsetY) / e.scaleY);
-      if (!contour_append(e, *c, stored)) return -1;
-    }
+    for (std::int32_t k = 0; k < kept; ++k)
+      if (!contour_append(e, *c, pts[k])) return -1;
   }
-  return finish_set(e, set);
+  // An operand made only of parts that bound nothing is an empty region.
+  if (set.contours.count() == 0 && set.cancelled) return kEmptyOperand;
+  if (finish_set(e, set) != 0) return -1;
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) {
+    const InputContour& c = set.contours[ci];
+    if (!c.closed)
+      for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) e.edges[k].open = 1;
+  }
+  return 0;
 }
 
 }  // namespace zt::detail

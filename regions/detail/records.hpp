@@ -20,6 +20,7 @@ inline constexpr std::int32_t kDoneMark = 400;
 
 struct Vertex {
   std::int32_t owner = 0;  // 1, 2, or kSharedOwner
+  std::int32_t sweepMark = 0;  // star classification: 0 not met, 1 waiting or swept
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
   std::int32_t serial = 0;  // creation order within the operation
@@ -33,6 +34,9 @@ struct Edge {
   Vertex* end = nullptr;
   SplitPoint* splits = nullptr;  // ascending t
   std::uint32_t tag = 0;
+  // An edge of an open polyline bounds nothing: it never changes its
+  // operand's inside status and no ray counts it.
+  std::int32_t open = 0;
 };
 
 // Box of an edge in integer units of 1/1000 of the normalised square.
@@ -64,6 +68,12 @@ struct HalfEdge {
   HalfEdge* nextOut = nullptr;
   HalfEdge* link = nullptr;  // contour continuation, or output partner at a shared vertex
   Edge* edge = nullptr;
+  // Set by the star classification along the whole chain: the other
+  // operand's inside status along the piece (-1 unknown, or where both
+  // operands' boundaries run along it), and whether the result lies on the
+  // half-edge's left (-1 unknown).
+  std::int32_t otherState = -1;
+  std::int32_t resultLeft = -1;
 };
 
 struct StarEntry {

@@ -9,12 +9,19 @@ namespace zt::detail {
 
 namespace {
 
-void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
+bool meets(const Edge& edge, const Vertex* v) {
+  if (edge.start == v || edge.end == v) return true;
+  for (const SplitPoint* sp = edge.splits; sp; sp = sp->next)
+    if (sp->vertex == v) return true;
+  return false;
+}
+
+void count_in_node(BooleanEngine& e, const BoxTreeNode* node, const Vertex* skip) {
   const BoxTreeNode& q = e.queryBox;
   if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, node->xmin, node->ymin, node->xmax, node->ymax)) return;
   if (node->low) {
-    count_in_node(e, node->low);
-    count_in_node(e, node->high);
+    count_in_node(e, node->low, skip);
+    count_in_node(e, node->high, skip);
     return;
   }
   IntersectionProbe& pr = e.probe;
@@ -22,13 +29,14 @@ void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
     const EdgeBox& b = e.boxes[i];
     if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, b.xmin, b.ymin, b.xmax, b.ymax)) continue;
     const Edge& edge = *b.edge;
+    if (edge.open || (skip && meets(edge, skip))) continue;
     pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
   }
 }
 
 }  // namespace
 
-std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py) {
+std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py, const Vertex* skip) {
   IntersectionProbe& pr = e.probe;
   pr.mode = 0;
   pr.crossingCount = 0;
@@ -39,7 +47,7 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
   q.ymin = box_coordinate(py, -1);
   q.xmax = kRayBoxXmax;
   q.ymax = box_coordinate(py, 1);
-  if (set.root) count_in_node(e, set.root);
+  if (set.root) count_in_node(e, set.root, skip);
   return pr.crossingCount;
 }
 

@@ -146,8 +146,10 @@ void expect_parts_like_reference(bool crossing) {
 
 TEST(RestzonesOracle, DegenerateRestMaterialAgreesWithClipper) { expect_parts_like_reference(false); }
 
-// Waits for the Boolean engine to read a self-crossing operand even-odd:
-// until then the crossing wall's level stops the run.
+// Waits for the Boolean engine: today the crossing wall's level stops the
+// run; read even-odd, the intersection must also come out as contours of
+// the usual orientation (the final assembly grows them on their right), not
+// as one contour through the crossing with its main lobe clockwise.
 TEST(RestzonesOracle, DISABLED_ACrossingFinishingWallAgreesWithClipper) { expect_parts_like_reference(true); }
 
 }  // namespace

@@ -52,8 +52,10 @@ TEST_P(BooleanRows, ResultAsListed) {
     const auto tilde = value.find('~');
     const double want = Num(value.substr(0, tilde));
     const double tol = tilde == std::string::npos ? 0 : Num(value.substr(tilde + 1));
-    if (key == "area" || key == "|area|") {
-      const double got = key == "area" ? total_area(r) : std::fabs(total_area(r));
+    if (key == "area" || key == "|area|" || key == "evenodd") {
+      const double got = key == "area"     ? total_area(r)
+                         : key == "|area|" ? std::fabs(total_area(r))
+                                           : slab_area(region_of(r), {}, 'u');
       if (tol > 0) {
         EXPECT_NEAR(got, want, tol);
       } else {

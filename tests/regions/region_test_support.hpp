@@ -2,7 +2,9 @@
 // into contours, areas.
 #pragma once
 
+#include <algorithm>
 #include <cmath>
+#include <utility>
 #include <vector>
 
 #include "regions/boolean.hpp"
@@ -74,6 +76,66 @@ inline bool same_list(const TaggedPointList& a, const TaggedPointList& b) {
   for (int i = 0; i < a.count(); ++i)
     if (a[i].tag != b[i].tag || a[i].x != b[i].x || a[i].y != b[i].y) return false;
   return true;
+}
+
+// Even-odd area of an operation on two regions (op u, i or d) by vertical
+// slabs, written apart from the engine: between consecutive x of vertices and crossings no two
+// edges cross, so each slab is a stack of trapezoids, each inside or
+// outside both operands as a whole. Quadratic in the edges: small cases only.
+inline double slab_area(const std::vector<Contour>& ra, const std::vector<Contour>& rb, char op) {
+  struct Seg {
+    Pt a, b;
+    int owner;
+  };
+  std::vector<Seg> segs;
+  for (int k = 0; k < 2; ++k)
+    for (const Contour& c : k == 0 ? ra : rb)
+      for (std::size_t i = 0; i < c.size(); ++i) {
+        const Pt& p = c[i];
+        const Pt& q = c[(i + 1) % c.size()];
+        if (p.x != q.x) segs.push_back({p.x < q.x ? p : q, p.x < q.x ? q : p, k});
+      }
+  std::vector<double> xs;
+  for (const Seg& s : segs) xs.push_back(s.a.x), xs.push_back(s.b.x);
+  for (std::size_t i = 0; i < segs.size(); ++i)
+    for (std::size_t j = i + 1; j < segs.size(); ++j) {
+      const Seg &s = segs[i], &t = segs[j];
+      const double dx = s.b.x - s.a.x, dy = s.b.y - s.a.y, ex = t.b.x - t.a.x, ey = t.b.y - t.a.y;
+      const double d = dx * ey - dy * ex;
+      if (d == 0) continue;
+      const double u = ((t.a.x - s.a.x) * ey - (t.a.y - s.a.y) * ex) / d;
+      const double v = ((t.a.x - s.a.x) * dy - (t.a.y - s.a.y) * dx) / d;
+      if (u >= 0 && u <= 1 && v >= 0 && v <= 1) xs.push_back(s.a.x + u * dx);
+    }
+  std::sort(xs.begin(), xs.end());
+  double total = 0;
+  for (std::size_t i = 0; i + 1 < xs.size(); ++i) {
+    const double x0 = xs[i], x1 = xs[i + 1], xm = 0.5 * (x0 + x1);
+    if (!(x1 > x0)) continue;
+    std::vector<std::pair<double, int>> ys;
+    for (const Seg& s : segs)
+      if (s.a.x <= x0 && x1 <= s.b.x) ys.push_back({s.a.y + (xm - s.a.x) * (s.b.y - s.a.y) / (s.b.x - s.a.x), s.owner});
+    std::sort(ys.begin(), ys.end());
+    int pa = 0, pb = 0;
+    for (std::size_t k = 0; k + 1 < ys.size(); ++k) {
+      (ys[k].second == 0 ? pa : pb) ^= 1;
+      const bool in = op == 'u' ? (pa || pb) : op == 'i' ? (pa && pb) : (pa && !pb);
+      if (in) total += (x1 - x0) * (ys[k + 1].first - ys[k].first);
+    }
+  }
+  return total;
+}
+
+// The result's contours as a region (closing points kept: a zero-length
+// edge adds nothing).
+inline std::vector<Contour> region_of(const TaggedPointList& list) {
+  std::vector<Contour> out;
+  for (const auto& c : contours_of(list)) {
+    Contour r;
+    for (const TaggedPoint& p : c) r.push_back({p.x, p.y, p.tag});
+    out.push_back(r);
+  }
+  return out;
 }
 
 }  // namespace zt::test

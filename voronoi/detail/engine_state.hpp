@@ -150,6 +150,10 @@ struct Engine {
   // entry 2*segment + (0 for i1, 1 for i2)).
   RecordArray<std::int32_t> xrefStart;
   RecordArray<std::int32_t> xrefEnds;
+  // Points whose ends were redirected to a point, as a chain from it:
+  // xrefMerged[i] is the next point merged into i's chain (kNone ends it).
+  // Redirecting keeps the list valid in place.
+  RecordArray<std::int32_t> xrefMerged;
   bool xrefBuilt = false;
 
   // Scratch lists of one insertion.

@@ -88,22 +88,45 @@ void Push(std::int32_t edge, std::int32_t node) {
   Offs().stack.Append(TraversalEntry{edge, node}, kTraversalGrowth);
 }
 
-// Takes edge e into the current part: clears its flag and lists it.
-void Take(std::int32_t e) {
-  OffsetState& o = Offs();
+// Sides of a segment that the current part lies on.
+constexpr std::uint8_t kOnLeft = 1;
+constexpr std::uint8_t kOnRight = 2;
+
+// Notes the side of segment `seg` on which node n lies. n is a node of
+// non-zero clearance on an edge of the segment's region: it lies in the
+// segment's slab at its clearance from the segment's line, so the sign of
+// the line's equation is the side of the whole edge.
+void NoteSide(Engine& g, OffsetState& o, const NodeRecord& n, std::int32_t seg) {
+  const SegmentRecord& s = g.segments[seg];
+  const double side = s.a * n.x + s.b * n.y + s.c;
+  if (std::fabs(side) <= kOffsetZero) return;
+  std::uint8_t& m = o.segmentSides[seg];
+  if (m == 0) o.bordered.Append(seg, kTraversalGrowth);
+  m |= side > 0.0 ? kOnLeft : kOnRight;
+}
+
+// Takes edge e, reached at its node `at` (of non-zero clearance), into the
+// current part: clears its flag, lists it when it may carry offsets and
+// notes the sides of its segment sites while its records are at hand.
+void Take(Engine& g, OffsetState& o, std::int32_t e, std::int32_t at) {
   o.candidate[e] = 0;
-  o.component.Append(e, kTraversalGrowth);
+  const EdgeRecord& r = g.edges[e];
+  if (e >= kFirstInnerEdge && Qualifies(r)) o.component.Append(e, kTraversalGrowth);
+  const NodeRecord& n = g.nodes[at];
+  if (r.ltype == SEG && r.lft >= 0) NoteSide(g, o, n, r.lft);
+  if (r.rtype == SEG && r.rgt >= 0) NoteSide(g, o, n, r.rgt);
 }
 
 // Flood fill of the part of the diagram around edge e0 bounded by the input
 // segments (nodes of zero clearance are never passed): one face of the
-// input, whose edges end up in `component`.
+// input, whose edges that may carry offsets end up in `component`. `start`
+// is a node of e0 of non-zero clearance.
 void CollectPart(std::int32_t e0, std::int32_t start) {
   Engine& g = Vd();
   OffsetState& o = Offs();
   o.stack.count = 0;
   o.component.count = 0;
-  Take(e0);
+  Take(g, o, e0, start);
   Push(e0, start);
   Push(e0, OtherNode(g.edges[e0], start));
   while (o.stack.count > 0) {
@@ -113,29 +136,10 @@ void CollectPart(std::int32_t e0, std::int32_t start) {
     const std::int32_t ccw = CcwAt(r, t.node), cw = CwAt(r, t.node);
     for (const std::int32_t f : {ccw, cw}) {
       if (f < 0 || !ValidEdge(f) || !o.candidate[f]) continue;
-      Take(f);
+      Take(g, o, f, t.node);
       Push(f, OtherNode(g.edges[f], t.node));
     }
   }
-}
-
-// Sides of a segment that the current part lies on.
-constexpr std::uint8_t kOnLeft = 1;
-constexpr std::uint8_t kOnRight = 2;
-
-// Notes the side of segment `seg` on which edge r (one of its region's
-// edges) lies, judged at r's node of larger clearance.
-void NoteSide(const EdgeRecord& r, std::int32_t seg) {
-  Engine& g = Vd();
-  OffsetState& o = Offs();
-  const NodeRecord& n = g.nodes[g.nodes[r.n1].r >= g.nodes[r.n2].r ? r.n1 : r.n2];
-  if (n.r <= kOffsetZero) return;
-  const SegmentRecord& s = g.segments[seg];
-  const double side = s.a * n.x + s.b * n.y + s.c;
-  if (std::fabs(side) <= kOffsetZero) return;
-  std::uint8_t& m = o.segmentSides[seg];
-  if (m == 0) o.bordered.Append(seg, kTraversalGrowth);
-  m |= side > 0.0 ? kOnLeft : kOnRight;
 }
 
 // Whether the current part lies on the wanted side of the input. A segment
@@ -147,11 +151,6 @@ void NoteSide(const EdgeRecord& r, std::int32_t seg) {
 bool PartOnSide(bool left) {
   Engine& g = Vd();
   OffsetState& o = Offs();
-  for (std::int32_t i = 0; i < o.component.count; ++i) {
-    const EdgeRecord& r = g.edges[o.component[i]];
-    if (r.ltype == SEG && r.lft >= 0) NoteSide(r, r.lft);
-    if (r.rtype == SEG && r.rgt >= 0) NoteSide(r, r.rgt);
-  }
   double leftLength = 0.0, rightLength = 0.0;
   for (std::int32_t i = 0; i < o.bordered.count; ++i) {
     std::uint8_t& m = o.segmentSides[o.bordered[i]];
@@ -215,10 +214,7 @@ void InitializeEdgeData(bool left, bool right) {
       if (g.nodes[start].r <= kOffsetZero) continue;
       CollectPart(e, start);
       if (!PartOnSide(left)) continue;
-      for (std::int32_t i = 0; i < o.component.count; ++i) {
-        const std::int32_t f = o.component[i];
-        if (f >= kFirstInnerEdge && Qualifies(g.edges[f])) o.workList.Append(f, kTraversalGrowth);
-      }
+      for (std::int32_t i = 0; i < o.component.count; ++i) o.workList.Append(o.component[i], kTraversalGrowth);
     }
   }
   for (std::int32_t e = 0; e < n; ++e) o.candidate[e] = e >= kFirstInnerEdge ? 1 : 0;
