@@ -140,8 +140,8 @@ std::int32_t assemble_at_once(ZoneBuilderState& state, ScratchFile& zones, std::
     if (owner.shrank.valid()) {
       if (!wait && owner.shrank.wait_for(std::chrono::seconds(0)) != std::future_status::ready) return 1;
       owner.shrank.get();
-      if (owner.shrankStatus != 0) return -1;
     }
+    if (owner.shrankStatus != 0) return -1;
     if (record_level(state, zones, owner.output, written, jobs[static_cast<std::size_t>(recorded)]->z) != 0) {
       return -1;
     }

@@ -1,6 +1,10 @@
 // compute_level_zone and build_level_zones.
 #include "zone/level_zone.hpp"
 
+#include <bit>
+#include <cstdint>
+#include <vector>
+
 #include "regions/boolean.hpp"
 #include "zone/offset_engine.hpp"
 #include "zone/simplify.hpp"
@@ -28,6 +32,64 @@ bool has_edge(const TaggedPointList& list) {
   return false;
 }
 
+// The last level zone computed on this thread and what it was computed
+// from: a level whose finishing contours, rest material and offset distance
+// are equal bit for bit to those gets the same zones without the engines
+// (the levels of a part with vertical walls).
+struct RememberedLevel {
+  bool valid = false;
+  std::uint64_t distanceBits = 0;
+  std::vector<TaggedPoint> contour;
+  std::vector<Point2f> rest;
+  std::vector<Point2f> result;
+};
+thread_local RememberedLevel tl_level;
+
+bool same_bits(double a, double b) {
+  return std::bit_cast<std::uint64_t>(a) == std::bit_cast<std::uint64_t>(b);
+}
+bool same_bits(float a, float b) { return std::bit_cast<std::uint32_t>(a) == std::bit_cast<std::uint32_t>(b); }
+
+bool remembered_level_matches(const TaggedPointList& contour, const Point2f* points, std::int32_t count,
+                              double distance) {
+  const RememberedLevel& r = tl_level;
+  if (!r.valid || r.distanceBits != std::bit_cast<std::uint64_t>(distance) ||
+      r.contour.size() != static_cast<std::size_t>(contour.count()) ||
+      r.rest.size() != static_cast<std::size_t>(count)) {
+    return false;
+  }
+  for (std::int32_t i = 0; i < contour.count(); ++i) {
+    const TaggedPoint &a = contour[i], &b = r.contour[static_cast<std::size_t>(i)];
+    if (a.tag != b.tag || !same_bits(a.x, b.x) || !same_bits(a.y, b.y)) return false;
+  }
+  for (std::int32_t i = 0; i < count; ++i) {
+    const Point2f &a = points[i], &b = r.rest[static_cast<std::size_t>(i)];
+    if (!same_bits(a.x, b.x) || !same_bits(a.y, b.y)) return false;
+  }
+  return true;
+}
+
+// zone_from_contours without looking at the level before.
+std::int32_t level_zone_from_contours(ZoneContext& work, TaggedPointList& contour,
+                                      const Point2f* points, std::int32_t count,
+                                      std::vector<Point2f>& result) {
+  if (!engineReady) {
+    engineReady = true;
+    offset_engine().initialize();
+  }
+  work.zonePoints.SetCapacity(kLevelListCapacity);
+  work.zonePoints.Clear();
+  build_level_zones(work, points, count);
+  result.clear();
+  if (!has_edge(work.zonePoints)) return 0;
+  if (rg_boolean(contour, work.zonePoints, "i", &contour) != 0) return -1;
+  result.reserve(static_cast<std::size_t>(contour.count()));
+  for (const TaggedPoint& p : contour) {
+    result.push_back({static_cast<float>(p.x), static_cast<float>(p.y)});
+  }
+  return 0;
+}
+
 }  // namespace
 
 std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
@@ -46,21 +108,24 @@ std::int32_t read_level_contours(ZoneContext& context, double z, TaggedPointList
 
 std::int32_t zone_from_contours(ZoneContext& work, TaggedPointList& contour, const Point2f* points,
                                 std::int32_t count, std::vector<Point2f>& result) {
-  if (!engineReady) {
-    engineReady = true;
-    offset_engine().initialize();
+  // Only the Voronoi engine computes purely from its input.
+  const bool remember = &offset_engine() == &voronoi_offset_engine();
+  if (remember && remembered_level_matches(contour, points, count, work.offsetDistance)) {
+    result = tl_level.result;
+    return 0;
   }
-  work.zonePoints.SetCapacity(kLevelListCapacity);
-  work.zonePoints.Clear();
-  build_level_zones(work, points, count);
-  result.clear();
-  if (!has_edge(work.zonePoints)) return 0;
-  if (rg_boolean(contour, work.zonePoints, "i", &contour) != 0) return -1;
-  result.reserve(static_cast<std::size_t>(contour.count()));
-  for (const TaggedPoint& p : contour) {
-    result.push_back({static_cast<float>(p.x), static_cast<float>(p.y)});
+  tl_level.valid = false;
+  if (remember) {
+    tl_level.distanceBits = std::bit_cast<std::uint64_t>(work.offsetDistance);
+    tl_level.contour.assign(contour.begin(), contour.end());
+    tl_level.rest.assign(points, points + count);
   }
-  return 0;
+  const std::int32_t r = level_zone_from_contours(work, contour, points, count, result);
+  if (remember && r == 0) {
+    tl_level.result = result;
+    tl_level.valid = true;
+  }
+  return r;
 }
 
 void build_level_zones(ZoneContext& context, const Point2f* points, std::int32_t count) {

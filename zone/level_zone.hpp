@@ -38,6 +38,9 @@ std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* p
 // reading of the finishing contours of z (one thread reads the file), 0 when
 // `contour` holds some; then the zones from them on the calling thread's
 // engines, with `work`'s lists and offset distance (`contour` is used up).
+// A level whose contours, rest material and distance equal, bit for bit,
+// those of the thread's last level gets that level's zones again without
+// the engines (with the Voronoi engine only; a stand-in is asked each time).
 std::int32_t read_level_contours(ZoneContext& context, double z, TaggedPointList& contour);
 std::int32_t zone_from_contours(ZoneContext& work, TaggedPointList& contour, const Point2f* points,
                                 std::int32_t count, std::vector<Point2f>& result);
