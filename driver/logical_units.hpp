@@ -48,6 +48,7 @@ std::string unit_path(const std::int32_t& unit);
 // Text files (opensq). How the file is opened.
 enum class TextOpen { kRead, kCreate, kAppend };
 // Attaches a text file; false when it cannot be opened (nothing attached).
+// A file to read must be a regular file (refused at once otherwise).
 bool attach_text(const std::int32_t& unit, const std::string& path, TextOpen how);
 // Reads the next line without its line end (a "\r" before it is dropped too);
 // false at the end of the file or on a read error.

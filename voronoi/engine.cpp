@@ -108,6 +108,7 @@ void VD_Terminate() {
   g.insertionOrder.Free();
   g.xrefStart.Free();
   g.xrefEnds.Free();
+  g.xrefMerged.Free();
   g.markedSites.Free();
   g.checkedNodes.Free();
   g.deletedNodes.Free();

@@ -30,7 +30,10 @@ std::int32_t API_AddSegment(std::int32_t i1, std::int32_t i2, std::int32_t tag);
 
 // Computes the diagram of the stored sites; returns whether the diagram is
 // up to date afterwards. Refuses (false, nothing computed) input with a
-// non-finite coordinate or a magnitude above kMaxInputMagnitude.
+// non-finite coordinate or a magnitude above kMaxInputMagnitude. A
+// computation that had to take a fallback (VD_InRecoveryMode) and whose
+// diagram then fails the engine's own local checks returns false too: no
+// wrong diagram is reported as computed.
 bool VD_ComputeDiagram(bool clean, std::int32_t boundFactor, bool pointsOnly, bool keepArcLinks,
                        std::int32_t sampleDensity, std::int32_t arcPieces, double arcTolerance,
                        double arcTolerance2, bool autoArcTolerance);

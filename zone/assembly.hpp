@@ -43,6 +43,15 @@ std::int32_t assemble_zones(std::vector<Point2f>& points);
 std::int32_t merge_level_zones(TaggedPointList& A, TaggedPointList& B, TaggedPointList& C,
                                const Point2f* points, std::int32_t n, std::vector<Point2f>& out);
 
+// The three steps of merge_level_zones, for levels merged at once: the
+// level's zones points[0..n) grown into C (B scratch); C united into the
+// carried union A (C used up); the union C shrunk into out (B scratch, C
+// used up). Grow and shrink work on the calling thread's engine. 0 or -1.
+std::int32_t grow_level_zones(const Point2f* points, std::int32_t n, TaggedPointList& B,
+                              TaggedPointList& C);
+std::int32_t unite_level_zones(TaggedPointList& A, TaggedPointList& C);
+std::int32_t shrink_level_zones(TaggedPointList& B, TaggedPointList& C, std::vector<Point2f>& out);
+
 // Copies ranges[count - 1] down to ranges[0] of the scratch file `name` to
 // the unit as closed contours; 0, or -1 when the file cannot be opened or
 // read, or a contour is refused.

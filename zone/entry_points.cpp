@@ -3,11 +3,15 @@
 #include "zone/entry_points.hpp"
 
 #include <cstring>
+#include <deque>
+#include <future>
+#include <memory>
 
 #include "runtime/path_expansion.hpp"
 #include "zone/assembly.hpp"
 #include "zone/level_zone.hpp"
 #include "zone/parameter_files.hpp"
+#include "zone/worker_pool.hpp"
 
 namespace zt {
 
@@ -38,6 +42,70 @@ std::int32_t set_up_context(ZoneContext& context) {
   return load_contours(store, read_contour_record);
 }
 
+// The context of the calling thread's first level, set up on first use; null
+// when the set-up failed.
+ZoneContext* level_context(ZoneBuilderState& state) {
+  if (!state.context) {
+    state.context = std::make_unique<ZoneContext>();
+    if (set_up_context(*state.context) != 0) return nullptr;
+  }
+  return state.context.get();
+}
+
+// Appends a level's zones to temp1 on the contour level of z (none stored
+// when the result is too small); -1 when z lies below every remaining
+// contour level or the write failed.
+std::int32_t store_level_zone(ZoneBuilderState& state, float z, const std::vector<Point2f>& result) {
+  const std::int32_t n = static_cast<std::int32_t>(result.size());
+  if (n < kMinStoredPoints) return 0;
+  const std::int32_t at =
+      place_level(state.levelRanges.data(), state.levelCount, state.rangeCursor, z);
+  if (at < 0) return -1;
+  const std::int32_t first = state.pointsWritten + 1;
+  const std::int32_t wrote = write_points(state.levelFile, result.data(), n, state.pointsWritten);
+  state.levelRanges[at] = {first, state.pointsWritten, z};
+  return wrote == 0 ? 0 : -1;
+}
+
+// One level computed on a worker: its input, read on the calling thread in
+// level order, and its result, stored in level order.
+struct LevelJob {
+  std::int32_t index = 0;
+  bool active = false;  // the source gave points to add
+  bool failed = false;  // the context or the finishing contours could not be read
+  float z = 0.0f;
+  double offsetDistance = kMinOffsetDistance;
+  std::vector<Point2f> points;
+  TaggedPointList contour{0, kContextListGrowth};
+  std::vector<Point2f> result;
+  std::int32_t status = -1;
+  std::future<void> done;
+};
+
+// A worker's lists, kept from level to level.
+thread_local std::unique_ptr<ZoneContext> tl_work;
+
+void compute_job(LevelJob& job) {
+  if (!tl_work) tl_work = std::make_unique<ZoneContext>();
+  tl_work->offsetDistance = job.offsetDistance;
+  job.status = zone_from_contours(*tl_work, job.contour, job.points.data(),
+                                  static_cast<std::int32_t>(job.points.size()), job.result);
+  job.points = {};
+  job.contour.Free();
+}
+
+void add_levels_in_turn(LevelSource& source, std::int32_t& ierr) {
+  std::vector<Point2f> points;
+  for (std::int32_t i = 1; i <= source.count(); ++i) {
+    float z = 0.0f;
+    if (source.read(i, z, points)) {
+      wf_add_level(z, points.data(), static_cast<std::int32_t>(points.size()), ierr);
+      if (ierr != 0) return;
+    }
+    source.done(i);
+  }
+}
+
 }  // namespace
 
 std::int32_t place_level(const LevelRange* ranges, std::int32_t count, std::int32_t& cursor,
@@ -66,26 +134,62 @@ void wf_add_level(const float& z, const Point2f* points, const std::int32_t& cou
                   std::int32_t& ierr) {
   ierr = -1;
   ZoneBuilderState& state = zone_builder();
-  if (!state.context) {
-    state.context = std::make_unique<ZoneContext>();
-    if (set_up_context(*state.context) != 0) return;
-  }
-  ZoneContext& context = *state.context;
-  if (compute_level_zone(context, double{z}, points, count) != 0) return;
+  ZoneContext* context = level_context(state);
+  if (!context || compute_level_zone(*context, double{z}, points, count) != 0) return;
+  ierr = store_level_zone(state, z, context->levelResult);
+}
 
-  const std::int32_t n = static_cast<std::int32_t>(context.levelResult.size());
-  if (n < kMinStoredPoints) {
-    ierr = 0;
-    return;
+void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
+  ierr = 0;
+  const std::int32_t threads = zone_thread_count(source.count());
+  if (threads <= 1) return add_levels_in_turn(source, ierr);
+  std::deque<std::unique_ptr<LevelJob>> running;  // in level order; outlives the pool
+  WorkerPool pool(threads);
+  if (pool.size() < 1) return add_levels_in_turn(source, ierr);
+
+  ZoneBuilderState& state = zone_builder();
+  // Stores the oldest level and reports it done; false when it failed.
+  auto finish_oldest = [&]() {
+    LevelJob& job = *running.front();
+    if (job.active) {
+      if (job.done.valid()) job.done.wait();
+      if (job.failed || job.status != 0 || store_level_zone(state, job.z, job.result) != 0) return false;
+    }
+    source.done(job.index);
+    running.pop_front();
+    return true;
+  };
+  bool reading = true;
+  for (std::int32_t i = 1; i <= source.count() && reading; ++i) {
+    // At most one level per worker is held at once.
+    while (static_cast<std::int32_t>(running.size()) >= pool.size()) {
+      if (!finish_oldest()) {
+        ierr = -1;
+        return;  // the pool waits for the levels under way
+      }
+    }
+    auto job = std::make_unique<LevelJob>();
+    job->index = i;
+    job->active = source.read(i, job->z, job->points);
+    if (job->active) {
+      ZoneContext* context = level_context(state);
+      if (!context || read_level_contours(*context, double{job->z}, job->contour) != 0) {
+        job->failed = true;
+        reading = false;  // the levels before it still end in order
+      } else {
+        job->offsetDistance = context->offsetDistance;
+        LevelJob* j = job.get();
+        job->done = pool.run([j] { compute_job(*j); });
+      }
+    }
+    running.push_back(std::move(job));
   }
-  const std::int32_t at =
-      place_level(state.levelRanges.data(), state.levelCount, state.rangeCursor, z);
-  if (at < 0) return;
-  const std::int32_t first = state.pointsWritten + 1;
-  const std::int32_t wrote =
-      write_points(state.levelFile, context.levelResult.data(), n, state.pointsWritten);
-  state.levelRanges[at] = {first, state.pointsWritten, z};
-  ierr = wrote == 0 ? 0 : -1;
+  while (!running.empty()) {
+    if (!finish_oldest()) {
+      ierr = -1;
+      return;
+    }
+  }
 }
 
 void wf_fin_czone(std::vector<Point2f>& points, const std::int32_t& unit, std::int32_t& ierr,

@@ -39,6 +39,25 @@ void wf_init_czone(const float* levels, const std::int32_t& count, std::int32_t&
 void wf_add_level(const float& z, const Point2f* points, const std::int32_t& count,
                   std::int32_t& ierr);
 
+// The stock levels as the driver hands them to wf_add_levels.
+class LevelSource {
+ public:
+  virtual ~LevelSource() = default;
+  // Number of stock levels.
+  virtual std::int32_t count() const = 0;
+  // Level i (from 1, top down): its z and rest-material pairs; false when
+  // the level has nothing to add. Called in level order on one thread.
+  virtual bool read(std::int32_t i, float& z, std::vector<Point2f>& points) = 0;
+  // Level i is done: its zones are in "$TMP/temp1". Called in level order.
+  virtual void done(std::int32_t i) = 0;
+};
+
+// wf_add_level for every level of `source`, several levels at once on
+// worker threads (see zone/worker_pool.hpp). temp1 and the level range table
+// come out as from one wf_add_level per level in order; a level that fails
+// ends the run there (ierr -1) with every level before it stored and done.
+void wf_add_levels(LevelSource& source, std::int32_t& ierr);
+
 // Assembles the final zones over all levels and writes them, as closed
 // contours, on the unit where the driver opened "$TMP/stock2.bin", through
 // writeContour. points: the driver's point buffer, lent as scratch space (it

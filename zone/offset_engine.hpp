@@ -1,7 +1,7 @@
 // The surface of the Voronoi engine that the zone builder uses, as one
 // replaceable object.
 //
-// In the program it is always the process-wide Voronoi engine (its facade
+// In the program it is always the calling thread's Voronoi engine (its facade
 // and the read-out of its offset store); the zone builder never talks to
 // the engine any other way, so the order of the engine calls is visible in
 // one place and a test can stand in a recording or scripted engine.
@@ -46,15 +46,17 @@ class OffsetEngine {
   virtual Point2d arcCentre(std::int32_t arc) = 0;
 };
 
-// The engine in use: the process-wide Voronoi engine unless a test stood
+// The engine in use: the calling thread's Voronoi engine unless a test stood
 // another in.
 OffsetEngine& offset_engine();
+// The calling thread's Voronoi engine, whatever stands in.
+OffsetEngine& voronoi_offset_engine();
 // Stands `engine` in (nullptr: the Voronoi engine again); returns the
 // previous stand-in or nullptr.
 OffsetEngine* set_offset_engine(OffsetEngine* engine);
 
-// Set when the zone builder first starts the Voronoi engine; cleared when it
-// terminates it.
-extern bool engineReady;
+// Set when the zone builder first starts the calling thread's Voronoi
+// engine; cleared when it terminates it.
+extern thread_local bool engineReady;
 
 }  // namespace zt

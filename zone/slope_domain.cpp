@@ -4,7 +4,9 @@
 
 #include <algorithm>
 #include <cassert>
+#include <bit>
 #include <cmath>
+#include <cstring>
 #include <limits>
 
 #include "zone/offset_readout.hpp"
@@ -33,7 +35,78 @@ SlopeDomain::SlopeDomain(double distance, OffsetEngine& engine)
 
 SlopeDomain::~SlopeDomain() = default;
 
+namespace {
+
+// The last offsets computed on this thread for each of a few distances: the
+// list they were computed from and the list they gave. The result depends
+// only on the coordinates fed (tags are not fed), the distance, the side and
+// the arc tolerance, so an input equal bit for bit to the remembered one gets
+// the remembered result without a diagram: the levels of a part with
+// vertical walls repeat their rest material, zones and unions.
+constexpr std::int32_t kRememberedGrowth = 100;
+struct RememberedOffset {
+  std::uint64_t distanceBits = 0;
+  std::uint64_t arcToleranceBits = 0;
+  std::int32_t side = -1;
+  TaggedPointList input{0, kRememberedGrowth};
+  TaggedPointList output{0, kRememberedGrowth};
+};
+// Distances remembered per thread: the level offset, the grow and the shrink.
+constexpr int kRememberedDistances = 3;
+thread_local RememberedOffset tl_remembered[kRememberedDistances];
+thread_local int tl_nextSlot = 0;
+
+bool same_coordinates(const TaggedPointList& a, const TaggedPointList& b) {
+  if (a.count() != b.count()) return false;
+  for (std::int32_t i = 0; i < a.count(); ++i) {
+    if (std::bit_cast<std::uint64_t>(a[i].x) != std::bit_cast<std::uint64_t>(b[i].x) ||
+        std::bit_cast<std::uint64_t>(a[i].y) != std::bit_cast<std::uint64_t>(b[i].y)) {
+      return false;
+    }
+  }
+  return true;
+}
+
+void copy_list(const TaggedPointList& from, TaggedPointList& to) {
+  to.Clear();
+  to.SetCapacity(from.count());
+  for (const TaggedPoint& p : from) to.Add(p);
+}
+
+}  // namespace
+
 std::int32_t SlopeDomain::compute(TaggedPointList& list, std::int32_t side) {
+  // Only the Voronoi engine computes purely from its input; a stand-in is
+  // asked every time.
+  if (&engine_ != &voronoi_offset_engine()) return compute_offsets(list, side);
+  const std::uint64_t bits = std::bit_cast<std::uint64_t>(offsetDistance);
+  const std::uint64_t arcBits = std::bit_cast<std::uint64_t>(arcTolerance);
+  RememberedOffset* slot = nullptr;
+  for (RememberedOffset& r : tl_remembered) {
+    if (r.distanceBits == bits && r.arcToleranceBits == arcBits && r.side == side) slot = &r;
+  }
+  if (slot && same_coordinates(list, slot->input)) {
+    copy_list(slot->output, list);
+    return 0;
+  }
+  if (!slot) {
+    slot = &tl_remembered[tl_nextSlot];
+    tl_nextSlot = (tl_nextSlot + 1) % kRememberedDistances;
+    slot->distanceBits = bits;
+    slot->arcToleranceBits = arcBits;
+    slot->side = side;
+  }
+  copy_list(list, slot->input);
+  const std::int32_t r = compute_offsets(list, side);
+  if (r == 0) {
+    copy_list(list, slot->output);
+  } else {
+    slot->side = -1;  // nothing remembered
+  }
+  return r;
+}
+
+std::int32_t SlopeDomain::compute_offsets(TaggedPointList& list, std::int32_t side) {
   out_ = &list;
   engine_.reset();
   FeedBox box;

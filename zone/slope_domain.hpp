@@ -63,7 +63,12 @@ class SlopeDomain : public VD_OffsetHandler {
   // 0: the list holds the offset curves (possibly none), or nothing could
   // be fed and the list is emptied; -1: the engine could not compute the
   // diagram or the offsets, the list unchanged.
+  // An input equal in its coordinates to one of the last few the thread
+  // offset at the same distance and side gets that result again without the
+  // engine (the Voronoi engine only: a stand-in is asked every time).
   std::int32_t compute(TaggedPointList& list, std::int32_t side);
+  // compute without looking at what was computed before.
+  std::int32_t compute_offsets(TaggedPointList& list, std::int32_t side);
 
   // Feeds every polyline of two or more points and of extent at least
   // kMinFeedExtent, thinned, widening `box` with the fed points; returns the

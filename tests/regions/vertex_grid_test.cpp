@@ -1,12 +1,12 @@
-// The vertex grid against a plain model of the 1/1000 grid it must agree
-// with: cells scanned column by column and row by row, each cell's bucket
-// (row * 1003 + column modulo a prime of at least 997) walked from its most
-// recent vertex, the first vertex within the tolerance taken. Dense and
-// ambiguous point sets (vertices between one and two tolerances apart, cell
-// borders) must give the same vertex, the same sharing, in the same order.
+// The vertex grid against brute force: a lookup gives an existing vertex
+// within the tolerance (in both coordinates) whenever there is one, and a new
+// vertex only when there is none; a vertex looked up by a second owner
+// becomes shared. Dense and ambiguous point sets: vertices between one and
+// two tolerances apart, cell borders.
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <map>
 #include <random>
 #include <vector>
 
@@ -14,53 +14,6 @@
 
 namespace zt::detail {
 namespace {
-
-class ModelGrid {
- public:
-  explicit ModelGrid(int pointCount) {
-    std::int64_t m = pointCount / 10;
-    if (m % 2 == 0) ++m;
-    for (;; m += 2) {
-      bool prime = true;
-      for (std::int64_t d = 3; d * d <= m; d += 2) prime = prime && m % d != 0;
-      if (prime) break;
-    }
-    buckets_.resize(m > 997 ? m : 997);
-  }
-
-  // Returns the vertex number and its owner after the lookup.
-  std::pair<int, int> lookup(double x, double y, int owner) {
-    const double e = kEngineEpsilon, o = -kGridCell;
-    for (std::int64_t c = cell(x - e, o); c <= cell(x + e, o); ++c) {
-      for (std::int64_t r = cell(y - e, o); r <= cell(y + e, o); ++r) {
-        const auto& chain = buckets_[bucket(r, c)];
-        for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
-          V& v = verts_[*it];
-          if (std::fabs(x - v.x) < e && std::fabs(y - v.y) < e) {
-            if (v.owner != owner) v.owner = kSharedOwner;
-            return {*it, v.owner};
-          }
-        }
-      }
-    }
-    verts_.push_back({x, y, owner});
-    buckets_[bucket(cell(y, o), cell(x, o))].push_back(int(verts_.size()) - 1);
-    return {int(verts_.size()) - 1, owner};
-  }
-
- private:
-  struct V {
-    double x, y;
-    int owner;
-  };
-  static std::int64_t cell(double v, double origin) { return grid_cell_index(v, origin, kGridCell); }
-  std::size_t bucket(std::int64_t r, std::int64_t c) const {
-    const std::int64_t n = static_cast<std::int64_t>(buckets_.size());
-    return static_cast<std::size_t>(((r * 1003 + c) % n + n) % n);
-  }
-  std::vector<std::vector<int>> buckets_;
-  std::vector<V> verts_;
-};
 
 struct GridHolder {
   VertexGrid g;
@@ -73,20 +26,37 @@ struct GridHolder {
 void compare_on(const std::vector<std::pair<double, double>>& pts, std::mt19937_64& rng) {
   GridHolder h;
   ASSERT_EQ(size_grid(h.g, static_cast<std::int32_t>(pts.size())), 0);
-  ModelGrid model(static_cast<int>(pts.size()));
-  std::uniform_int_distribution<int> ownerOf(0, 2);
+  std::multimap<double, int> byX;  // the vertices so far by x, with their serial
+  std::vector<std::pair<double, double>> at;
+  std::vector<int> ownerOf;
+  std::uniform_int_distribution<int> pick(0, 2);
   const int owners[] = {1, 2, kSharedOwner};
+  const double e = kEngineEpsilon;
   for (std::size_t i = 0; i < pts.size(); ++i) {
-    const int owner = owners[ownerOf(rng)];
-    const Vertex* v = grid_lookup(h.g, pts[i].first, pts[i].second, owner);
+    const auto [x, y] = pts[i];
+    const int owner = owners[pick(rng)];
+    bool near = false;
+    for (auto it = byX.lower_bound(x - e); it != byX.end() && it->first < x + e && !near; ++it)
+      near = std::fabs(x - it->first) < e && std::fabs(y - at[it->second].second) < e;
+    const Vertex* v = grid_lookup(h.g, x, y, owner);
     ASSERT_NE(v, nullptr);
-    const auto expected = model.lookup(pts[i].first, pts[i].second, owner);
-    ASSERT_EQ(v->serial, expected.first) << "point " << i;
-    ASSERT_EQ(v->owner, expected.second) << "point " << i;
+    if (!near) {
+      ASSERT_EQ(v->serial, static_cast<int>(at.size())) << "point " << i << ": no vertex near, a new one";
+      byX.insert({x, v->serial});
+      at.push_back({x, y});
+      ownerOf.push_back(owner);
+      ASSERT_EQ(v->owner, owner);
+      continue;
+    }
+    ASSERT_LT(v->serial, static_cast<int>(at.size())) << "point " << i << ": a vertex near, none new";
+    ASSERT_TRUE(std::fabs(x - at[v->serial].first) < e && std::fabs(y - at[v->serial].second) < e) << "point " << i;
+    int& o = ownerOf[v->serial];
+    if (o != owner) o = kSharedOwner;
+    ASSERT_EQ(v->owner, o) << "point " << i;
   }
 }
 
-TEST(VertexGrid, AgreesWithTheModelOnAmbiguousClusters) {
+TEST(VertexGrid, AgreesWithBruteForceOnAmbiguousClusters) {
   std::mt19937_64 rng(99);
   std::uniform_real_distribution<double> u(0, 1), j(-2.5, 2.5);
   for (int round = 0; round < 40; ++round) {
@@ -102,7 +72,7 @@ TEST(VertexGrid, AgreesWithTheModelOnAmbiguousClusters) {
   }
 }
 
-TEST(VertexGrid, AgreesWithTheModelOnDenseContours) {
+TEST(VertexGrid, AgreesWithBruteForceOnDenseContours) {
   std::mt19937_64 rng(5);
   std::vector<std::pair<double, double>> pts;
   for (int k = 0; k < 20000; ++k) {

@@ -74,7 +74,13 @@ TEST(Cleaning, CrossReferenceRedirectsEveryEndOfAPoint) {
   EXPECT_EQ(g.segments[2].i1, 3);
   EXPECT_EQ(g.segments[3].i2, 3);
   EXPECT_EQ(g.segments[0].i2, 3);
-  EXPECT_FALSE(g.xrefBuilt);  // stale after a redirection
+  // The list stays valid in place: redirecting the second point on to the
+  // first moves the ends that came from the fourth too.
+  EXPECT_TRUE(g.xrefBuilt);
+  RedirectSegmentEnds(3, 2);
+  EXPECT_EQ(g.segments[2].i1, 2);
+  EXPECT_EQ(g.segments[3].i2, 2);
+  EXPECT_EQ(g.segments[1].i1, 2);
 }
 
 TEST(Cleaning, SegmentLineDataHasTheUnitNormalToTheLeft) {
@@ -88,8 +94,12 @@ TEST(Cleaning, SegmentLineDataHasTheUnitNormalToTheLeft) {
   EXPECT_DOUBLE_EQ(s.b, 0.6);
   EXPECT_NEAR(s.a * 1 + s.b * 1 + s.c, 0.0, 1e-15);
   EXPECT_GT(s.a * 0 + s.b * 10 + s.c, 0.0);  // (0, 10) lies on the left
-  // A segment shorter than the zero length asks for a restart.
+  // A segment shorter than the zero length: its ends merge at once into
+  // their midpoint, the segment goes, and a restart drops the merged point.
   EXPECT_TRUE(g.restartPending);
+  EXPECT_EQ(g.segments.count, 1);
+  EXPECT_TRUE(g.points[5].deleted);
+  EXPECT_DOUBLE_EQ(g.points[4].y, 2 + 0.5e-12);
 }
 
 }  // namespace

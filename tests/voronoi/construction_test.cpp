@@ -52,19 +52,26 @@ TEST(PointDiagram, SmallRandomSets) {
 }
 
 TEST(PointDiagram, PairsJustAboveAndBelowTheMergeDistance) {
-  // Extent 1: internal units are user units. Pairs 2e-11 apart stay apart;
-  // pairs 5e-12 apart merge, one restart each at most.
-  std::vector<Pt> pts{{0, 0}, {1, 1}};
-  for (int i = 1; i < 20; ++i) {
-    const double x = i / 20.0, y = std::fmod(i * 0.37, 1.0);
-    pts.push_back({x, y});
-    pts.push_back({x + (i % 2 ? 2e-11 : 5e-12), y});
-  }
-  EXPECT_EQ(CheckedRun(pts), "");
-  EXPECT_GE(VD_GetRestartCount(), 1);
-  EXPECT_LE(VD_GetRestartCount(), 10);
-  EXPECT_EQ(VD_GetDuplicateCount(), 9);                   // the even i
-  EXPECT_EQ(vd::Vd().points.count, 2 + 2 + 19 + 10 + 2);  // slots, corners, points kept
+  // Extent 1: internal units are user units. Pairs 2e-11 apart stay apart
+  // without a restart; pairs 5e-12 apart merge. The restart that follows a
+  // merge mends every pair within the repair distance at once, so both
+  // kinds merge, in one restart.
+  const auto pairs = [](bool near, bool far) {
+    std::vector<Pt> pts{{0, 0}, {1, 1}};
+    for (int i = 1; i < 20; ++i) {
+      const double x = i / 20.0, y = std::fmod(i * 0.37, 1.0);
+      pts.push_back({x, y});
+      if (i % 2 ? far : near) pts.push_back({x + (i % 2 ? 2e-11 : 5e-12), y});
+    }
+    return pts;
+  };
+  EXPECT_EQ(CheckedRun(pairs(false, true)), "");
+  EXPECT_EQ(VD_GetRestartCount(), 0);
+  EXPECT_EQ(vd::Vd().points.count, 2 + 2 + 19 + 10 + 2);
+  EXPECT_EQ(CheckedRun(pairs(true, true)), "");
+  EXPECT_EQ(VD_GetRestartCount(), 1);
+  EXPECT_EQ(VD_GetDuplicateCount(), 19);
+  EXPECT_EQ(vd::Vd().points.count, 2 + 2 + 19 + 2);  // slots, corners, points kept
 }
 
 TEST(PointDiagram, RepeatedComputationIsReproducible) {
@@ -129,18 +136,28 @@ TEST(PointDiagram, CornerPointsFixTheMaximalOffset) {
   EXPECT_DOUBLE_EQ(g.points[1].y - 0.1, 2.01 / 2);
 }
 
-TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
-  // Every pair closer than the merge distance costs one restart.
+TEST(PointDiagram, ManyClosePairsMergeInOneRestart) {
   std::vector<Pt> pts{{0, 0}, {1, 1}};
   for (int i = 0; i < 600; ++i) {
     const double x = (i + 0.5) / 601.0, y = std::fmod(i * 0.618, 1.0);
     pts.push_back({x, y});
     pts.push_back({x + 1e-13, y});
   }
+  EXPECT_EQ(CheckedRun(pts), "");
+  EXPECT_EQ(VD_GetRestartCount(), 1);
+  EXPECT_EQ(VD_GetDuplicateCount(), 600);
+}
+
+TEST(PointDiagramDeathTest, TooManyRestartsIsFatal) {
+  // The guard against a repair that never ends: one restart beyond the limit.
   EXPECT_EXIT(
       {
-        Store(pts);
+        Store({{0, 0}, {1, 1}, {0.5, 0.25}});
         ComputePoints();
+        vd::Vd().restartPending = true;
+        vd::Vd().restartCount = vd::kMaxRestarts;
+        bool finished = false;
+        vd::ComputeVD(vd::ComputeArgs{}, finished);
       },
       testing::ExitedWithCode(2), "\nerror in ComputeVD\\(\\) - aborting computation -- too many restarts!");
 }

@@ -102,8 +102,6 @@ TEST_F(Assembly, OnlyTheDeepestLevelHasZonesAndIsCarriedUp) {
   const auto b = box_of(deepest);  // grown by 2.04, shrunk by 2
   EXPECT_NEAR(b[0], 39.96f, 1e-4);
   EXPECT_NEAR(b[2], 60.04f, 1e-4);
-  EXPECT_EQ(engine.calls.front(), "initialize");
-  EXPECT_EQ(engine.calls.back(), "terminate");
   ASSERT_EQ(write(), 0);  // top level first, every contour closed
   ASSERT_EQ(g_written.size(), 3u);
   EXPECT_EQ(g_written[0].z, 0.0f);

@@ -2,17 +2,13 @@
 // polygon files as one SVG picture.
 //
 // Each input gets one colour and a line in the legend. The contours are
-// grouped by level (z within kSvgLevelTolerance, as the program groups them),
+// grouped by level (z within kDrawingLevelTolerance, as the program groups them),
 // one panel per level from the top down, or only the panel of --level Z.
 // Every panel has the same scale, equal in x and y, and its z in its title.
 // The contours of one input on one level form one path filled with the
 // even-odd rule, so islands and holes show as holes.
-//
-// A record file is recognised by its first byte ("K"); its contours are
-// split at separator records and take the z of their first point. A text
-// file holds polylines in the common text form: points "x y z" belong to the
-// level z of the polyline's first point, points "x y" to no level and are
-// drawn in every panel.
+// Contours without a level (text points "x y") are drawn in every panel;
+// the inputs are read as drawing_input.hpp says.
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
@@ -24,15 +20,11 @@
 #include <vector>
 
 #include "commands.hpp"
-#include "driver/level_tables.hpp"
-#include "driver/record_fault.hpp"
-#include "driver/record_stream.hpp"
+#include "drawing_input.hpp"
 #include "text_io.hpp"
 
 namespace {
 
-// Contours whose z differ by no more than this share a panel.
-constexpr double kSvgLevelTolerance = 0.0001;
 // Drawing size of the widest extent of the drawing, in pixels.
 constexpr double kPanelWidth = 420;
 constexpr double kPanelMargin = 12;
@@ -42,108 +34,10 @@ constexpr int kMaxColumns = 4;
 const char* const kPalette[] = {"#1f77b4", "#ff7f0e", "#2ca02c", "#d62728",
                                 "#9467bd", "#8c564b", "#e377c2", "#7f7f7f"};
 
-struct Pt {
-  double x, y;
-};
-
-struct Contour {
-  bool hasZ = false;
-  double z = 0;
-  std::vector<Pt> points;
-};
-
-struct Input {
-  std::string name;
-  std::vector<Contour> contours;
-};
-
-bool read_record_input(const std::string& path, Input& input) {
-  zt::RecordReader reader;
-  if (!reader.open(path)) zt::record_stop(reader.fault());
-  std::uint8_t head[zt::kPointXyzBytes];
-  std::size_t length = 0;
-  Contour* open = nullptr;
-  for (;;) {
-    const zt::ReadStatus s = reader.read(head, length);
-    if (s == zt::ReadStatus::kEnd) break;
-    if (s == zt::ReadStatus::kFault) zt::record_stop(reader.fault());
-    const std::int64_t record = reader.next_record() - 1;
-    if (length < zt::kPointXyzBytes) {
-      zt::record_stop({zt::RecordFault::kShortRecord, path, record, std::to_string(length) + " bytes"});
-    }
-    float x = 0, y = 0, z = 0;
-    zt::decode_xyz(head, x, y, z);
-    if (!std::isfinite(x) || !std::isfinite(y) || !std::isfinite(z)) {
-      zt::record_stop({zt::RecordFault::kNonFinite, path, record, "x, y or z"});
-    }
-    if (x > zt::kDriverSeparatorX) {
-      open = nullptr;
-      continue;
-    }
-    if (open == nullptr) {
-      input.contours.push_back({true, z, {}});
-      open = &input.contours.back();
-    }
-    open->points.push_back({x, y});
-  }
-  return true;
-}
-
-bool read_text_input(const std::string& path, Input& input, std::string& error) {
-  std::ifstream in(path);
-  std::vector<zonetool::TextPolyline> lines;
-  if (!zonetool::read_polylines(in, lines, error)) {
-    error = path + ": " + error;
-    return false;
-  }
-  for (std::size_t k = 0; k < lines.size(); ++k) {
-    Contour c;
-    for (const zonetool::TextPoint& p : lines[k]) {
-      if (p.size() != 2 && p.size() != 3) {
-        error = path + ": polyline " + std::to_string(k + 1) + ": a point is not \"x y\" or \"x y z\"";
-        return false;
-      }
-      if (c.points.empty()) {
-        c.hasZ = p.size() == 3;
-        c.z = c.hasZ ? p[2] : 0;
-      }
-      c.points.push_back({p[0], p[1]});
-    }
-    input.contours.push_back(std::move(c));
-  }
-  return true;
-}
-
-bool read_input(const std::string& path, Input& input, std::string& error) {
-  input.name = path;
-  std::FILE* f = std::fopen(path.c_str(), "rb");
-  if (f == nullptr) {
-    error = "cannot open " + path;
-    return false;
-  }
-  const int first = std::fgetc(f);
-  std::fclose(f);
-  if (first == zt::kRecordFileMarker) return read_record_input(path, input);
-  return read_text_input(path, input, error);
-}
-
-// The levels of all inputs, from the top down, one per run of z values
-// within the tolerance of the run's highest z.
-std::vector<double> collect_levels(const std::vector<Input>& inputs) {
-  std::vector<double> zs;
-  for (const Input& in : inputs)
-    for (const Contour& c : in.contours)
-      if (c.hasZ) zs.push_back(c.z);
-  std::sort(zs.begin(), zs.end(), std::greater<>());
-  std::vector<double> levels;
-  for (double z : zs)
-    if (levels.empty() || levels.back() - z > kSvgLevelTolerance) levels.push_back(z);
-  return levels;
-}
-
-bool on_level(const Contour& c, double level) {
-  return !c.hasZ || std::fabs(c.z - level) <= kSvgLevelTolerance;
-}
+using zonetool::DrawingContour;
+using zonetool::DrawingInput;
+using zonetool::DrawingPoint;
+using zonetool::on_level;
 
 std::string escape_xml(const std::string& s) {
   std::string out;
@@ -169,7 +63,7 @@ struct Box {
   double x0 = std::numeric_limits<double>::infinity(), y0 = x0;
   double x1 = -std::numeric_limits<double>::infinity(), y1 = x1;
   bool empty() const { return !(x0 <= x1); }
-  void add(const Pt& p) {
+  void add(const DrawingPoint& p) {
     x0 = std::min(x0, p.x), y0 = std::min(y0, p.y);
     x1 = std::max(x1, p.x), y1 = std::max(y1, p.y);
   }
@@ -196,14 +90,14 @@ std::string panel_title(bool hasLevel, double z) {
   return "z = " + zonetool::format_number(z);
 }
 
-std::string draw(const std::vector<Input>& inputs, const std::vector<double>& panels, bool levelled) {
+std::string draw(const std::vector<DrawingInput>& inputs, const std::vector<double>& panels, bool levelled) {
   Box box;
-  for (const Input& in : inputs)
-    for (const Contour& c : in.contours) {
+  for (const DrawingInput& in : inputs)
+    for (const DrawingContour& c : in.contours) {
       bool shown = !levelled || !c.hasZ;
       for (double z : panels) shown = shown || on_level(c, z);
       if (shown)
-        for (const Pt& p : c.points) box.add(p);
+        for (const DrawingPoint& p : c.points) box.add(p);
     }
   const Frame frame(box);
   const std::size_t count = std::max<std::size_t>(panels.size(), 1);
@@ -238,7 +132,7 @@ std::string draw(const std::vector<Input>& inputs, const std::vector<double>& pa
            px(frame.height) + "\" fill=\"none\" stroke=\"#cccccc\"/>\n";
     for (std::size_t i = 0; i < inputs.size(); ++i) {
       std::string d;
-      for (const Contour& c : inputs[i].contours) {
+      for (const DrawingContour& c : inputs[i].contours) {
         if (c.points.empty() || (hasLevel && !on_level(c, z))) continue;
         for (std::size_t k = 0; k < c.points.size(); ++k) {
           d += k == 0 ? "M" : "L";
@@ -283,16 +177,16 @@ int zonetool::cmd_svg(int argc, char** argv) {
   }
   if (paths.empty() || out.empty()) return fail("usage: zonetool svg IN... -o OUT.svg [--level Z]");
 
-  std::vector<Input> inputs(paths.size());
+  std::vector<DrawingInput> inputs(paths.size());
   std::string error;
   for (std::size_t i = 0; i < paths.size(); ++i)
-    if (!read_input(paths[i], inputs[i], error)) return fail(error);
+    if (!zonetool::read_drawing_input(paths[i], inputs[i], error)) return fail(error);
 
-  std::vector<double> panels = collect_levels(inputs);
+  std::vector<double> panels = zonetool::collect_levels(inputs);
   const bool levelled = !panels.empty();
   if (oneLevel) {
     const auto it = std::find_if(panels.begin(), panels.end(),
-                                 [&](double z) { return std::fabs(z - wanted) <= kSvgLevelTolerance; });
+                                 [&](double z) { return std::fabs(z - wanted) <= zonetool::kDrawingLevelTolerance; });
     if (it == panels.end()) return fail("no level at z " + zonetool::format_number(wanted));
     panels = {*it};
   }

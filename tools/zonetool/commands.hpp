@@ -11,6 +11,7 @@ int cmd_boolean(int argc, char** argv);
 int cmd_voronoi(int argc, char** argv);
 int cmd_offset(int argc, char** argv);
 int cmd_svg(int argc, char** argv);
+int cmd_dxf(int argc, char** argv);
 
 // Prints "zonetool NAME: MESSAGE" on standard error; returns 2 (usage error).
 int usage_error(const char* name, const char* message);

@@ -22,6 +22,7 @@ const Command kCommands[] = {
     {"voronoi", zonetool::cmd_voronoi, "voronoi FILE             Voronoi diagram of points and segments"},
     {"offset", zonetool::cmd_offset, "offset FILE --distance T --side 1|2|3 [--raw]   offset curves of contours"},
     {"svg", zonetool::cmd_svg, "svg IN... -o OUT.svg [--level Z]   draw record and text files"},
+    {"dxf", zonetool::cmd_dxf, "dxf IN... -o OUT.dxf     record and text files as a DXF drawing"},
 };
 
 int usage() {

@@ -10,6 +10,7 @@
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/fatal.hpp"
 #include "voronoi/detail/initial_diagram.hpp"
+#include "voronoi/detail/input_sweep.hpp"
 #include "voronoi/detail/insertion_order.hpp"
 #include "voronoi/detail/nearest_search.hpp"
 #include "voronoi/detail/point_insertion.hpp"
@@ -82,6 +83,7 @@ bool SegmentPhase() {
     // Segments reach the test hook as -1 - index.
     if (g.insertionObserver) g.insertionObserver(g.insertionObserverContext, -1 - s);
   }
+  ReleaseCrossReference();  // built on demand by the start-node search
   g.segmentsDone = true;
   return true;
 }
@@ -170,6 +172,12 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
     // 7. Cleaning.
     const bool firstCall = !g.dummiesAdded;
     if (firstCall) AddDummySlots();
+    if (restarting) {
+      // A repair asked for this restart: mend every other defect of the
+      // input too before building again, not one per restart.
+      RepairWholeInput();
+      g.restartPending = false;
+    }
     if (restarting || args.clean) CleanInput(args.clean);
     // 8. Segment line data.
     if (g.segments.count > 0) ComputeSegmentLineData();
@@ -211,6 +219,17 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
   // to date (not after a forced fallback, whose diagram is only as good as
   // the fallback could make it).
   assert(g.recoveryMode || CheckDiagram(CheckOptions{false, false, true}).empty());
+  // A fallback builds what it can; its diagram counts as computed only when
+  // it passes the checker's local tests (topology, every node equidistant
+  // from its sites, no site across an edge inside a node's circle, every
+  // point with a region). Otherwise the computation ends without a diagram
+  // rather than report a wrong one.
+  if (g.recoveryMode && !CheckDiagram(CheckOptions{true, false, true}).empty()) {
+    g.upToDate = false;
+    g.computing = false;
+    finished = true;
+    return;
+  }
   g.upToDate = true;
   g.computing = false;
   finished = true;

@@ -1,8 +1,9 @@
-// The one process-wide instance of the Voronoi engine.
+// The Voronoi engine's state, one instance per thread.
 //
-// The engine has no handle: every operation works on the state returned by
-// Vd(). The state is created on first use and never destroyed; VD_Reset
-// empties it keeping memory, VD_Terminate frees the arrays.
+// The engine has no handle: every operation works on the calling thread's
+// state, returned by Vd(). The state is created on the thread's first use and
+// never destroyed; VD_Reset empties it keeping memory, VD_Terminate frees the
+// arrays.
 //
 // Coordinates of sites are user coordinates until a computation applies the
 // scaling transform in place; nodes are always in internal coordinates.
@@ -12,6 +13,7 @@
 #include <cstdint>
 #include <random>
 
+#include "core/per_thread.hpp"
 #include "voronoi/detail/records.hpp"
 #include "voronoi/detail/storage.hpp"
 
@@ -148,6 +150,10 @@ struct Engine {
   // entry 2*segment + (0 for i1, 1 for i2)).
   RecordArray<std::int32_t> xrefStart;
   RecordArray<std::int32_t> xrefEnds;
+  // Points whose ends were redirected to a point, as a chain from it:
+  // xrefMerged[i] is the next point merged into i's chain (kNone ends it).
+  // Redirecting keeps the list valid in place.
+  RecordArray<std::int32_t> xrefMerged;
   bool xrefBuilt = false;
 
   // Scratch lists of one insertion.
@@ -179,11 +185,10 @@ struct Engine {
   void* insertionObserverContext = nullptr;
 };
 
-// Created on first use, never destroyed.
-inline Engine& Vd() {
-  static Engine* const engine = new Engine;
-  return *engine;
-}
+// The calling thread's engine: created on the thread's first use, never
+// destroyed (see core/per_thread.hpp). Threads compute diagrams at once, each
+// in its own engine.
+inline Engine& Vd() { return PerThread<Engine>::mine(); }
 
 // Internal <-> user coordinates of the current transform.
 inline double ToUserX(double x) { return x / Vd().scale + Vd().shiftX; }

@@ -67,13 +67,17 @@ std::int32_t AppendRepairPoint(double x, double y) {
   return index;
 }
 
+bool RepairSuspectPair() {
+  Engine& g = Vd();
+  if (!g.suspect.set) return false;
+  const SuspectPair s = g.suspect;
+  g.suspect.set = false;
+  return TestPair(s);
+}
+
 bool RepairInput(std::int32_t site, std::int32_t kind, bool checkAllAllowed) {
   Engine& g = Vd();
-  if (g.suspect.set) {
-    const SuspectPair s = g.suspect;
-    g.suspect.set = false;
-    if (TestPair(s)) return true;
-  }
+  if (RepairSuspectPair()) return true;
   if (kind == PNT) {
     const std::int32_t end = g.dummiesAdded ? g.points.count - 2 : g.points.count;
     for (std::int32_t q = 2; q < end; ++q) {

@@ -16,6 +16,10 @@ inline constexpr double kRepairPointDistance = 1e-6;
 // True when the input was changed (a restart is then pending).
 bool RepairInput(std::int32_t site, std::int32_t kind, bool checkAllAllowed);
 
+// Tests the suspect pair a failing computation recorded, if any, and
+// clears it. True when the input was changed.
+bool RepairSuspectPair();
+
 // Appends a point made by a repair (tag -1) and returns its index. The
 // corner points stay in the last two slots.
 std::int32_t AppendRepairPoint(double x, double y);

@@ -80,7 +80,7 @@ void ParabolaData(const EdgeRecord& r, OffsetEdgeData& d) {
   const Engine& g = Vd();
   std::int32_t seg = r.lft, pnt = r.rgt;
   if (r.ltype != SEG) {
-    static std::int32_t reportedGeneration = -1;
+    thread_local std::int32_t reportedGeneration = -1;
     if (reportedGeneration != g.generation) {
       reportedGeneration = g.generation;
       std::fputs("CreateParabolaData(): in else branch!\n", stderr);

@@ -14,7 +14,10 @@ void PrepareDiagramForOffsets();
 
 // Per-edge arrays sized to the diagram (data marked needs-computing on a new
 // generation) and the work list for one side (left or right) or both (both
-// false). Leaves every candidate flag from edge 4 on at 1, those of the
+// false). For one side, each face of the input segments is listed whole or
+// not at all: it lies on the side on which its one-sided segments, by
+// length, see it; a segment with the face on both of its sides counts for
+// both, and a face with no other segment is listed for either side. Leaves every candidate flag from edge 4 on at 1, those of the
 // four outer edges at 0.
 void InitializeEdgeData(bool left, bool right);
 

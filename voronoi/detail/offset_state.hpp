@@ -8,6 +8,7 @@
 
 #include <cstdint>
 
+#include "core/per_thread.hpp"
 #include "voronoi/detail/storage.hpp"
 
 namespace zt::vd {
@@ -48,6 +49,11 @@ struct OffsetState {
   RecordArray<OffsetEdgeData> data;
   RecordArray<std::int32_t> workList;
   RecordArray<TraversalEntry> stack;
+  // Side classification of one part of the diagram: its edges, the segments
+  // it borders and, per segment, the sides it lies on (kSideLeft|kSideRight).
+  RecordArray<std::int32_t> component;
+  RecordArray<std::int32_t> bordered;
+  RecordArray<std::uint8_t> segmentSides;
   double distance = 0.0;  // internal units
   double step = 0.0;
   bool finished = true;
@@ -59,11 +65,8 @@ struct OffsetState {
   std::int32_t dataGeneration = -1;      // generation of the per-edge data
 };
 
-// Created on first use, never destroyed.
-inline OffsetState& Offs() {
-  static OffsetState* const state = new OffsetState;
-  return *state;
-}
+// The calling thread's offset state, beside its engine (see Vd()).
+inline OffsetState& Offs() { return PerThread<OffsetState>::mine(); }
 
 // Empties the lists (memory kept) and forgets the prepared generation.
 void ResetOffsetState();

@@ -125,7 +125,7 @@ struct Frame {
   std::int32_t next;     // next edge to look at
   std::int32_t stop;     // edge at which the rotation ends
 };
-RecordArray<Frame> gFrames;  // reused by every insertion
+thread_local ThreadScratch<Frame> gFrames;  // reused by every insertion
 
 void GrowTree(std::int32_t seed, const PointRecord& pt, RecordArray<Leaving>& leaving,
               RecordArray<std::int32_t>& treeEdges, PointLookahead& ahead) {
@@ -162,12 +162,12 @@ void GrowTree(std::int32_t seed, const PointRecord& pt, RecordArray<Leaving>& le
   }
 }
 
-RecordArray<Leaving> gLeaving;
-RecordArray<std::int32_t> gTreeEdges;
+thread_local ThreadScratch<Leaving> gLeaving;
+thread_local ThreadScratch<std::int32_t> gTreeEdges;
 struct Cut {
   double x, y, r2;
 };
-RecordArray<Cut> gCuts;
+thread_local ThreadScratch<Cut> gCuts;
 
 }  // namespace
 

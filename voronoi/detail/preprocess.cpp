@@ -126,6 +126,10 @@ void BuildCrossReference() {
     g.xrefEnds[fill[g.segments[s].i1]++] = 2 * s;
     g.xrefEnds[fill[g.segments[s].i2]++] = 2 * s + 1;
   }
+  g.xrefMerged.count = 0;
+  g.xrefMerged.Reserve(std::max<std::int64_t>(n, 1));
+  g.xrefMerged.count = n;
+  std::fill(g.xrefMerged.data, g.xrefMerged.data + n, kNone);
   g.xrefBuilt = true;
 }
 
@@ -133,21 +137,37 @@ void ReleaseCrossReference() {
   Engine& g = Vd();
   g.xrefStart.count = 0;
   g.xrefEnds.count = 0;
+  g.xrefMerged.count = 0;
   g.xrefBuilt = false;
 }
 
 void RedirectSegmentEnds(std::int32_t from, std::int32_t to) {
   Engine& g = Vd();
   assert(g.xrefBuilt);
-  if (from + 1 >= g.xrefStart.count) return;
-  for (std::int32_t k = g.xrefStart[from]; k < g.xrefStart[from + 1]; ++k) {
-    const std::int32_t end = g.xrefEnds[k];
-    SegmentRecord& s = g.segments[end / 2];
-    (end % 2 == 0 ? s.i1 : s.i2) = to;
+  if (from == to) return;
+  const std::int32_t built = g.xrefMerged.count;
+  if (from < 0 || from >= built || to < 0 || to >= built) {
+    // A point appended after the list was built: its ends are not listed.
+    // Only a repair appends points, and a repair ends the pass, so this is
+    // a stale list: drop it (the next use rebuilds it).
+    ReleaseCrossReference();
+    BuildCrossReference();
+    if (from >= g.xrefMerged.count || to >= g.xrefMerged.count) return;
   }
-  // The ends now belong to `to`; the cross-reference of `from` is stale and
-  // is rebuilt before any further use.
-  g.xrefBuilt = false;
+  // The ends listed under `from` and under every point merged into it
+  // before move to `to`; `from`'s chain then joins `to`'s. The cost is the
+  // size of `from`'s chain, not of the whole list.
+  std::int32_t last = from;
+  for (std::int32_t q = from; q != kNone; q = g.xrefMerged[q]) {
+    for (std::int32_t k = g.xrefStart[q]; k < g.xrefStart[q + 1]; ++k) {
+      const std::int32_t end = g.xrefEnds[k];
+      SegmentRecord& s = g.segments[end / 2];
+      (end % 2 == 0 ? s.i1 : s.i2) = to;
+    }
+    last = q;
+  }
+  g.xrefMerged[last] = g.xrefMerged[to];
+  g.xrefMerged[to] = from;
 }
 
 void CleanInput(bool sortSegments) {
@@ -226,29 +246,106 @@ void CleanInput(bool sortSegments) {
   ReleaseCrossReference();
 }
 
+namespace {
+
+// Rounds of merging the ends of zero-length segments: a merge moves points
+// by less than kZeroLength, which may make a neighbouring segment that
+// short in turn.
+constexpr int kShortSegmentRounds = 8;
+
+std::int32_t Root(std::vector<std::int32_t>& parent, std::int32_t i) {
+  while (parent[i] != i) i = parent[i] = parent[parent[i]];
+  return i;
+}
+
+// Merges the two ends of every segment no longer than kZeroLength, all in
+// one pass: each group of ends joined by such segments goes to the mean of
+// its points (the midpoint for a pair), kept at its lowest index; the other
+// points are marked deleted and every segment end is redirected to the kept
+// point. Segments left with one point for both ends are removed. True when
+// anything changed.
+bool MergeShortSegments() {
+  Engine& g = Vd();
+  std::vector<std::int32_t> parent;
+  bool changed = false;
+  for (int round = 0; round < kShortSegmentRounds; ++round) {
+    bool found = false;
+    for (std::int32_t s = 0; s < g.segments.count; ++s) {
+      const SegmentRecord& r = g.segments[s];
+      if (r.i1 == r.i2) continue;
+      const PointRecord& p1 = g.points[r.i1];
+      const PointRecord& p2 = g.points[r.i2];
+      if (std::hypot(p2.x - p1.x, p2.y - p1.y) > kZeroLength) continue;
+      if (!found) {
+        parent.resize(g.points.count);
+        std::iota(parent.begin(), parent.end(), 0);
+        found = true;
+      }
+      const std::int32_t a = Root(parent, r.i1), b = Root(parent, r.i2);
+      if (a != b) parent[std::max(a, b)] = std::min(a, b);
+    }
+    if (!found) break;
+    changed = true;
+    // Sums of the groups, then every member at its group's mean.
+    std::vector<double> sx(g.points.count, 0.0), sy(g.points.count, 0.0), cnt(g.points.count, 0.0);
+    for (std::int32_t i = 0; i < g.points.count; ++i) {
+      const std::int32_t root = Root(parent, i);
+      sx[root] += g.points[i].x;
+      sy[root] += g.points[i].y;
+      cnt[root] += 1.0;
+    }
+    for (std::int32_t i = 0; i < g.points.count; ++i) {
+      const std::int32_t root = Root(parent, i);
+      if (cnt[root] < 2.0) continue;
+      g.points[i].x = sx[root] / cnt[root];
+      g.points[i].y = sy[root] / cnt[root];
+      if (root != i) g.points[i].deleted = 1;
+    }
+    for (std::int32_t s = 0; s < g.segments.count; ++s) {
+      g.segments[s].i1 = Root(parent, g.segments[s].i1);
+      g.segments[s].i2 = Root(parent, g.segments[s].i2);
+    }
+    for (std::int32_t a = 0; a < g.arcs.count; ++a) {
+      g.arcs[a].i1 = Root(parent, g.arcs[a].i1);
+      g.arcs[a].i2 = Root(parent, g.arcs[a].i2);
+    }
+  }
+  if (!changed) return false;
+  for (std::int32_t s = 0; s < g.segments.count;) {
+    if (g.segments[s].i1 == g.segments[s].i2) {
+      g.segments[s] = g.segments[--g.segments.count];
+      ++g.removedSegments;
+    } else {
+      ++s;
+    }
+  }
+  // The cross-reference, if any, lists ends that have moved.
+  ReleaseCrossReference();
+  g.lineDataInexact = true;
+  g.dataModified = true;
+  return true;
+}
+
+}  // namespace
+
 void ComputeSegmentLineData() {
   Engine& g = Vd();
+  // Zero-length segments: their ends merge here, all at once, and the
+  // computation restarts with the cleaned input (the restart's cleaning
+  // drops the merged points). Asking the restart to build a cross-reference
+  // first, as the engine once did, could loop: the cleaning releases it
+  // again before it is used.
+  if (MergeShortSegments()) g.restartPending = true;
   for (std::int32_t s = 0; s < g.segments.count; ++s) {
     SegmentRecord& r = g.segments[s];
-    PointRecord& p1 = g.points[r.i1];
-    PointRecord& p2 = g.points[r.i2];
+    const PointRecord& p1 = g.points[r.i1];
+    const PointRecord& p2 = g.points[r.i2];
     const double dx = p2.x - p1.x, dy = p2.y - p1.y;
     const double len = std::sqrt(dx * dx + dy * dy);
     if (len <= kZeroLength) {
-      if (p1.x == p2.x && p1.y == p2.y) {
-        g.restartPending = true;  // the restart's cleaning merges the points
-      } else if (!g.xrefBuilt) {
-        g.restartPending = true;  // the restart's cleaning builds the list
-      } else {
-        const double mx = 0.5 * (p1.x + p2.x), my = 0.5 * (p1.y + p2.y);
-        p1.x = p2.x = mx;
-        p1.y = p2.y = my;
-        const std::int32_t lo = std::min(r.i1, r.i2), hi = std::max(r.i1, r.i2);
-        RedirectSegmentEnds(hi, lo);
-        g.points[hi].deleted = 1;
-        g.dataModified = true;
-        g.restartPending = true;
-      }
+      // Only two copies of one point are left this short; the restart's
+      // cleaning merges them and drops the segment.
+      g.restartPending = true;
       continue;
     }
     r.a = -dy / len;

@@ -6,6 +6,8 @@
 
 #include <cstdint>
 
+#include "voronoi/detail/engine_state.hpp"
+
 namespace zt::vd {
 
 // Bounds of the internal frame the scaling aims at.
@@ -33,6 +35,16 @@ void BuildCrossReference();
 void ReleaseCrossReference();
 // Points every segment end at `from` to `to` (needs the cross-reference).
 void RedirectSegmentEnds(std::int32_t from, std::int32_t to);
+
+// Calls f(segment) for every segment with an end at point p, through the
+// cross-reference (which must be built and cover p).
+template <class F>
+void ForEachSegmentAt(std::int32_t p, F&& f) {
+  Engine& g = Vd();
+  if (p < 0 || p >= g.xrefMerged.count) return;
+  for (std::int32_t q = p; q != kNone; q = g.xrefMerged[q])
+    for (std::int32_t k = g.xrefStart[q]; k < g.xrefStart[q + 1]; ++k) f(g.xrefEnds[k] / 2);
+}
 
 // Index of the first and one past the last caller point once the dummies
 // are in place.

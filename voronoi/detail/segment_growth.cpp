@@ -12,7 +12,7 @@
 namespace zt::vd {
 namespace {
 
-RecordArray<std::int32_t> gSegmentsBeside;  // segment sites beside the tree
+thread_local ThreadScratch<std::int32_t> gSegmentsBeside;  // segment sites beside the tree
 
 void RecordSite(std::int32_t site, std::int32_t kind) {
   Engine& g = Vd();

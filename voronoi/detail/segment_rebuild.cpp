@@ -13,6 +13,7 @@
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/node_on_edge.hpp"
 #include "voronoi/detail/segment_insertion.hpp"
+#include "voronoi/detail/segment_repair.hpp"
 
 namespace zt::vd {
 namespace {
@@ -26,9 +27,9 @@ struct BoundaryEntry {
   std::int32_t onPoint;
 };
 
-RecordArray<BoundaryEntry> gBoundary;
-RecordArray<std::int32_t> gTreeEdges;
-RecordArray<std::int32_t> gNewEdges;
+thread_local ThreadScratch<BoundaryEntry> gBoundary;
+thread_local ThreadScratch<std::int32_t> gTreeEdges;
+thread_local ThreadScratch<std::int32_t> gNewEdges;
 
 bool InTree(std::int32_t n) { return Vd().nodes[n].status == DELETED; }
 
@@ -57,9 +58,45 @@ bool Tour(const SegmentInsertion& si) {
   return false;
 }
 
+// The repair that a copied node asks for, limited to the sites beside the
+// segment's new region (the sites across the boundary edges, and the end
+// points of the segments among them): a point on the segment, an end point
+// near another point, a crossing or repeated segment all border the region.
+// Scanning every site instead costs a pass over the whole input per copied
+// node. True when the input was changed.
+bool RepairBesideRegion(const SegmentInsertion& si) {
+  Engine& g = Vd();
+  if (RepairSuspectPair()) return true;
+  const auto pointNear = [&](std::int32_t p) {
+    if (RepairSegmentPoint(si.s, p)) return true;
+    const PointRecord& q = g.points[p];
+    if (q.deleted) return false;
+    for (const std::int32_t e : {si.i1, si.i2}) {
+      const PointRecord& r = g.points[e];
+      if (p != e && !r.deleted && std::hypot(q.x - r.x, q.y - r.y) <= kRepairPointDistance) {
+        MergePointsToMidpoint(e, p);
+        return true;
+      }
+    }
+    return false;
+  };
+  for (std::int32_t k = 0; k < gBoundary.count; ++k) {
+    const BoundaryEntry& b = gBoundary[k];
+    if (b.site < 0) continue;
+    if (b.kind == PNT && pointNear(b.site)) return true;
+    if (b.kind == SEG) {
+      if (RepairSegmentSegment(si.s, b.site)) return true;
+      const SegmentRecord t = g.segments[b.site];
+      if (pointNear(t.i1) || pointNear(t.i2)) return true;
+    }
+  }
+  return false;
+}
+
 // The new node on every boundary edge. False with a restart pending.
 bool ComputeNewNodes(const SegmentInsertion& si) {
   Engine& g = Vd();
+  bool repairTried = false;  // one local repair per insertion is enough
   for (std::int32_t k = 0; k < gBoundary.count; ++k) {
     BoundaryEntry& b = gBoundary[k];
     bool copied = false;
@@ -73,7 +110,10 @@ bool ComputeNewNodes(const SegmentInsertion& si) {
       b.onPoint = kNone;
       g.recoveryMode = true;
     } else if (copied) {
-      if (RepairInput(si.s, SEG, false)) return false;
+      // The sites beside the region do not change between the copies of one
+      // insertion: they are scanned once, a new suspect pair every time.
+      if (repairTried ? RepairSuspectPair() : RepairBesideRegion(si)) return false;
+      repairTried = true;
     }
   }
   return true;

@@ -5,6 +5,7 @@
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_on_edge.hpp"
+#include "voronoi/detail/preprocess.hpp"
 #include "voronoi/detail/segment_insertion.hpp"
 
 namespace zt::vd {
@@ -56,6 +57,32 @@ Candidate SearchRegion(const SegmentInsertion& si, std::int32_t p, std::int32_t 
   } while (e >= 0 && e != e0 && ++guard < g.edges.count + 4);
   if (bestShared.node >= 0 && bestShared.value < 0.0) return bestShared;
   return best;
+}
+
+// Where segments meet at p leaving it no angle wider than a half turn on
+// the new segment's side, p's region does not reach that side: the new
+// segment starts in the regions of the segments at p. The node most in
+// conflict among those regions is a node of the deleted tree (the tree is
+// connected and does not pass through p). kNone if none conflicts.
+std::int32_t SearchRegionsOfSegmentsAt(const SegmentInsertion& si, std::int32_t p) {
+  Engine& g = Vd();
+  if (!g.xrefBuilt) BuildCrossReference();
+  Candidate best;
+  ForEachSegmentAt(p, [&](std::int32_t t) {
+    if (t == si.s || g.segments[t].vd < 0) return;
+    const std::int32_t e0 = g.segments[t].vd;
+    std::int32_t e = e0;
+    std::int64_t guard = 0;
+    do {
+      const std::int32_t n = RegionExitNode(e, t, SEG);
+      if (n >= 0 && !IsFarNode(n) && g.nodes[n].site < 0 && g.nodes[n].r > kZeroRadius) {
+        const double v = ConflictValue(si, n, kStartTolFirst);
+        if (best.node < 0 || v < best.value) best = {n, v};
+      }
+      e = NextRegionEdge(e, t, SEG);
+    } while (e >= 0 && e != e0 && ++guard < g.edges.count + 4);
+  });
+  return best.node >= 0 && best.value < 0.0 ? best.node : kNone;
 }
 
 // Where the segment leaves p's region: a node made on the region's edge
@@ -113,6 +140,8 @@ std::int32_t StartAt(SegmentInsertion& si, std::int32_t p, std::int32_t other) {
     if (c.node >= 0 && c.value < 0.0) return c.node;
   }
   if (RepairInput(si.s, SEG, false)) return kNone;
+  const std::int32_t beside = SearchRegionsOfSegmentsAt(si, p);
+  if (beside >= 0) return beside;
   const std::int32_t made = MakeStartAtExit(si, p);
   if (made >= 0) return made;
   // Fallback: the end node of the region pointer's edge with the smaller

@@ -10,8 +10,8 @@
 namespace zt::vd {
 namespace {
 
-RecordArray<std::int32_t> gCycle;  // edges of the cycle found
-RecordArray<std::int32_t> gPath;   // scratch for the tree paths
+thread_local ThreadScratch<std::int32_t> gCycle;  // edges of the cycle found
+thread_local ThreadScratch<std::int32_t> gPath;   // scratch for the tree paths
 
 std::int32_t ParentNode(std::int32_t n) {
   const Engine& g = Vd();

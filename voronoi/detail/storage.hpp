@@ -68,4 +68,11 @@ struct RecordArray {
   }
 };
 
+// A scratch array of one thread (declared thread_local): its storage is
+// freed when the thread ends.
+template <typename T>
+struct ThreadScratch : RecordArray<T> {
+  ~ThreadScratch() { this->Free(); }
+};
+
 }  // namespace zt::vd

@@ -1,11 +1,11 @@
-// The process-wide Voronoi engine behind OffsetEngine, and the stand-in
+// The calling thread's Voronoi engine behind OffsetEngine, and the stand-in
 // switch for tests.
 #include "voronoi/engine.hpp"
 #include "zone/offset_engine.hpp"
 
 namespace zt {
 
-bool engineReady = false;
+thread_local bool engineReady = false;
 
 namespace {
 
@@ -61,6 +61,8 @@ OffsetEngine* g_standIn = nullptr;
 }  // namespace
 
 OffsetEngine& offset_engine() { return g_standIn ? *g_standIn : g_voronoi; }
+
+OffsetEngine& voronoi_offset_engine() { return g_voronoi; }
 
 OffsetEngine* set_offset_engine(OffsetEngine* engine) {
   OffsetEngine* previous = g_standIn;

@@ -1,0 +1,332 @@
+// Diagrams of dirty input: segments meeting at one point, near-duplicate
+// points, crossing segments, crossings that leave tiny segments, jittered
+// integer grids. Every case runs in a child process, so that a fatal end of
+// the engine (status 2) is counted as such; a computed diagram must pass the
+// brute-force checker (every node against every site, corner points
+// included; every input point with a region). A computation that refuses
+// (returns false) is not a wrong diagram, but the named cases expect none.
+//
+// The named cases are the rows of data/dirty_input.txt. The randomised
+// campaign runs ZT_DIRTY_CASES inputs per family (default 20; the full
+// campaign is 1000, see README).
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "support/case_rows.hpp"
+#include "vd_test_util.hpp"
+
+namespace zt::test {
+namespace {
+
+struct Sites {
+  std::vector<Pt> pts;
+  std::vector<std::pair<int, int>> segs;  // order numbers in pts
+  int Add(double x, double y) {
+    pts.push_back({x, y});
+    return static_cast<int>(pts.size()) - 1;
+  }
+  // A closed contour as the zone builder stores it: its points, the first
+  // once more at the end, a segment between consecutive ones.
+  void Contour(const std::vector<Pt>& c, bool closingDuplicate = true) {
+    const int first = static_cast<int>(pts.size());
+    for (const Pt& p : c) Add(p.x, p.y);
+    const int n = static_cast<int>(c.size());
+    if (closingDuplicate) Add(c[0].x, c[0].y);
+    for (int i = 0; i < n; ++i) segs.push_back({first + i, closingDuplicate || i + 1 < n ? first + i + 1 : first});
+  }
+};
+
+using Rng = std::mt19937;
+double U(Rng& r, double a, double b) { return std::uniform_real_distribution<double>(a, b)(r); }
+int I(Rng& r, int a, int b) { return std::uniform_int_distribution<int>(a, b)(r); }
+
+// Free segments from one point; odd seeds give each its own copy of it.
+Sites Fan(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  const int k = I(r, 2, 12);
+  const Pt c{U(r, 0.4, 0.6), U(r, 0.4, 0.6)};
+  int centre = s.Add(c.x, c.y);
+  for (int i = 0; i < k; ++i) {
+    const double a = U(r, 0, 2 * M_PI), d = U(r, 0.05, 0.45);
+    if (seed % 2 && i > 0) centre = s.Add(c.x, c.y);
+    s.segs.push_back({centre, s.Add(c.x + d * std::cos(a), c.y + d * std::sin(a))});
+  }
+  return s;
+}
+
+// Closed contours (triangles and quadrilaterals, mostly counter-clockwise)
+// in disjoint wedges about one shared vertex.
+Sites Shared(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  const int m = I(r, 2, 6);
+  const Pt c{U(r, 0.4, 0.6), U(r, 0.4, 0.6)};
+  const double a0 = U(r, 0, 2 * M_PI), w = 2 * M_PI / m;
+  for (int i = 0; i < m; ++i) {
+    const int corners = I(r, 2, 3);
+    std::vector<double> ang;
+    for (int j = 0; j < corners; ++j) ang.push_back(a0 + w * (i + U(r, 0.05, 0.95)));
+    std::sort(ang.begin(), ang.end());
+    std::vector<Pt> poly{c};
+    for (double a : ang) {
+      const double d = U(r, 0.1, 0.45);
+      poly.push_back({c.x + d * std::cos(a), c.y + d * std::sin(a)});
+    }
+    if (I(r, 0, 3) == 0) std::reverse(poly.begin() + 1, poly.end());
+    s.Contour(poly, seed % 2 == 0);
+  }
+  return s;
+}
+
+// Points and partners 1e-12 to 1e-6 away; odd seeds join the first points
+// into a star-shaped polygon.
+Sites NearDuplicates(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  const int n = I(r, 10, 500);
+  std::vector<Pt> base;
+  for (int i = 0; i < n; ++i) base.push_back({U(r, 0, 1), U(r, 0, 1)});
+  if (seed % 2) {
+    const int k = std::min(n, 40);
+    std::vector<Pt> poly(base.begin(), base.begin() + k);
+    std::sort(poly.begin(), poly.end(), [](Pt p, Pt q) {
+      return std::atan2(p.y - 0.5, p.x - 0.5) < std::atan2(q.y - 0.5, q.x - 0.5);
+    });
+    s.Contour(poly);
+    base.erase(base.begin(), base.begin() + k);
+    for (const Pt& p : poly) base.push_back(p);
+  }
+  for (const Pt& p : base) {
+    if (!s.pts.empty() && I(r, 0, 1) == 0) continue;
+    if (I(r, 0, 3) != 0) s.Add(p.x, p.y);
+    const double d = std::pow(10.0, U(r, -12, -6)), a = U(r, 0, 2 * M_PI);
+    s.Add(p.x + d * std::cos(a), p.y + d * std::sin(a));
+  }
+  return s;
+}
+
+// 10 to 1000 random segments, their lengths about the mean spacing.
+Sites Crossing(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  const int n = static_cast<int>(std::lround(10 * std::pow(100.0, U(r, 0, 1))));
+  const double scale = 1.0 / std::sqrt(n);
+  for (int i = 0; i < n; ++i) {
+    const Pt p{U(r, 0, 1), U(r, 0, 1)};
+    const double a = U(r, 0, 2 * M_PI), d = U(r, 0.3, 1.5) * scale;
+    s.segs.push_back({s.Add(p.x, p.y), s.Add(p.x + d * std::cos(a), p.y + d * std::sin(a))});
+  }
+  return s;
+}
+
+// A square and triangles whose vertex pokes 1e-13 to 5e-12 past one of its
+// edges: the crossings lie within 1e-11 of the vertex.
+Sites TinyCrossings(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  s.Contour({{0.2, 0.2}, {0.8, 0.2}, {0.8, 0.8}, {0.2, 0.8}}, seed % 2 == 0);
+  const int k = I(r, 1, 4);
+  for (int i = 0; i < k; ++i) {
+    const double along = U(r, 0.25, 0.75), poke = std::pow(10.0, U(r, -13, std::log10(5e-12)));
+    const double out1 = U(r, 0.02, 0.15), out2 = U(r, 0.02, 0.15), w1 = U(r, 0.01, 0.2), w2 = U(r, 0.01, 0.2);
+    // In the frame of the bottom edge (y = 0.2, inside above), then turned.
+    std::vector<Pt> tri{{along, 0.2 + poke}, {along - w1, 0.2 - out1}, {along + w2, 0.2 - out2}};
+    const int turns = I(r, 0, 3);
+    for (Pt& p : tri)
+      for (int t = 0; t < turns; ++t) p = {1.0 - p.y, p.x};
+    if (I(r, 0, 1)) std::swap(tri[1], tri[2]);
+    s.Contour(tri, seed % 2 == 0);
+  }
+  return s;
+}
+
+// Rectangles and triangles with vertices on an integer grid, every
+// coordinate moved by up to 1e-13 to 1e-10 of the extent (the checker judges to 1e-9:
+// a grid jittered by that much is degenerate at the scale it judges).
+Sites JitteredGrid(std::uint32_t seed) {
+  Rng r(seed);
+  Sites s;
+  const int n = I(r, 4, 24), m = I(r, 2, 16);
+  const double jitter = std::pow(10.0, U(r, -13, -10));
+  const auto at = [&](int gx, int gy) {
+    return Pt{(gx + U(r, -jitter, jitter) * n) / n, (gy + U(r, -jitter, jitter) * n) / n};
+  };
+  for (int i = 0; i < m; ++i) {
+    const int x0 = I(r, 0, n - 1), y0 = I(r, 0, n - 1), x1 = I(r, x0 + 1, n), y1 = I(r, y0 + 1, n);
+    if (I(r, 0, 1)) {
+      s.Contour({at(x0, y0), at(x1, y0), at(x1, y1), at(x0, y1)});
+    } else {
+      s.Contour({at(x0, y0), at(x1, y0), at(x0, y1)});
+    }
+  }
+  return s;
+}
+
+using Family = Sites (*)(std::uint32_t);
+struct NamedFamily {
+  const char* name;
+  Family make;
+};
+const NamedFamily kFamilies[] = {{"Fan", Fan},
+                                 {"SharedVertex", Shared},
+                                 {"NearDuplicates", NearDuplicates},
+                                 {"Crossing", Crossing},
+                                 {"TinyCrossings", TinyCrossings},
+                                 {"JitteredGrid", JitteredGrid}};
+
+// Outcomes of one computation, as the child's exit status.
+enum Outcome { kValid = 0, kRefused = 1, kFatal = 2, kInvalid = 3, kTooManyRestarts = 4, kCrash = 5 };
+const char* const kOutcomeNames[] = {"valid", "refused", "exit 2", "invalid", "restarts", "crash"};
+
+// Runs the sites through the facade in a child process.
+Outcome RunIsolated(const Sites& s, int maxRestarts, std::string* detail = nullptr) {
+  int fd[2];
+  if (pipe(fd) != 0) return kCrash;
+  std::fflush(nullptr);
+  const pid_t pid = fork();
+  if (pid == 0) {
+    close(fd[0]);
+    VD_Initialize();
+    VD_Reset();
+    std::vector<std::int32_t> idx;
+    for (const Pt& p : s.pts) idx.push_back(API_AddPoint(p.x, p.y, 0));
+    for (const auto& [a, b] : s.segs) API_AddSegment(idx[a], idx[b], 1);
+    // Silence the engine's fatal message: the status tells.
+    if (!std::freopen("/dev/null", "w", stdout) || !std::freopen("/dev/null", "w", stderr)) _exit(kCrash);
+    std::string error;
+    int outcome = kValid;
+    if (!ComputeSegments()) {
+      outcome = kRefused;
+    } else if (!(error = FinalCheck(true)).empty()) {
+      outcome = kInvalid;
+      if (VD_InRecoveryMode()) error += " (recovery mode)";
+    } else if (VD_GetRestartCount() > maxRestarts) {
+      outcome = kTooManyRestarts;
+      error = std::to_string(VD_GetRestartCount()) + " restarts";
+    }
+    if (write(fd[1], error.data(), error.size()) < 0) _exit(kCrash);
+    _exit(outcome);
+  }
+  close(fd[1]);
+  char buf[512];
+  std::string text;
+  for (ssize_t k; (k = read(fd[0], buf, sizeof buf)) > 0;) text.append(buf, static_cast<std::size_t>(k));
+  close(fd[0]);
+  int status = 0;
+  if (waitpid(pid, &status, 0) != pid || !WIFEXITED(status)) return kCrash;
+  if (detail) *detail = text;
+  const int code = WEXITSTATUS(status);
+  return code <= kCrash ? static_cast<Outcome>(code) : kCrash;
+}
+
+// ---- named cases
+
+// sites: ';'-separated parts
+//   points x y ...      appended points
+//   segs i-j ...        segments between points by order number
+//   fan cx cy x y ...   a point and free segments from it to each x y
+//   family NAME seed    one input of a campaign family
+//   neardup pairs seed  pairs of points 1e-12 apart in the unit square
+//   random n seed       n segments between random points of the unit square
+//   comb teeth width    a closed comb outline
+Sites Parse(const std::string& text) {
+  Sites s;
+  for (const std::string& part : Parts(text, ';')) {
+    const std::vector<std::string> w = Split(part);
+    if (w.empty()) continue;
+    std::vector<double> a;
+    for (std::size_t i = 1; i < w.size(); ++i) a.push_back(w[0] == "segs" || w[0] == "family" ? 0 : Num(w[i]));
+    if (w[0] == "points") {
+      for (std::size_t i = 0; i + 1 < a.size(); i += 2) s.Add(a[i], a[i + 1]);
+    } else if (w[0] == "segs") {
+      for (std::size_t i = 1; i < w.size(); ++i)
+        s.segs.push_back({std::stoi(w[i]), std::stoi(w[i].substr(w[i].find('-') + 1))});
+    } else if (w[0] == "fan") {
+      const int c = s.Add(a.at(0), a.at(1));
+      for (std::size_t i = 2; i + 1 < a.size(); i += 2) s.segs.push_back({c, s.Add(a[i], a[i + 1])});
+    } else if (w[0] == "family") {
+      for (const NamedFamily& f : kFamilies)
+        if (w.at(1) == f.name) s = f.make(static_cast<std::uint32_t>(std::stoul(w.at(2))));
+    } else if (w[0] == "neardup") {
+      Rng r(static_cast<std::uint32_t>(a.at(1)));
+      for (int i = 0; i < static_cast<int>(a[0]); ++i) {
+        const double x = U(r, 0, 1), y = U(r, 0, 1);
+        s.Add(x, y);
+        s.Add(x + 1e-12, y);
+      }
+    } else if (w[0] == "random") {
+      Rng r(static_cast<std::uint32_t>(a.at(1)));
+      for (int i = 0; i < static_cast<int>(a[0]); ++i) {
+        const int p = s.Add(U(r, 0, 1), U(r, 0, 1));
+        s.segs.push_back({p, s.Add(U(r, 0, 1), U(r, 0, 1))});
+      }
+    } else if (w[0] == "comb") {
+      const int teeth = static_cast<int>(a.at(0));
+      const double wd = a.at(1);
+      std::vector<Pt> c{{0, 0}};
+      for (int i = 0; i < teeth; ++i) {
+        c.push_back({2 * i * wd, 1});
+        c.push_back({(2 * i + 1) * wd, 1});
+        c.push_back({(2 * i + 1) * wd, 0.5});
+        c.push_back({(2 * i + 2) * wd, 0.5});
+      }
+      c.back() = {2 * teeth * wd, 0};
+      s.Contour(c);
+    } else {
+      ADD_FAILURE() << "unknown part " << w[0];
+    }
+  }
+  return s;
+}
+
+class DirtyInput : public CaseRows {};
+
+TEST_P(DirtyInput, GivesAValidDiagram) {
+  const Sites s = Parse(row().field(0));
+  const Keys want(row().field(1));
+  std::string detail;
+  const Outcome o = RunIsolated(s, static_cast<int>(want.num("restarts", 500)), &detail);
+  EXPECT_EQ(o, kValid) << kOutcomeNames[o] << ": " << detail;
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, DirtyInput, RowsOf("dirty_input.txt"), RowName);
+
+// ---- the campaign
+
+void PrintTo(const NamedFamily& f, std::ostream* os) { *os << f.name; }
+
+class DirtyCampaign : public ::testing::TestWithParam<NamedFamily> {};
+
+TEST_P(DirtyCampaign, NoWrongDiagramNoFatalEnd) {
+  const char* env = std::getenv("ZT_DIRTY_CASES");
+  const int cases = env ? std::atoi(env) : 20;
+  const int maxRestarts = 10;  // "a handful"
+  int counts[kCrash + 1] = {};
+  std::string firstBad;
+  for (int k = 1; k <= cases; ++k) {
+    std::string detail;
+    const Outcome o = RunIsolated(GetParam().make(static_cast<std::uint32_t>(k)), maxRestarts, &detail);
+    ++counts[o];
+    if (o != kValid && o != kRefused && firstBad.empty())
+      firstBad = "seed " + std::to_string(k) + ": " + kOutcomeNames[o] + " " + detail;
+  }
+  std::printf("[ campaign ] %-15s %d cases:", GetParam().name, cases);
+  for (int o = 0; o <= kCrash; ++o) std::printf(" %s %d,", kOutcomeNames[o], counts[o]);
+  std::printf("\n");
+  EXPECT_EQ(counts[kValid] + counts[kRefused], cases) << firstBad;
+}
+
+INSTANTIATE_TEST_SUITE_P(Families, DirtyCampaign, ::testing::ValuesIn(kFamilies),
+                         [](const ::testing::TestParamInfo<NamedFamily>& i) { return std::string(i.param.name); });
+
+}  // namespace
+}  // namespace zt::test
