@@ -1,6 +1,9 @@
 // Finishing a polygon set: its contours' points become grid vertices, its
-// consecutive distinct vertices edges with integer boxes, and the boxes are
-// indexed by a box tree split at the median of the longer side.
+// consecutive distinct vertices edges with their exact extents as boxes, and
+// the boxes are indexed by a box tree split at the median of the longer side.
+// Exact extents keep the tree as fine as the data however far apart its
+// pieces lie: no rounding to a fixed fraction of the joint box can put a
+// dense contour's boxes on top of each other.
 #include <algorithm>
 #include <cmath>
 #include <new>
@@ -10,16 +13,6 @@
 
 namespace zt::detail {
 
-std::int32_t box_coordinate(double v, std::int32_t pad) {
-  double f = kBoxUnitsPerSquare * v;
-  if (!(f > -kIndexClamp)) f = std::isnan(f) ? 0.0 : -kIndexClamp;
-  if (f > kIndexClamp) f = kIndexClamp;
-  // floor by truncation, one step down for negative non-integers
-  std::int32_t i = static_cast<std::int32_t>(f);
-  if (i > f) --i;
-  return i + pad;
-}
-
 namespace {
 
 int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
@@ -28,17 +21,16 @@ int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
   EdgeBox* box = e.boxes.take();
   if (!box) return -1;
-  const bool xUp = from->x < to->x, yUp = from->y < to->y;
-  box->xmin = box_coordinate(xUp ? from->x : to->x, -1);
-  box->xmax = box_coordinate(xUp ? to->x : from->x, 1);
-  box->ymin = box_coordinate(yUp ? from->y : to->y, -1);
-  box->ymax = box_coordinate(yUp ? to->y : from->y, 1);
+  box->xmin = std::min(from->x, to->x);
+  box->xmax = std::max(from->x, to->x);
+  box->ymin = std::min(from->y, to->y);
+  box->ymax = std::max(from->y, to->y);
   box->edge = edge;
   return 0;
 }
 
 template <bool kByX>
-int key_of(const EdgeBox& b) {
+double key_of(const EdgeBox& b) {
   return kByX ? b.xmin : b.ymin;
 }
 
@@ -49,7 +41,7 @@ std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, st
   // the pivot and swap them, so runs of equal keys split evenly instead of
   // degrading into one-element steps.
   while (hi - lo >= kLeafSpan) {
-    const int pivot = key_of<kByX>(boxes[m]);
+    const double pivot = key_of<kByX>(boxes[m]);
     std::int32_t i = lo, j = hi;
     while (i <= j) {
       while (++comparisons, key_of<kByX>(boxes[i]) < pivot) ++i;
@@ -90,7 +82,7 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std
   node->last = base + last;
   const EdgeBox& b0 = boxes[first];
   node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
-  std::int32_t xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
+  double xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
   for (std::int32_t i = first + 1; i <= last; ++i) {
     const EdgeBox& b = boxes[i];
     xmin = std::min(xmin, b.xmin);
@@ -100,7 +92,7 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std
   }
   node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
   if (last - first <= kLeafSpan) return node;
-  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
+  const bool byX = node->xmax - node->xmin > node->ymax - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
   select_median(boxes, first, last, m, byX);
   node->low = build_node(e, boxes, base, first, m);

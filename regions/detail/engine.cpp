@@ -64,6 +64,8 @@ thread_local ThreadEngineHolder tl_engine;
 
 }  // namespace
 
+BooleanEngine* last_thread_engine() { return tl_engine.engine.get(); }
+
 BooleanEngine* prepare_thread_engine() {
   if (!tl_engine.engine) {
     if (!allocationAllowed()) return nullptr;

@@ -1,7 +1,7 @@
 // Finding the meeting points of the two operands: a dual walk of their box
-// trees reaches every pair of edges (one of each operand) whose boxes overlap
-// strictly; each meeting point becomes a shared vertex and a split point on
-// both edges (split_lists.cpp).
+// trees reaches every pair of edges (one of each operand) whose extents lie
+// within kPairRejectMargin of each other; each meeting point becomes a shared
+// vertex and a split point on both edges (split_lists.cpp).
 #include <algorithm>
 #include <cmath>
 
@@ -12,24 +12,8 @@ namespace zt::detail {
 
 namespace {
 
-// Edges whose exact extents are farther apart than this cannot meet: every
-// point the intersection routine returns lies within the tolerance of both
-// segments. The integer boxes are much coarser (a unit is 1/1000), so this
-// check spares most calls of the routine.
-inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
-
-bool extents_apart(const Edge& a, const Edge& b) {
-  const double m = kPairRejectMargin;
-  return std::min(a.start->x, a.end->x) > std::max(b.start->x, b.end->x) + m ||
-         std::min(b.start->x, b.end->x) > std::max(a.start->x, a.end->x) + m ||
-         std::min(a.start->y, a.end->y) > std::max(b.start->y, b.end->y) + m ||
-         std::min(b.start->y, b.end->y) > std::max(a.start->y, a.end->y) + m;
-}
-
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
-  pr.retryReversed = 0;
-  if (extents_apart(first, second)) return 0;
   pr.retryReversed = 0;
   pr.p0 = {first.start->x, first.start->y};
   pr.p1 = {first.end->x, first.end->y};
@@ -55,12 +39,8 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   return 0;
 }
 
-bool nodes_overlap(const BoxTreeNode& a, const BoxTreeNode& b) {
-  return boxes_overlap(a.xmin, a.ymin, a.xmax, a.ymax, b.xmin, b.ymin, b.xmax, b.ymax);
-}
-
 int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
-  if (!nodes_overlap(*a, *b)) return 0;
+  if (!boxes_near(*a, *b)) return 0;
   if (a->low && b->low) {
     if (walk(e, a->low, b->low) || walk(e, a->low, b->high) || walk(e, a->high, b->low) ||
         walk(e, a->high, b->high))
@@ -69,11 +49,12 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
   }
   if (a->low) return (walk(e, a->low, b) || walk(e, a->high, b)) ? -1 : 0;
   if (b->low) return (walk(e, a, b->low) || walk(e, a, b->high)) ? -1 : 0;
+  e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
   for (std::int32_t i = a->first; i <= a->last; ++i) {
     const EdgeBox& bi = e.boxes[i];
     for (std::int32_t j = b->first; j <= b->last; ++j) {
       const EdgeBox& bj = e.boxes[j];
-      if (!boxes_overlap(bi.xmin, bi.ymin, bi.xmax, bi.ymax, bj.xmin, bj.ymin, bj.xmax, bj.ymax)) continue;
+      if (!boxes_near(bi, bj)) continue;
       if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
       if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;
     }
@@ -86,6 +67,7 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
 int find_intersections(BooleanEngine& e) {
   e.probe.mode = 1;
   if (!e.a.root || !e.b.root) return -1;
+  e.leafPairTests = 0;
   int rc = walk(e, e.a.root, e.b.root);
   for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
   e.halves.reset();

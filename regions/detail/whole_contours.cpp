@@ -2,6 +2,7 @@
 // the parity of the crossings of a ray from their first point towards +x with
 // the other operand's edges.
 #include <cmath>
+#include <limits>
 
 #include "regions/detail/engine.hpp"
 
@@ -11,7 +12,7 @@ namespace {
 
 void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
   const BoxTreeNode& q = e.queryBox;
-  if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, node->xmin, node->ymin, node->xmax, node->ymax)) return;
+  if (!boxes_near(q, *node)) return;
   if (node->low) {
     count_in_node(e, node->low);
     count_in_node(e, node->high);
@@ -20,7 +21,7 @@ void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
   IntersectionProbe& pr = e.probe;
   for (std::int32_t i = node->first; i <= node->last; ++i) {
     const EdgeBox& b = e.boxes[i];
-    if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, b.xmin, b.ymin, b.xmax, b.ymax)) continue;
+    if (!boxes_near(q, b)) continue;
     const Edge& edge = *b.edge;
     pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
   }
@@ -35,10 +36,11 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
   pr.qx = px;
   pr.qy = py;
   BoxTreeNode& q = e.queryBox;
-  q.xmin = box_coordinate(px, -1);
-  q.ymin = box_coordinate(py, -1);
-  q.xmax = kRayBoxXmax;
-  q.ymax = box_coordinate(py, 1);
+  // The ray itself: an edge it crosses reaches below and above py and to
+  // the right of px, so its box is near this one.
+  q.xmin = px;
+  q.xmax = std::numeric_limits<double>::max();
+  q.ymin = q.ymax = py;
   if (set.root) count_in_node(e, set.root);
   return pr.crossingCount;
 }
