@@ -71,17 +71,14 @@ std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, st
   return comparisons;
 }
 
-// Builds the node over boxes[first..last] of the scratch copy; `base` is the
-// pool index of the scratch's first box, so node ranges are pool indexes.
-BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std::int32_t first,
-                        std::int32_t last) {
+// Builds the node over boxes[first..last] of the tree copy.
+BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t first, std::int32_t last) {
   BoxTreeNode* node = e.nodes.take();
   if (!node) return nullptr;
   *node = BoxTreeNode{};
-  node->first = base + first;
-  node->last = base + last;
+  node->first = first;
+  node->last = last;
   const EdgeBox& b0 = boxes[first];
-  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
   double xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
   for (std::int32_t i = first + 1; i <= last; ++i) {
     const EdgeBox& b = boxes[i];
@@ -95,29 +92,30 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std
   const bool byX = node->xmax - node->xmin > node->ymax - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
   select_median(boxes, first, last, m, byX);
-  node->low = build_node(e, boxes, base, first, m);
+  node->low = build_node(e, boxes, first, m);
   if (!node->low) return nullptr;
-  node->high = build_node(e, boxes, base, m + 1, last);
+  node->high = build_node(e, boxes, m + 1, last);
   if (!node->high) return nullptr;
   return node;
 }
 
 // The tree is built on a contiguous copy of the set's boxes (the selection
-// moves them a lot), which is then written back in its new order.
+// moves them a lot), which the walks then read: the copy holds both sets'
+// boxes, indexed like the pool.
 int build_tree(BooleanEngine& e, PolygonSet& set) {
-  const std::int32_t n = set.lastBox - set.firstBox + 1;
-  if (n > e.boxScratchCapacity) {
-    delete[] e.boxScratch;
-    e.boxScratch = nullptr;
-    e.boxScratchCapacity = 0;
+  const std::int32_t need = set.lastBox + 1;
+  if (need > e.treeBoxCapacity) {
     if (!allocationAllowed()) return -1;
-    e.boxScratch = new (std::nothrow) EdgeBox[static_cast<std::size_t>(n)];
-    if (!e.boxScratch) return -1;
-    e.boxScratchCapacity = n;
+    const std::int32_t capacity = std::max(need, 2 * e.treeBoxCapacity);
+    EdgeBox* grown = new (std::nothrow) EdgeBox[static_cast<std::size_t>(capacity)];
+    if (!grown) return -1;
+    std::copy(e.treeBoxes, e.treeBoxes + set.firstBox, grown);
+    delete[] e.treeBoxes;
+    e.treeBoxes = grown;
+    e.treeBoxCapacity = capacity;
   }
-  for (std::int32_t i = 0; i < n; ++i) e.boxScratch[i] = e.boxes[set.firstBox + i];
-  set.root = build_node(e, e.boxScratch, set.firstBox, 0, n - 1);
-  for (std::int32_t i = 0; i < n; ++i) e.boxes[set.firstBox + i] = e.boxScratch[i];
+  for (std::int32_t i = set.firstBox; i <= set.lastBox; ++i) e.treeBoxes[i] = e.boxes[i];
+  set.root = build_node(e, e.treeBoxes, set.firstBox, set.lastBox);
   return set.root ? 0 : -1;
 }
 

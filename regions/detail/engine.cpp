@@ -30,7 +30,7 @@ BooleanEngine::~BooleanEngine() {
   }
   delete grid.vertices;
   delete[] grid.buckets;
-  delete[] boxScratch;
+  delete[] treeBoxes;
   delete[] splitScratch;
 }
 

@@ -55,7 +55,7 @@ inline constexpr double kFineIndexClamp = 0x1p62;
 // still give well-defined integer keys.
 inline constexpr double kIndexClamp = 1073741824.0;  // 2^30
 // A box-tree node holding at most this many boxes beyond its first is a leaf.
-inline constexpr std::int32_t kLeafSpan = 20;
+inline constexpr std::int32_t kLeafSpan = 8;
 // Inputs beyond this magnitude (or not finite) are refused.
 inline constexpr double kMaxInputMagnitude = 1e15;
 
@@ -133,9 +133,10 @@ struct BooleanEngine {
   BoxTreeNode queryBox;
   IntersectionProbe probe;
   VertexGrid grid;
-  // Contiguous copy of one set's boxes while its tree is built.
-  EdgeBox* boxScratch = nullptr;
-  std::int32_t boxScratchCapacity = 0;
+  // Both sets' boxes in their trees' order, contiguous, indexed like the
+  // box pool (the trees' ranges index it; the walks read it).
+  EdgeBox* treeBoxes = nullptr;
+  std::int32_t treeBoxCapacity = 0;
   // The crossings found on one edge while its split list is settled.
   SplitCandidate* splitScratch = nullptr;
   std::int32_t splitScratchCapacity = 0;
@@ -189,6 +190,8 @@ void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// What a lookup of v's own coordinates by a crossing does: v becomes shared.
+void grid_share(VertexGrid& g, Vertex* v);
 // Bucket of a fine cell, never outside the table whatever the cell's sign.
 std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column);
 // Vertices walked by the lookups since the grid was sized (the cost that the

@@ -4,6 +4,7 @@
 // vertex and a split point on both edges (split_lists.cpp).
 #include <algorithm>
 #include <cmath>
+#include <initializer_list>
 
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
@@ -11,6 +12,17 @@
 namespace zt::detail {
 
 namespace {
+
+// The endpoint of either edge that lies exactly at R, if any. Vertices are
+// pairwise at least the tolerance apart, so a lookup of an endpoint's own
+// coordinates could only return that endpoint: meeting points at shared
+// corners and along coincident edges (most of them, where the operands
+// share a boundary) need no lookup.
+Vertex* endpoint_at(const Edge& a, const Edge& b, const Point2d& R) {
+  for (Vertex* v : {a.start, a.end, b.start, b.end})
+    if (v->x == R.x && v->y == R.y) return v;
+  return nullptr;
+}
 
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
@@ -29,8 +41,13 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   const double uBx = pr.dirB.dx / pr.dirB.length, uBy = pr.dirB.dy / pr.dirB.length;
   for (int r = 0; r < k; ++r) {
     const Point2d& R = r == 0 ? pr.r1 : pr.r2;
-    Vertex* v = grid_lookup(*pr.grid, R.x, R.y, kSharedOwner);
-    if (!v) return -1;
+    Vertex* v = endpoint_at(first, second, R);
+    if (v) {
+      grid_share(*pr.grid, v);
+    } else {
+      v = grid_lookup(*pr.grid, R.x, R.y, kSharedOwner);
+      if (!v) return -1;
+    }
     const double tA = ((R.x - pr.p0.x) * uAx + (R.y - pr.p0.y) * uAy) / pr.dirA.length;
     const double tB = ((R.x - pr.q0.x) * uBx + (R.y - pr.q0.y) * uBy) / pr.dirB.length;
     if (record_split(*pr.splits, first, tA, v) != 0) return -1;
@@ -51,9 +68,9 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
   if (b->low) return (walk(e, a, b->low) || walk(e, a, b->high)) ? -1 : 0;
   e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
   for (std::int32_t i = a->first; i <= a->last; ++i) {
-    const EdgeBox& bi = e.boxes[i];
+    const EdgeBox& bi = e.treeBoxes[i];
     for (std::int32_t j = b->first; j <= b->last; ++j) {
-      const EdgeBox& bj = e.boxes[j];
+      const EdgeBox& bj = e.treeBoxes[j];
       if (!boxes_near(bi, bj)) continue;
       if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
       if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;

@@ -125,6 +125,10 @@ void make_shared(VertexGrid& g, Vertex* v) {
 
 }  // namespace
 
+void grid_share(VertexGrid& g, Vertex* v) {
+  if (v->owner != kSharedOwner) make_shared(g, v);
+}
+
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner) {
   const double s = g.fineScale;
   const std::int64_t f0 = fine_index(x - g.eps, s), f1 = fine_index(x + g.eps, s);

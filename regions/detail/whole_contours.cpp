@@ -20,7 +20,7 @@ void count_in_node(BooleanEngine& e, const BoxTreeNode* node) {
   }
   IntersectionProbe& pr = e.probe;
   for (std::int32_t i = node->first; i <= node->last; ++i) {
-    const EdgeBox& b = e.boxes[i];
+    const EdgeBox& b = e.treeBoxes[i];
     if (!boxes_near(q, b)) continue;
     const Edge& edge = *b.edge;
     pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
