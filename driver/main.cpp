@@ -4,6 +4,5 @@
 #include "driver/main_flow.hpp"
 
 int main() {
-  zt::restzones_main();
-  return 0;
+  return zt::restzones_main() == zt::RunEnd::kNoMarker ? zt::kNoMarkerExitStatus : 0;
 }

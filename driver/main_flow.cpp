@@ -7,10 +7,13 @@
 #include <string>
 #include <vector>
 
+#include <unistd.h>
+
 #include "driver/detail/result_guard.hpp"
 #include "driver/level_tables.hpp"
 #include "driver/logical_units.hpp"
 #include "driver/message_text.hpp"
+#include "driver/record_fault.hpp"
 #include "driver/record_files.hpp"
 #include "runtime/error_report.hpp"
 #include "runtime/path_expansion.hpp"
@@ -30,6 +33,8 @@ constexpr std::int32_t kOpenCreate = 2;
 constexpr const char* kContourFile = "$TMP/contour.bin";
 constexpr const char* kStockFile = "$TMP/stock1.bin";
 constexpr const char* kResultFile = "$TMP/stock2.bin";
+// The result's name while it is written: kResultFile, this, the process id.
+constexpr const char* kPartSuffix = ".tmp.";
 
 // The driver's static data: level tables, point buffer, name buffer.
 LevelTable g_contourLevels;
@@ -95,7 +100,14 @@ void show_banner() {
 }  // namespace
 
 RunEnd restzones_main() {
-  report_begin("");
+  // Without its status marker the suite could take this run for a success
+  // (or an old result for this run's): nothing else may happen.
+  std::string reason;
+  if (report_begin("", reason) != 0) {
+    std::fprintf(stderr, "restzones: the status marker cannot be created in $TMP (%s)\n", reason.c_str());
+    std::fflush(stderr);
+    return RunEnd::kNoMarker;
+  }
 
   const Name contourName(kContourFile);
   if (!exists(contourName)) return stop_with(kMsgNoContours);
@@ -132,20 +144,34 @@ RunEnd restzones_main() {
   }
   close_unit(stockUnit);
 
+  // The result is written under a name of this process and takes its own
+  // name only once complete: "$TMP/stock2.bin" is never a partial file, and
+  // an older one is gone before this run writes anything.
   const std::int32_t resultUnit = free_unit();
   const Name resultName(kResultFile);
-  open_unformatted(resultUnit, resultName.data(), resultName.length(), kOpenCreate, ierr);
-  detail::guard_result(unit_path(resultUnit));
+  const std::string partText = std::string(kResultFile) + kPartSuffix + std::to_string(::getpid());
+  const Name partName(partText.c_str());
+  std::int32_t status = 0;
+  delete_file(resultName.data(), resultName.length(), status);
+  open_unformatted(resultUnit, partName.data(), partName.length(), kOpenCreate, ierr);
+  const std::string partPath = unit_path(resultUnit);
+  detail::guard_result(partPath);
   wf_fin_czone(g_points, resultUnit, ierr, write_contour);
   close_unit(resultUnit);
-  detail::release_result();
 
   if (ierr != 0) {
+    std::remove(partPath.c_str());
+    detail::release_result();
     report_message(kMsgFinFailed, static_cast<std::int32_t>(std::strlen(kMsgFinFailed)));
-    std::int32_t status = 0;
     delete_file(resultName.data(), resultName.length(), status);
     return RunEnd::kStopped;
   }
+  std::string resultPath;
+  expand_to_string(kResultFile, resultPath);
+  if (const int error = detail::commit_result(partPath, resultPath); error != 0) {
+    record_stop({RecordFault::kUnwritable, resultPath, 0, std::strerror(error)});
+  }
+  detail::release_result();
   report_end();
   return RunEnd::kNormal;
 }

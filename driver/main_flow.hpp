@@ -9,8 +9,12 @@
 // A failed step shows one French message (console and "$TMP/kvlerror.prg")
 // and stops: exit status 0, marker left behind. Faults of the record layer
 // (damaged files, non-finite coordinates) end the process inside that layer
-// with their own status. Whichever way the process ends, it never leaves a
-// "$TMP/stock2.bin" that was not completely written.
+// with their own status. When the marker itself cannot be created nothing
+// else is done: one line on standard error, exit status kNoMarkerExitStatus.
+// The result is written as "$TMP/stock2.bin.tmp.<pid>" and renamed to
+// "$TMP/stock2.bin" once complete, closed and on disk; an older stock2.bin
+// is deleted before. Whichever way the process ends (a signal, a crash, a
+// power loss included), "$TMP/stock2.bin" is absent or complete.
 #pragma once
 
 #include <cstdint>
@@ -36,13 +40,17 @@ inline constexpr std::int32_t kMessageBufferWidth = 80;
 // (separator records inside its range counted).
 inline constexpr std::int32_t kMinLevelRecords = 4;
 
+// Exit status of a run whose status marker could not be created.
+inline constexpr int kNoMarkerExitStatus = 3;
+
 enum class RunEnd {
-  kNormal,   // result written, status marker removed
-  kStopped,  // a message was shown, status marker left
+  kNormal,    // result written, status marker removed
+  kStopped,   // a message was shown, status marker left
+  kNoMarker,  // the status marker could not be created; nothing was done
 };
 
 // Runs the whole program once per process (the zone builder's state lives
-// until the process ends). The exit status of both ends is 0.
+// until the process ends). The exit status of the first two ends is 0.
 RunEnd restzones_main();
 
 }  // namespace zt

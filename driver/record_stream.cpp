@@ -51,10 +51,7 @@ void decode_xyz(const std::uint8_t* bytes, float& x, float& y, float& z) {
 
 RecordReader::~RecordReader() { close(); }
 
-void RecordReader::close() {
-  if (file_ != nullptr) std::fclose(file_);
-  file_ = nullptr;
-}
+void RecordReader::close() { input_.close(); }
 
 ReadStatus RecordReader::fail(RecordFault f, std::int64_t record, std::string detail) {
   fault_ = {f, path_, record, std::move(detail)};
@@ -67,17 +64,20 @@ bool RecordReader::open(const std::string& path) {
   records_ = 0;
   ended_ = false;
   fault_ = {};
-  errno = 0;
-  file_ = std::fopen(path.c_str(), "rb");
-  if (file_ == nullptr) {
-    fail(RecordFault::kUnreadable, 0, system_text(errno));
-    return false;
+  switch (input_.open(path.c_str())) {
+    case BufferedInput::Open::kOk: break;
+    case BufferedInput::Open::kFailed:
+      fail(RecordFault::kUnreadable, 0, system_text(input_.error()));
+      return false;
+    case BufferedInput::Open::kNotRegular:
+      fail(RecordFault::kUnreadable, 0, "not a regular file");
+      return false;
   }
-  const int first = std::fgetc(file_);
-  if (first == EOF) {
-    const bool error = std::ferror(file_) != 0;
+  const int first = input_.get();
+  if (first < 0) {
+    const bool error = input_.failed();
     fail(error ? RecordFault::kUnreadable : RecordFault::kNotRecordFile, 0,
-         error ? system_text(errno) : "empty file");
+         error ? system_text(input_.error()) : "empty file");
     close();
     return false;
   }
@@ -90,18 +90,15 @@ bool RecordReader::open(const std::string& path) {
 }
 
 bool RecordReader::rewind() {
-  assert(file_ != nullptr);
+  assert(input_.is_open());
   records_ = 0;
   ended_ = false;
-  if (std::fseek(file_, 1, SEEK_SET) != 0) {
-    fail(RecordFault::kUnreadable, 0, system_text(errno));
-    return false;
-  }
+  input_.seek(1);
   return true;
 }
 
 ReadStatus RecordReader::read(std::span<std::uint8_t> head, std::size_t& length) {
-  assert(file_ != nullptr);
+  assert(input_.is_open());
   length = 0;
   if (ended_) return ReadStatus::kEnd;
   const std::int64_t record = records_ + 1;
@@ -110,7 +107,7 @@ ReadStatus RecordReader::read(std::span<std::uint8_t> head, std::size_t& length)
   auto read_data = [&](std::size_t n) -> bool {
     std::uint8_t* dst = scratch;
     if (length < head.size() && head.size() - length >= n) dst = head.data() + length;
-    if (std::fread(dst, 1, n, file_) != n) return false;
+    if (input_.read(dst, n) != n) return false;
     if (dst == scratch && length < head.size()) {
       std::memcpy(head.data() + length, scratch, head.size() - length);
     }
@@ -118,28 +115,35 @@ ReadStatus RecordReader::read(std::span<std::uint8_t> head, std::size_t& length)
     return true;
   };
   auto cut_short = [&] {
-    if (std::ferror(file_)) return fail(RecordFault::kUnreadable, record, system_text(errno));
+    if (input_.failed()) return fail(RecordFault::kUnreadable, record, system_text(input_.error()));
     return fail(RecordFault::kDamaged, record, "file ends inside a record");
   };
 
   bool first_segment = true;
   for (;;) {
-    const int lead = std::fgetc(file_);
-    if (lead == EOF) {
-      if (std::ferror(file_)) return fail(RecordFault::kUnreadable, record, system_text(errno));
+    const int lead = input_.get();
+    if (lead < 0) {
+      if (input_.failed()) return fail(RecordFault::kUnreadable, record, system_text(input_.error()));
       return fail(RecordFault::kDamaged, record,
                   first_segment ? "file ends without its end marker" : "file ends inside a record");
     }
     if (lead > kSegmentContinued) {
       if (!first_segment) return fail(RecordFault::kDamaged, record, "end marker inside a record");
+      // Only the end marker, as the file's last byte, ends the file: any other
+      // length byte, or bytes after the marker, mean records would be lost.
+      if (lead != kRecordEndMarker) {
+        return fail(RecordFault::kDamaged, record, "length byte " + std::to_string(lead) + " where a record starts");
+      }
+      if (input_.get() >= 0) return fail(RecordFault::kDamaged, record, "end marker before the end of the file");
+      if (input_.failed()) return fail(RecordFault::kUnreadable, record, system_text(input_.error()));
       ended_ = true;
       return ReadStatus::kEnd;
     }
     first_segment = false;
     const std::size_t n = lead == kSegmentContinued ? kSegmentBytes : static_cast<std::size_t>(lead);
     if (!read_data(n)) return cut_short();
-    const int trail = std::fgetc(file_);
-    if (trail == EOF) return cut_short();
+    const int trail = input_.get();
+    if (trail < 0) return cut_short();
     if (trail != lead) {
       return fail(RecordFault::kDamaged, record,
                   "segment lengths " + std::to_string(lead) + " and " + std::to_string(trail) + " disagree");

@@ -3,12 +3,16 @@
 // Layout: the byte 75 ("K"), the records, the byte 130. A record is one or
 // more segments: a length byte L, min(L, 128) data bytes, L again. L = 129
 // means 128 bytes and the record goes on in the next segment; L in 0..128
-// ends the record with L bytes. A length byte above 129 where a record starts
-// ends the file. Every multi-byte value inside a record is little-endian.
+// ends the record with L bytes. The end marker 130 where a record starts ends
+// the file, and must be its last byte; any other length byte above 129 there
+// is damage, never a quiet end. Every multi-byte value inside a record is
+// little-endian.
 //
 // RecordReader and RecordWriter work on plain (already expanded) paths and
 // report every fault through a RecordFaultInfo instead of stopping; the
-// logical units above them decide to stop.
+// logical units above them decide to stop. The reader takes only regular
+// files (anything else is refused without blocking) and reads through one
+// buffer: no system call per record.
 #pragma once
 
 #include <array>
@@ -18,6 +22,7 @@
 #include <string>
 
 #include "driver/record_fault.hpp"
+#include "runtime/buffered_input.hpp"
 
 namespace zt {
 
@@ -50,7 +55,7 @@ class RecordReader {
 
   // Opens the file and checks its marker byte; false with fault() set.
   bool open(const std::string& path);
-  bool is_open() const { return file_ != nullptr; }
+  bool is_open() const { return input_.is_open(); }
   void close();
   // Back to the first record.
   bool rewind();
@@ -67,7 +72,7 @@ class RecordReader {
  private:
   ReadStatus fail(RecordFault f, std::int64_t record, std::string detail);
 
-  std::FILE* file_ = nullptr;
+  BufferedInput input_;
   std::string path_;
   std::int64_t records_ = 0;
   bool ended_ = false;

@@ -8,6 +8,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <ctime>
 #include <optional>
 #include <string>
@@ -53,14 +54,26 @@ bool write_all(int fd, std::string_view text) {
 }
 
 // Writes `text` to the file opened with `flags`; 0, or -1 when the file could
-// not be opened or written.
-std::int32_t write_file(const std::string& name, int flags, std::string_view text) {
-  const std::optional<std::string> path = protocol_path(name);
-  if (!path) return -1;
-  const int fd = ::open(path->c_str(), flags | O_WRONLY | O_CREAT | O_CLOEXEC, 0666);
-  if (fd < 0) return -1;
-  const bool written = write_all(fd, text);
-  return (::close(fd) == 0 && written) ? 0 : -1;
+// not be opened or written (then `reason`, when given, says why). A FIFO
+// without a reader is a failure, never a wait.
+std::int32_t write_file(const std::string& name, int flags, std::string_view text,
+                        std::string* reason = nullptr) {
+  std::string path;
+  const std::int32_t status = expand_to_string(name, path);
+  if (status != kExpandOk) {
+    if (reason) *reason = "\"" + name + "\" cannot be expanded (status " + std::to_string(status) + ")";
+    return -1;
+  }
+  const int fd = ::open(path.c_str(), flags | O_WRONLY | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0666);
+  int error = fd < 0 ? errno : 0;
+  if (fd >= 0) {
+    errno = 0;
+    if (!write_all(fd, text)) error = errno != 0 ? errno : EIO;
+    if (::close(fd) != 0 && error == 0) error = errno;
+  }
+  if (error == 0) return 0;
+  if (reason) *reason = "\"" + path + "\": " + std::strerror(error);
+  return -1;
 }
 
 std::int32_t show_message(std::string_view text) {
@@ -77,7 +90,13 @@ std::int32_t show_message(std::string_view text) {
 }  // namespace
 
 std::int32_t report_begin(const char* text) {
-  return write_file(marker_name(), O_TRUNC, text ? std::string_view(text) : std::string_view());
+  std::string reason;
+  return report_begin(text, reason);
+}
+
+std::int32_t report_begin(const char* text, std::string& reason) {
+  reason.clear();
+  return write_file(marker_name(), O_TRUNC, text ? std::string_view(text) : std::string_view(), &reason);
 }
 
 std::int32_t report_message(const char* buffer, const std::int32_t& length) {

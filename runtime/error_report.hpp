@@ -8,11 +8,15 @@
 #pragma once
 
 #include <cstdint>
+#include <string>
 
 namespace zt {
 
 // Creates or truncates the status marker with `text` (may be null). 0 or -1.
 std::int32_t report_begin(const char* text);
+// The same; on -1 `reason` says what failed: the marker's path (or its name
+// when that cannot be expanded) and the system's or the expansion's reason.
+std::int32_t report_begin(const char* text, std::string& reason);
 // Trims trailing blanks; a non-empty text goes to standard output with a line
 // end; the text is appended to the message file in every case. 0 or -1.
 std::int32_t report_message(const char* buffer, const std::int32_t& length);

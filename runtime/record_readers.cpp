@@ -2,6 +2,8 @@
 // the fixed-size point records.
 #include "runtime/record_readers.hpp"
 
+#include "runtime/buffered_input.hpp"
+
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -24,8 +26,6 @@ constexpr std::int64_t kPointXyz = 12;
 constexpr std::int64_t kPointWithCode = 16;
 constexpr std::int64_t kPointWithFlag = 18;
 
-using ReadFunction = std::size_t (*)(void*, std::size_t, std::size_t, std::FILE*);
-
 std::uint32_t le32(const unsigned char* b) {
   return std::uint32_t{b[0]} | std::uint32_t{b[1]} << 8 | std::uint32_t{b[2]} << 16 |
          std::uint32_t{b[3]} << 24;
@@ -42,11 +42,15 @@ std::int16_t le_int16(const unsigned char* b) {
 // VCZi4UnformattedFileReader
 
 struct VCZi4UnformattedFileReader::FileState {
-  std::FILE* stream = nullptr;
+  // Every read goes through one large buffer: the per-segment reads, the
+  // position asked for each message and the jumps of seekToPoint cost no
+  // system call of their own.
+  BufferedInput input;
   std::int64_t fileSize = 0;
   std::int64_t recordsRead = 0;
+  // Kept for the callers that choose it; with the reader's own buffer there
+  // is no stream lock to skip.
   bool unlockedReads = false;
-  ReadFunction read = nullptr;
   ReaderMessageHandler handler = nullptr;
   void* handlerContext = nullptr;
 };
@@ -54,7 +58,6 @@ struct VCZi4UnformattedFileReader::FileState {
 VCZi4UnformattedFileReader::VCZi4UnformattedFileReader(bool unlockedReads)
     : state_(std::make_unique<FileState>()) {
   state_->unlockedReads = unlockedReads;
-  state_->read = unlockedReads ? ReadFunction{fread_unlocked} : ReadFunction{std::fread};
 }
 
 VCZi4UnformattedFileReader::~VCZi4UnformattedFileReader() { close(); }
@@ -69,24 +72,18 @@ int VCZi4UnformattedFileReader::open(const char* path) {
   if (!path || !*path) return -1;
   struct stat info {};
   if (::stat(path, &info) != 0) return -2;
-  std::FILE* f = std::fopen(path, "rb");
-  if (!f) return -3;
-  state_->stream = f;
-  state_->fileSize = static_cast<std::int64_t>(info.st_size);
+  // Only a regular file opens: a FIFO would block, a device never end.
+  if (state_->input.open(path) != BufferedInput::Open::kOk) return -3;
+  state_->fileSize = state_->input.size();
   state_->recordsRead = 0;
   return 0;
 }
 
-int VCZi4UnformattedFileReader::close() {
-  if (!state_->stream) return 0;
-  const int r = std::fclose(state_->stream);
-  state_->stream = nullptr;
-  return r;
-}
+int VCZi4UnformattedFileReader::close() { return state_->input.close(); }
 
 int VCZi4UnformattedFileReader::readBytes(void* buffer, std::size_t n) {
-  if (!state_->stream) return -2;
-  return state_->read(buffer, 1, n, state_->stream) == n ? 0 : -1;
+  if (!state_->input.is_open()) return -2;
+  return state_->input.read(buffer, n) == n ? 0 : -1;
 }
 
 std::int64_t VCZi4UnformattedFileReader::nextRecord(void* buffer, std::int64_t capacity) {
@@ -96,8 +93,7 @@ std::int64_t VCZi4UnformattedFileReader::nextRecord(void* buffer, std::int64_t c
 }
 
 int VCZi4UnformattedFileReader::seek(std::int64_t offset, std::int64_t recordsRead) {
-  if (!state_->stream) return -1;
-  if (fseeko(state_->stream, static_cast<off_t>(offset), SEEK_SET) != 0) return -1;
+  if (!state_->input.seek(offset)) return -1;
   state_->recordsRead = recordsRead;
   return 0;
 }
@@ -105,9 +101,9 @@ int VCZi4UnformattedFileReader::seek(std::int64_t offset, std::int64_t recordsRe
 std::int64_t VCZi4UnformattedFileReader::fileSize() const { return state_->fileSize; }
 std::int64_t VCZi4UnformattedFileReader::recordsRead() const { return state_->recordsRead; }
 std::int64_t VCZi4UnformattedFileReader::tell() const {
-  return state_->stream ? static_cast<std::int64_t>(ftello(state_->stream)) : -1;
+  return state_->input.is_open() ? state_->input.tell() : -1;
 }
-bool VCZi4UnformattedFileReader::isOpen() const { return state_->stream != nullptr; }
+bool VCZi4UnformattedFileReader::isOpen() const { return state_->input.is_open(); }
 
 void VCZi4UnformattedFileReader::message(const char* format, ...) {
   if (!state_->handler) return;

@@ -12,10 +12,14 @@
 //    size and jumps to the n-th one. It accepts an optional 8-byte header
 //    record (float, int32) as the file's first record.
 // Paths are taken as already expanded. Open statuses: -1 no path, -2 the file
-// does not exist (no size), -3 it cannot be opened, -4 fewer than two bytes,
+// does not exist (no size), -3 it cannot be opened or is not a regular file
+// (a FIFO, device, socket or directory is refused without blocking or reading
+// from it), -4 fewer than two bytes,
 // -5 not starting with "K", -6 a header record announced but not whole.
 // Damage is reported through the message callback (when one is set) and as
-// -1 from the reads; a reader never reads past what it was given.
+// -1 from the reads; a reader never reads past what it was given. Reading
+// goes through one buffer per reader: no system call per record, none to
+// tell the position and none for a seek within the buffered bytes.
 #pragma once
 
 #include <cstdint>
@@ -39,10 +43,11 @@ class VCZi4UnformattedFileReader {
   // skips the record), 0 at the end of the file, -1 on a read error.
   virtual std::int64_t readNextRecord(void* buffer, std::int64_t capacity) = 0;
 
-  // 0, -1 (no path), -2 (no such file), -3 (cannot be opened for reading).
+  // 0, -1 (no path), -2 (no such file), -3 (cannot be opened for reading, or
+  // not a regular file).
   // A file already open is closed first.
   int open(const char* path);
-  // The result of closing the stream, 0 when none is open.
+  // 0, or -1 when closing the file failed; 0 when none is open.
   int close();
   // 0 when all n bytes were read, -2 with no open file, -1 when fewer came.
   int readBytes(void* buffer, std::size_t n);

@@ -17,6 +17,17 @@ void append_rest_material(TaggedPointList& list, const Point2f* points, std::int
   }
 }
 
+// Whether the list holds an edge: two consecutive points of one polyline
+// that differ. Without one the zone region is empty.
+bool has_edge(const TaggedPointList& list) {
+  for (std::int32_t i = 1; i < list.count(); ++i) {
+    const TaggedPoint& a = list[i - 1];
+    const TaggedPoint& b = list[i];
+    if (a.tag != kSeparatorTag && b.tag != kSeparatorTag && (a.x != b.x || a.y != b.y)) return true;
+  }
+  return false;
+}
+
 }  // namespace
 
 std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
@@ -37,10 +48,11 @@ std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* p
   if (context.contourPoints.count() == 0) return -1;
 
   build_level_zones(context, points, count);
+  context.levelResult.clear();
+  if (!has_edge(context.zonePoints)) return 0;
   if (rg_boolean(context.contourPoints, context.zonePoints, "i", &context.contourPoints) != 0) {
     return -1;
   }
-  context.levelResult.clear();
   context.levelResult.reserve(static_cast<std::size_t>(context.contourPoints.count()));
   for (const TaggedPoint& p : context.contourPoints) {
     context.levelResult.push_back({static_cast<float>(p.x), static_cast<float>(p.y)});

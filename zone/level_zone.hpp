@@ -6,7 +6,9 @@
 // bound intersected with the region of the finishing contours of the same z.
 // When the engine cannot offset, the rest material itself stands in for its
 // offset. The result goes to context.levelResult as single-precision pairs,
-// separators (99999, 99999) included.
+// separators (99999, 99999) included. Rest material that grows into no curve
+// at all (nothing to feed: points, contours below the engine's extent) gives
+// the level no zones rather than an empty operand of the intersection.
 #pragma once
 
 #include <cstdint>
@@ -25,9 +27,9 @@ inline constexpr double kLevelSimplifyTolerance = 0.005;
 // Tag of a rest-material point.
 inline constexpr std::int32_t kRestPointTag = 0;
 
-// 0 with context.levelResult holding the level's zones (possibly none); -1
-// when no finishing level matches z, it has no records or cannot be read, or
-// the intersection fails (an empty zone region included).
+// 0 with context.levelResult holding the level's zones (possibly none, as
+// when the rest material grows into no curve); -1 when no finishing level
+// matches z, it has no records or cannot be read, or the intersection fails.
 std::int32_t compute_level_zone(ZoneContext& context, double z, const Point2f* points,
                                 std::int32_t count);
 

@@ -56,9 +56,24 @@ inline std::size_t level_records(const RefLevel& l) {
   return l.rest.empty() ? 0 : n + l.rest.size() - 1;
 }
 
+// Rest material grown by `delta`: a contour of two distinct points (A, B, A)
+// bounds no area and grows into its stroke, which Clipper gives only as an
+// open path with round ends.
+inline cl::Paths grow_rest(const std::vector<RefPoly>& rest, double delta) {
+  cl::ClipperOffset co(2.0, kArcTolerance * kClipperScale);
+  for (const RefPoly& p : rest) {
+    const cl::Path path = to_path(p);
+    const bool stroke = path.size() == 2;
+    co.AddPath(path, cl::jtRound, stroke ? cl::etOpenRound : cl::etClosedPolygon);
+  }
+  cl::Paths out;
+  co.Execute(out, delta * kClipperScale);
+  return out;
+}
+
 // A level's own zones: its rest material grown and cut to its finishing region.
 inline cl::Paths level_zones(const RefLevel& l, double offsetDistance) {
-  return clip(to_paths(l.finishing), round_offset(to_paths(l.rest), offsetDistance), cl::ctIntersection);
+  return clip(to_paths(l.finishing), grow_rest(l.rest, offsetDistance), cl::ctIntersection);
 }
 
 // Final zones per level z (levels below the deepest one with zones absent);

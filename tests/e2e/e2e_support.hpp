@@ -90,6 +90,8 @@ class ProgramRun {
   static std::string binary() { return std::string(ZT_BINARY_DIR) + "/driver/restzones"; }
 
   std::string tmp() const { return dir_.file("tmp"); }
+  // A file of the run's directory outside $TMP.
+  std::string scratch(const std::string& name) const { return dir_.file(name); }
   std::string path(const std::string& name) const { return tmp() + "/" + name; }
   void put(const std::string& name, const Bytes& bytes) const { test::write_bytes(path(name), bytes); }
   void put(const std::string& name, const std::string& text) const { test::write_text(path(name), text); }
@@ -104,12 +106,14 @@ class ProgramRun {
   }
 
   // Runs the program; `setup` is shell text run before it (e.g. a trap),
-  // `wrapper` a command that starts it (e.g. prlimit with its options).
-  // Returns the exit status; kTimedOut for a hang, 128 + n for signal n.
-  int run(const std::string& setup = "", const std::string& wrapper = "") {
+  // `wrapper` a command that starts it (e.g. prlimit with its options, or
+  // env with other variables), `tracer` one that starts it under the time
+  // limit (e.g. strace). Returns the exit status; kTimedOut for a hang,
+  // 128 + n for signal n.
+  int run(const std::string& setup = "", const std::string& wrapper = "", const std::string& tracer = "") {
     const std::string cmd = "cd '" + tmp() + "' && " + setup + (setup.empty() ? "" : " && ") +
                             "KVLTMPDIR='" + tmp() + "' TXTPATH='" + tmp() + "' KVLLANG=fr " + wrapper + " timeout " +
-                            std::to_string(kRunTimeoutSeconds) + " '" + binary() + "' >'" + dir_.file("out.txt") +
+                            std::to_string(kRunTimeoutSeconds) + " " + tracer + " '" + binary() + "' >'" + dir_.file("out.txt") +
                             "' 2>'" + dir_.file("err.txt") + "' </dev/null";
     const int status = std::system(cmd.c_str());
     out = test::read_text(dir_.file("out.txt"));

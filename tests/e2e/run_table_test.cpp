@@ -5,6 +5,8 @@
 // way is known it is checked exactly. The file's header gives the format.
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
+
 #include "e2e/e2e_support.hpp"
 #include "support/case_rows.hpp"
 
@@ -71,6 +73,12 @@ void set_up(ProgramRun& r, const std::string& setup) {
     if (what == "dir") {
       std::filesystem::remove(r.path(file));
       std::filesystem::create_directory(r.path(file));
+    } else if (what == "fifo") {
+      std::filesystem::remove(r.path(file));
+      ASSERT_EQ(::mkfifo(r.path(file).c_str(), 0600), 0);
+    } else if (what.rfind("link:", 0) == 0) {
+      std::filesystem::remove(r.path(file));
+      std::filesystem::create_symlink(what.substr(5), r.path(file));
     } else {
       r.put(file, recipe(what, r.has(file) ? r.bytes(file) : Bytes{}));
     }

@@ -3,6 +3,8 @@
 // message file and the console echo of a running process: data/report.cases).
 #include "runtime/error_report.hpp"
 
+#include <sys/stat.h>
+
 #include <cctype>
 #include <cstdlib>
 #include <filesystem>
@@ -42,6 +44,22 @@ TEST_F(ErrorReportTest, StopOnErrorLeavesEmptyMarker) {
   }
   EXPECT_EQ(markers, 1);
   EXPECT_EQ(read_file("tmp/kvlerror.prg"), "Pas de Zones de Reprise");
+}
+
+// Why a marker could not be made, for the one line the program shows; and a
+// message file that is a FIFO without a reader fails at once, never waits.
+TEST_F(ErrorReportTest, FailuresSayWhyAndNeverWait) {
+  std::string reason;
+  set_env("KVLTMPDIR", path("missing"));
+  EXPECT_EQ(report_begin(nullptr, reason), -1);
+  EXPECT_NE(reason.find(path("missing") + "/erreur.tmp."), std::string::npos) << reason;
+  EXPECT_NE(reason.find("No such file or directory"), std::string::npos) << reason;
+  set_env("KVLTMPDIR", path("tmp"));
+  EXPECT_EQ(report_begin(nullptr, reason), 0);
+  EXPECT_EQ(reason, "");
+  EXPECT_EQ(report_end(), 0);
+  ASSERT_EQ(::mkfifo(path("tmp/kvlerror.prg").c_str(), 0600), 0);
+  EXPECT_EQ(report_message("x", 1), -1);
 }
 
 TEST_F(ErrorReportTest, FatalReportAndExitStatus) {

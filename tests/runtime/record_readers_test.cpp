@@ -5,9 +5,11 @@
 
 #include <gtest/gtest.h>
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/un.h>
 #include <unistd.h>
 
+#include <array>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -48,6 +50,13 @@ TEST_F(RecordReaders, OpenStatuses) {
   ASSERT_EQ(bind(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr), 0);
   EXPECT_EQ(r.openPoints(sock.c_str()), -3);
   ::close(fd);
+  // Nor does anything else that is not a regular file; a FIFO without a
+  // writer is refused at once instead of blocking the open.
+  const std::string fifo = dir.file("fifo");
+  ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
+  EXPECT_EQ(r.openPoints(fifo.c_str()), -3);
+  EXPECT_EQ(r.openPoints(dir.path().c_str()), -3);
+  EXPECT_EQ(r.openPoints("/dev/zero"), -3);
   EXPECT_EQ(r.close(), 0);
   EXPECT_EQ(r.readBytes(nullptr, 1), -2);
   EXPECT_EQ(r.seek(0, 0), -1);
@@ -71,6 +80,50 @@ TEST_F(RecordReaders, SegmentedRecordsAndSkipping) {
   EXPECT_EQ(r.nextRecord(buf.data(), 200), 2);
   EXPECT_EQ(r.nextRecord(buf.data(), 200), 0);
   EXPECT_EQ(r.recordsRead(), 4);
+}
+
+// A file of many buffers' worth: every point read by jumping to it, in a
+// scrambled order, is the one read in sequence, at the same position, and
+// records of several segments come whole across buffer boundaries.
+TEST_F(RecordReaders, JumpsAgreeWithSequentialReadingAcrossBuffers) {
+  constexpr int kPoints = 9000;  // 18-byte records: about 180 KiB
+  std::vector<std::string> records;
+  for (int i = 0; i < kPoints; ++i) {
+    std::string r = xyz(static_cast<float>(i), static_cast<float>(-i), 0.5f * static_cast<float>(i % 7));
+    r += std::string("\x15\xfc\xff\xff\x01\x00", 6);  // code -1003, flag 1
+    records.push_back(r);
+  }
+  CKvlBinaryResFileReader r;
+  ASSERT_EQ(r.openPoints(write("many", file_of(records)).c_str()), 0);
+  ASSERT_EQ(r.recordCount(), kPoints);
+  std::vector<std::array<float, 3>> seq;
+  std::vector<std::int64_t> at;
+  float x, y, z;
+  for (std::int64_t n; at.push_back(r.tell()), (n = r.readPoint(x, y, z)) > 0;) {
+    ASSERT_EQ(n, static_cast<std::int64_t>(seq.size()) + 1);
+    seq.push_back({x, y, z});
+  }
+  ASSERT_EQ(seq.size(), static_cast<std::size_t>(kPoints));
+  std::int32_t code = 0;
+  std::int16_t flag = 0;
+  for (std::int64_t k = 0, n = 1; k < kPoints; ++k, n = (n * 7919) % kPoints + 1) {
+    ASSERT_EQ(r.seekToPoint(n), 0);
+    ASSERT_EQ(r.tell(), at[static_cast<std::size_t>(n - 1)]) << n;  // past the pending length byte
+    ASSERT_EQ(r.readPoint(x, y, z, &code, &flag), n);
+    EXPECT_EQ((std::array<float, 3>{x, y, z}), seq[static_cast<std::size_t>(n - 1)]) << n;
+    EXPECT_EQ(code, -1003);
+    EXPECT_EQ(flag, 1);
+  }
+  std::vector<std::string> long_records(600, std::string(300, '\0'));
+  for (std::size_t i = 0; i < long_records.size(); ++i) long_records[i][i % 300] = static_cast<char>(1 + i % 250);
+  CZi4UnformattedSequentialFileReader q;
+  ASSERT_EQ(q.openSequential(write("long", file_of(long_records)).c_str()), 0);
+  std::vector<char> buf(300);
+  for (const std::string& want : long_records) {
+    ASSERT_EQ(q.nextRecord(buf.data(), 300), 300);
+    EXPECT_EQ(std::string(buf.data(), 300), want);
+  }
+  EXPECT_EQ(q.nextRecord(buf.data(), 300), 0);
 }
 
 // The sequential reader reports damage the same way; without a handler the

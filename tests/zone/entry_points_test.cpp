@@ -100,8 +100,9 @@ TEST_F(EntryPoints, ZstockDistanceIsReadOnceOnTheFirstLevel) {
 
 TEST_F(EntryPoints, FailuresOfALevel) {
   ASSERT_EQ(init({10, 5}), 0);
-  // Nothing to feed: no zone region, the intersection refuses it.
-  EXPECT_EQ(add(10.0f, stock_points({{{1, 1}, {1.0005f, 1}}})), -1);
+  // Nothing to feed: no zone region, no zones, no failure.
+  EXPECT_EQ(add(10.0f, stock_points({{{1, 1}, {1.0005f, 1}}})), 0);
+  EXPECT_TRUE(result().empty());
   // Disjoint from the finishing region: nothing stored, no failure.
   EXPECT_EQ(add(10.0f, stock_points({rectangle(200, 200, 220, 220)})), 0);
   EXPECT_EQ(zone_builder().pointsWritten, 0);
@@ -139,6 +140,19 @@ TEST_F(EntryPoints, AFullDiskFailsTheLevel) {
   std::filesystem::create_symlink("/dev/full", path("temp1"));
   ASSERT_EQ(init({10}), 0);
   EXPECT_EQ(add(10.0f, rest), -1);
+}
+
+// On the real engines: a sliver that the feed's thinning collapses to a
+// there-and-back contour grows into its stroke; rest material that grows
+// into no curve gives its level no zones, and the level does not fail.
+TEST_F(EntryPoints, DegenerateRestMaterialGivesItsStrokeOrNoZones) {
+  set_offset_engine(nullptr);
+  ASSERT_EQ(init({10, 5}), 0);
+  ASSERT_EQ(add(10.0f, stock_points({{{10, 50}, {20, 50.0004f}, {30, 50}, {20, 49.9996f}, {10, 50}}})), 0);
+  const std::array<float, 4> stroke{9, 49, 31, 51};
+  for (int i = 0; i < 4; ++i) EXPECT_NEAR(box_of(result())[i], stroke[i], 0.01) << i;
+  ASSERT_EQ(add(5.0f, stock_points({{{1, 1}, {1.0005f, 1}, {1, 1.0005f}, {1, 1}}})), 0);
+  EXPECT_TRUE(result().empty());
 }
 
 // The pocket [0, 100]^2 with rest material [40, 60]^2, offset distance 1,

@@ -88,39 +88,79 @@ void Push(std::int32_t edge, std::int32_t node) {
   Offs().stack.Append(TraversalEntry{edge, node}, kTraversalGrowth);
 }
 
-// Visits edge e (reached at one of its ends): clears its flag, lists it when
-// wanted, and continues through its far node `across`.
-void Reach(std::int32_t e, std::int32_t across, bool wanted) {
+// Takes edge e into the current part: clears its flag and lists it.
+void Take(std::int32_t e) {
   OffsetState& o = Offs();
-  if (e < 0 || !o.candidate[e]) return;
   o.candidate[e] = 0;
-  const EdgeRecord& r = Vd().edges[e];
-  if (wanted && e >= kFirstInnerEdge && Qualifies(r)) o.workList.Append(e, kTraversalGrowth);
-  Push(e, across);
+  o.component.Append(e, kTraversalGrowth);
 }
 
 // Flood fill of the part of the diagram around edge e0 bounded by the input
-// segments (nodes of zero clearance are never passed).
-void ClassifyFrom(std::int32_t e0, std::int32_t start, bool wanted) {
+// segments (nodes of zero clearance are never passed): one face of the
+// input, whose edges end up in `component`.
+void CollectPart(std::int32_t e0, std::int32_t start) {
   Engine& g = Vd();
   OffsetState& o = Offs();
   o.stack.count = 0;
-  const EdgeRecord& r0 = g.edges[e0];
-  const std::int32_t far = OtherNode(r0, start);
-  o.candidate[e0] = 0;
-  if (wanted && Qualifies(r0)) o.workList.Append(e0, kTraversalGrowth);
+  o.component.count = 0;
+  Take(e0);
   Push(e0, start);
-  Push(e0, far);
+  Push(e0, OtherNode(g.edges[e0], start));
   while (o.stack.count > 0) {
     const TraversalEntry t = o.stack[--o.stack.count];
     if (g.nodes[t.node].r <= kOffsetZero) continue;
     const EdgeRecord& r = g.edges[t.edge];
     const std::int32_t ccw = CcwAt(r, t.node), cw = CwAt(r, t.node);
     for (const std::int32_t f : {ccw, cw}) {
-      if (f < 0 || !ValidEdge(f)) continue;
-      Reach(f, OtherNode(g.edges[f], t.node), wanted);
+      if (f < 0 || !ValidEdge(f) || !o.candidate[f]) continue;
+      Take(f);
+      Push(f, OtherNode(g.edges[f], t.node));
     }
   }
+}
+
+// Sides of a segment that the current part lies on.
+constexpr std::uint8_t kOnLeft = 1;
+constexpr std::uint8_t kOnRight = 2;
+
+// Notes the side of segment `seg` on which edge r (one of its region's
+// edges) lies, judged at r's node of larger clearance.
+void NoteSide(const EdgeRecord& r, std::int32_t seg) {
+  Engine& g = Vd();
+  OffsetState& o = Offs();
+  const NodeRecord& n = g.nodes[g.nodes[r.n1].r >= g.nodes[r.n2].r ? r.n1 : r.n2];
+  if (n.r <= kOffsetZero) return;
+  const SegmentRecord& s = g.segments[seg];
+  const double side = s.a * n.x + s.b * n.y + s.c;
+  if (std::fabs(side) <= kOffsetZero) return;
+  std::uint8_t& m = o.segmentSides[seg];
+  if (m == 0) o.bordered.Append(seg, kTraversalGrowth);
+  m |= side > 0.0 ? kOnLeft : kOnRight;
+}
+
+// Whether the current part lies on the wanted side of the input. A segment
+// with the part on both of its sides (a spike, a there-and-back contour, an
+// open polyline) lies on both sides of it and decides nothing; the others
+// decide by their lengths, so the answer is the same whatever edge the part
+// was reached from. A part bordered only by such two-sided segments lies on
+// both sides: its offsets are strokes around them.
+bool PartOnSide(bool left) {
+  Engine& g = Vd();
+  OffsetState& o = Offs();
+  for (std::int32_t i = 0; i < o.component.count; ++i) {
+    const EdgeRecord& r = g.edges[o.component[i]];
+    if (r.ltype == SEG && r.lft >= 0) NoteSide(r, r.lft);
+    if (r.rtype == SEG && r.rgt >= 0) NoteSide(r, r.rgt);
+  }
+  double leftLength = 0.0, rightLength = 0.0;
+  for (std::int32_t i = 0; i < o.bordered.count; ++i) {
+    std::uint8_t& m = o.segmentSides[o.bordered[i]];
+    if (m == kOnLeft) leftLength += g.segments[o.bordered[i]].length;
+    if (m == kOnRight) rightLength += g.segments[o.bordered[i]].length;
+    m = 0;
+  }
+  o.bordered.count = 0;
+  return left ? leftLength >= rightLength : rightLength >= leftLength;
 }
 
 }  // namespace
@@ -159,6 +199,9 @@ void InitializeEdgeData(bool left, bool right) {
     for (std::int32_t e = kFirstInnerEdge; e < n; ++e)
       if (Qualifies(g.edges[e])) o.workList.Append(e, kTraversalGrowth);
   } else {
+    o.segmentSides.Reserve(std::int64_t{g.segments.count} + 1);
+    o.segmentSides.count = g.segments.count;
+    for (std::int32_t k = 0; k < g.segments.count; ++k) o.segmentSides[k] = 0;
     for (std::int32_t e = kFirstInnerEdge; e < n; ++e) {
       if (!o.candidate[e]) continue;
       const EdgeRecord& r = g.edges[e];
@@ -168,14 +211,14 @@ void InitializeEdgeData(bool left, bool right) {
         continue;
       }
       if (r.ltype != SEG && r.rtype != SEG) continue;
-      const std::int32_t seg = r.ltype == SEG ? r.lft : r.rgt;
       const std::int32_t start = g.nodes[r.n1].r >= g.nodes[r.n2].r ? r.n1 : r.n2;
-      const NodeRecord& sn = g.nodes[start];
-      if (sn.r <= kOffsetZero) continue;
-      const SegmentRecord& s = g.segments[seg];
-      const double side = s.a * sn.x + s.b * sn.y + s.c;
-      const bool wanted = left ? side > 0.0 : side < 0.0;
-      ClassifyFrom(e, start, wanted);
+      if (g.nodes[start].r <= kOffsetZero) continue;
+      CollectPart(e, start);
+      if (!PartOnSide(left)) continue;
+      for (std::int32_t i = 0; i < o.component.count; ++i) {
+        const std::int32_t f = o.component[i];
+        if (f >= kFirstInnerEdge && Qualifies(g.edges[f])) o.workList.Append(f, kTraversalGrowth);
+      }
     }
   }
   for (std::int32_t e = 0; e < n; ++e) o.candidate[e] = e >= kFirstInnerEdge ? 1 : 0;
@@ -188,6 +231,8 @@ void ResetOffsetState() {
   o.data.count = 0;
   o.workList.count = 0;
   o.stack.count = 0;
+  o.component.count = 0;
+  o.bordered.count = 0;
   o.finished = true;
   o.written = false;
   o.failed = false;
@@ -204,6 +249,9 @@ void FreeOffsetState() {
   o.data.Free();
   o.workList.Free();
   o.stack.Free();
+  o.component.Free();
+  o.bordered.Free();
+  o.segmentSides.Free();
 }
 
 }  // namespace zt::vd

@@ -48,6 +48,11 @@ struct OffsetState {
   RecordArray<OffsetEdgeData> data;
   RecordArray<std::int32_t> workList;
   RecordArray<TraversalEntry> stack;
+  // Side classification of one part of the diagram: its edges, the segments
+  // it borders and, per segment, the sides it lies on (kSideLeft|kSideRight).
+  RecordArray<std::int32_t> component;
+  RecordArray<std::int32_t> bordered;
+  RecordArray<std::uint8_t> segmentSides;
   double distance = 0.0;  // internal units
   double step = 0.0;
   bool finished = true;
