@@ -6,12 +6,12 @@
 
 #include <malloc.h>
 #include <sys/wait.h>
+#include <time.h>
 #include <unistd.h>
 
 #include <benchmark/benchmark.h>
 
 #include <algorithm>
-#include <chrono>
 #include <fstream>
 #include <functional>
 #include <string>
@@ -68,14 +68,19 @@ inline void timed_case(benchmark::State& state, const std::function<void()>& rel
 // from fresh memory (`release` runs after ours; the peer frees its own). On
 // a shared machine whose speed drifts by tens of percent between runs, the
 // two halves of a pair see the same machine, so the ratio within pairs is
-// the figure to quote. Counters: ours_ms and peer_ms (the best of each),
+// the figure to quote. Times are the thread's processor time. Counters:
+// ours_ms and peer_ms (the best of each),
 // ratio (best over best) and ratio_median (the median within pairs).
 inline void paired_case(benchmark::State& state, const std::function<void()>& release,
                         const std::function<void()>& ours, const std::function<void()>& peer) {
+  // Processor time of this thread: on a machine shared with other jobs the
+  // wall clock also counts the time the thread waited for a core.
   const auto seconds = [](const std::function<void()>& run) {
-    const auto start = std::chrono::steady_clock::now();
+    timespec t0{}, t1{};
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &t0);
     run();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+    clock_gettime(CLOCK_THREAD_CPUTIME_ID, &t1);
+    return double(t1.tv_sec - t0.tv_sec) + 1e-9 * double(t1.tv_nsec - t0.tv_nsec);
   };
   std::vector<double> a, b, within;
   for (auto _ : state) {

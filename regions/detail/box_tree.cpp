@@ -1,6 +1,9 @@
 // Finishing a polygon set: its contours' points become grid vertices, its
-// consecutive distinct vertices edges with integer boxes, and the boxes are
-// indexed by a box tree split at the median of the longer side.
+// consecutive distinct vertices edges with their exact extents as boxes, and
+// the boxes are indexed by a box tree split at the median of the longer side.
+// Exact extents keep the tree as fine as the data however far apart its
+// pieces lie: no rounding to a fixed fraction of the joint box can put a
+// dense contour's boxes on top of each other.
 #include <algorithm>
 #include <cmath>
 #include <new>
@@ -10,16 +13,6 @@
 
 namespace zt::detail {
 
-std::int32_t box_coordinate(double v, std::int32_t pad) {
-  double f = kBoxUnitsPerSquare * v;
-  if (!(f > -kIndexClamp)) f = std::isnan(f) ? 0.0 : -kIndexClamp;
-  if (f > kIndexClamp) f = kIndexClamp;
-  // floor by truncation, one step down for negative non-integers
-  std::int32_t i = static_cast<std::int32_t>(f);
-  if (i > f) --i;
-  return i + pad;
-}
-
 namespace {
 
 int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
@@ -28,17 +21,16 @@ int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   *edge = Edge{from, to, nullptr, static_cast<std::uint32_t>(tag)};
   EdgeBox* box = e.boxes.take();
   if (!box) return -1;
-  const bool xUp = from->x < to->x, yUp = from->y < to->y;
-  box->xmin = box_coordinate(xUp ? from->x : to->x, -1);
-  box->xmax = box_coordinate(xUp ? to->x : from->x, 1);
-  box->ymin = box_coordinate(yUp ? from->y : to->y, -1);
-  box->ymax = box_coordinate(yUp ? to->y : from->y, 1);
+  box->xmin = std::min(from->x, to->x);
+  box->xmax = std::max(from->x, to->x);
+  box->ymin = std::min(from->y, to->y);
+  box->ymax = std::max(from->y, to->y);
   box->edge = edge;
   return 0;
 }
 
 template <bool kByX>
-int key_of(const EdgeBox& b) {
+double key_of(const EdgeBox& b) {
   return kByX ? b.xmin : b.ymin;
 }
 
@@ -49,7 +41,7 @@ std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, st
   // the pivot and swap them, so runs of equal keys split evenly instead of
   // degrading into one-element steps.
   while (hi - lo >= kLeafSpan) {
-    const int pivot = key_of<kByX>(boxes[m]);
+    const double pivot = key_of<kByX>(boxes[m]);
     std::int32_t i = lo, j = hi;
     while (i <= j) {
       while (++comparisons, key_of<kByX>(boxes[i]) < pivot) ++i;
@@ -79,18 +71,15 @@ std::int64_t select_on_axis(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, st
   return comparisons;
 }
 
-// Builds the node over boxes[first..last] of the scratch copy; `base` is the
-// pool index of the scratch's first box, so node ranges are pool indexes.
-BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std::int32_t first,
-                        std::int32_t last) {
+// Builds the node over boxes[first..last] of the tree copy.
+BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t first, std::int32_t last) {
   BoxTreeNode* node = e.nodes.take();
   if (!node) return nullptr;
   *node = BoxTreeNode{};
-  node->first = base + first;
-  node->last = base + last;
+  node->first = first;
+  node->last = last;
   const EdgeBox& b0 = boxes[first];
-  node->xmin = b0.xmin, node->ymin = b0.ymin, node->xmax = b0.xmax, node->ymax = b0.ymax;
-  std::int32_t xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
+  double xmin = b0.xmin, ymin = b0.ymin, xmax = b0.xmax, ymax = b0.ymax;
   for (std::int32_t i = first + 1; i <= last; ++i) {
     const EdgeBox& b = boxes[i];
     xmin = std::min(xmin, b.xmin);
@@ -100,32 +89,33 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t base, std
   }
   node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
   if (last - first <= kLeafSpan) return node;
-  const bool byX = std::int64_t{node->xmax} - node->xmin > std::int64_t{node->ymax} - node->ymin;
+  const bool byX = node->xmax - node->xmin > node->ymax - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
   select_median(boxes, first, last, m, byX);
-  node->low = build_node(e, boxes, base, first, m);
+  node->low = build_node(e, boxes, first, m);
   if (!node->low) return nullptr;
-  node->high = build_node(e, boxes, base, m + 1, last);
+  node->high = build_node(e, boxes, m + 1, last);
   if (!node->high) return nullptr;
   return node;
 }
 
 // The tree is built on a contiguous copy of the set's boxes (the selection
-// moves them a lot), which is then written back in its new order.
+// moves them a lot), which the walks then read: the copy holds both sets'
+// boxes, indexed like the pool.
 int build_tree(BooleanEngine& e, PolygonSet& set) {
-  const std::int32_t n = set.lastBox - set.firstBox + 1;
-  if (n > e.boxScratchCapacity) {
-    delete[] e.boxScratch;
-    e.boxScratch = nullptr;
-    e.boxScratchCapacity = 0;
+  const std::int32_t need = set.lastBox + 1;
+  if (need > e.treeBoxCapacity) {
     if (!allocationAllowed()) return -1;
-    e.boxScratch = new (std::nothrow) EdgeBox[static_cast<std::size_t>(n)];
-    if (!e.boxScratch) return -1;
-    e.boxScratchCapacity = n;
+    const std::int32_t capacity = std::max(need, 2 * e.treeBoxCapacity);
+    EdgeBox* grown = new (std::nothrow) EdgeBox[static_cast<std::size_t>(capacity)];
+    if (!grown) return -1;
+    std::copy(e.treeBoxes, e.treeBoxes + set.firstBox, grown);
+    delete[] e.treeBoxes;
+    e.treeBoxes = grown;
+    e.treeBoxCapacity = capacity;
   }
-  for (std::int32_t i = 0; i < n; ++i) e.boxScratch[i] = e.boxes[set.firstBox + i];
-  set.root = build_node(e, e.boxScratch, set.firstBox, 0, n - 1);
-  for (std::int32_t i = 0; i < n; ++i) e.boxes[set.firstBox + i] = e.boxScratch[i];
+  for (std::int32_t i = set.firstBox; i <= set.lastBox; ++i) e.treeBoxes[i] = e.boxes[i];
+  set.root = build_node(e, e.treeBoxes, set.firstBox, set.lastBox);
   return set.root ? 0 : -1;
 }
 

@@ -30,7 +30,7 @@ BooleanEngine::~BooleanEngine() {
   }
   delete grid.vertices;
   delete[] grid.buckets;
-  delete[] boxScratch;
+  delete[] treeBoxes;
   delete[] splitScratch;
   delete[] pointScratch;
   delete[] pending;
@@ -66,6 +66,8 @@ struct ThreadEngineHolder {
 thread_local ThreadEngineHolder tl_engine;
 
 }  // namespace
+
+BooleanEngine* last_thread_engine() { return tl_engine.engine.get(); }
 
 BooleanEngine* thread_engine() {
   if (!tl_engine.engine) {

@@ -27,23 +27,35 @@ inline constexpr double kSnapQuantum = 0x1p-48;
 inline constexpr double kEngineEpsilon = 2 * kSnapQuantum;
 // A record with x above this ends a contour; one at or above it never starts one.
 inline constexpr double kSeparatorThreshold = 99990.0;
-// Grid cell and box unit: 1/1000 of the normalised square.
+// Grid cell of the vertex grid's tie rule: 1/1000 of the normalised square.
 inline constexpr double kGridCell = 0.001;
-inline constexpr double kBoxUnitsPerSquare = 1000.0;
-// Cells of the vertex index proper: fine enough that densely sampled
-// contours put only a few points in one, and laid onto the bucket table in
-// tiles of 2^kFineTileBits cells a side so that neighbours share cache lines.
-inline constexpr double kFineCell = 0x1p-14;
+// Edges whose exact extents are farther apart than this cannot meet: every
+// point the intersection routine returns lies within the tolerance of both
+// segments. Box trees compare extents with this margin (boxes_near).
+inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
+// Cells of the vertex index proper, 2^-shift wide: they start at
+// 2^-kCoarsestFineShift, fine enough that densely sampled contours put only a
+// few points in one, and are laid onto the bucket table in tiles of
+// 2^kFineTileBits cells a side so that neighbours share cache lines. A lookup
+// that walks more than kMaxLookupVisits vertices makes the cells finer by
+// kFineShiftStep bits (down to 2^-kFinestFineShift, twice the tolerance,
+// where a cell holds at most nine vertices), so a piece that is tiny beside
+// the joint box cannot pile its points into one cell.
+inline constexpr std::int32_t kCoarsestFineShift = 14;
+inline constexpr std::int32_t kFinestFineShift = 46;
+inline constexpr std::int32_t kFineShiftStep = 4;
+inline constexpr std::int32_t kMaxLookupVisits = 24;
 inline constexpr std::uint64_t kFineTileBits = 9;
 inline constexpr std::int32_t kMinFineBuckets = 1024;
+// Fine cell indexes are clamped to this magnitude (far outside the square
+// at every shift).
+inline constexpr double kFineIndexClamp = 0x1p62;
 // Cell indexes and box bounds are clamped to this magnitude so that points far
 // outside the normalised square (read, but not counted by the bounding box)
 // still give well-defined integer keys.
 inline constexpr double kIndexClamp = 1073741824.0;  // 2^30
 // A box-tree node holding at most this many boxes beyond its first is a leaf.
-inline constexpr std::int32_t kLeafSpan = 20;
-// Upper x bound of a ray query box (box units).
-inline constexpr std::int32_t kRayBoxXmax = 99999001;
+inline constexpr std::int32_t kLeafSpan = 8;
 // Inputs beyond this magnitude (or not finite) are refused.
 inline constexpr double kMaxInputMagnitude = 1e15;
 
@@ -63,12 +75,15 @@ using ContourPool = ChunkPool<InputContour>;
 // one, and within it the vertex created last.
 struct VertexGrid {
   std::int32_t bucketMask = 0;  // bucket count - 1, a power of two
+  std::int32_t fineShift = kCoarsestFineShift;
+  double fineScale = 0x1p14;  // 2^fineShift, fine cells per unit
   VertexPool* vertices = nullptr;  // created at the first sizing
   Vertex** buckets = nullptr;
   Vertex* sharedHead = nullptr;
   double originX = 0.0, originY = 0.0;
   double cell = kGridCell;
   double eps = kEngineEpsilon;
+  std::int64_t visits = 0;
 };
 
 // Direction of a segment: its vector and length.
@@ -124,9 +139,10 @@ struct BooleanEngine {
   BoxTreeNode queryBox;
   IntersectionProbe probe;
   VertexGrid grid;
-  // Contiguous copy of one set's boxes while its tree is built.
-  EdgeBox* boxScratch = nullptr;
-  std::int32_t boxScratchCapacity = 0;
+  // Both sets' boxes in their trees' order, contiguous, indexed like the
+  // box pool (the trees' ranges index it; the walks read it).
+  EdgeBox* treeBoxes = nullptr;
+  std::int32_t treeBoxCapacity = 0;
   // The crossings found on one edge while its split list is settled.
   SplitCandidate* splitScratch = nullptr;
   std::int32_t splitScratchCapacity = 0;
@@ -144,6 +160,8 @@ struct BooleanEngine {
   TaggedPointList output;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
+  // Box pairs compared at leaf pairs by the last intersection walk.
+  std::int64_t leafPairTests = 0;
 
   BooleanEngine();
   ~BooleanEngine();
@@ -158,6 +176,9 @@ BooleanEngine* prepare_thread_engine();
 // The calling thread's engine as it is, created on first use; null if it
 // cannot be created.
 BooleanEngine* thread_engine();
+// The calling thread's engine as its last operation left it (null before
+// the first), for the checks that count an operation's work.
+BooleanEngine* last_thread_engine();
 void reset_set(BooleanEngine& e, PolygonSet& set);
 
 // ---- operands (operands.cpp)
@@ -195,20 +216,27 @@ void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// What a lookup of v's own coordinates by a crossing does: v becomes shared.
+void grid_share(VertexGrid& g, Vertex* v);
 // Bucket of a fine cell, never outside the table whatever the cell's sign.
 std::int32_t grid_bucket_of(const VertexGrid& g, std::int64_t row, std::int64_t column);
+// Vertices walked by the lookups since the grid was sized (the cost that the
+// refinement of the fine cells keeps linear).
+std::int64_t grid_visit_count(const VertexGrid& g);
 // Cell of a coordinate, clamped to +-kIndexClamp.
 std::int64_t grid_cell_index(double v, double origin, double cell);
 
 // ---- edges and box trees (box_tree.cpp)
 int finish_set(BooleanEngine& e, PolygonSet& set);
-std::int32_t box_coordinate(double v, std::int32_t pad);
 // Reorders boxes[lo..hi] so that position m holds the key of rank m; returns
 // the number of key comparisons made (for the linear-time checks).
 std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX);
-inline bool boxes_overlap(std::int32_t axmin, std::int32_t aymin, std::int32_t axmax, std::int32_t aymax,
-                          std::int32_t bxmin, std::int32_t bymin, std::int32_t bxmax, std::int32_t bymax) {
-  return axmin < bxmax && axmax > bxmin && aymin < bymax && aymax > bymin;
+// Extents within kPairRejectMargin of each other on both axes (works for
+// edge boxes, tree nodes and the ray query alike).
+template <typename A, typename B>
+inline bool boxes_near(const A& a, const B& b) {
+  const double m = kPairRejectMargin;
+  return !(a.xmin > b.xmax + m || b.xmin > a.xmax + m || a.ymin > b.ymax + m || b.ymin > a.ymax + m);
 }
 
 // ---- overlay (intersections.cpp, half_edges.cpp)

@@ -1,10 +1,11 @@
 // Finding the meeting points of the two operands: a dual walk of their box
-// trees reaches every pair of edges (one of each operand) whose boxes overlap
-// strictly; each meeting point becomes a shared vertex and a split point on
-// both edges (split_lists.cpp).
+// trees reaches every pair of edges (one of each operand) whose extents lie
+// within kPairRejectMargin of each other; each meeting point becomes a shared
+// vertex and a split point on both edges (split_lists.cpp).
 #include <algorithm>
 #include <cmath>
 #include <new>
+#include <initializer_list>
 
 #include "regions/detail/engine.hpp"
 #include "regions/detail/geometry.hpp"
@@ -13,18 +14,15 @@ namespace zt::detail {
 
 namespace {
 
-// Edges whose exact extents are farther apart than this cannot meet: every
-// point the intersection routine returns lies within the tolerance of both
-// segments. The integer boxes are much coarser (a unit is 1/1000), so this
-// check spares most calls of the routine.
-inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
-
-bool extents_apart(const Edge& a, const Edge& b) {
-  const double m = kPairRejectMargin;
-  return std::min(a.start->x, a.end->x) > std::max(b.start->x, b.end->x) + m ||
-         std::min(b.start->x, b.end->x) > std::max(a.start->x, a.end->x) + m ||
-         std::min(a.start->y, a.end->y) > std::max(b.start->y, b.end->y) + m ||
-         std::min(b.start->y, b.end->y) > std::max(a.start->y, a.end->y) + m;
+// The endpoint of either edge that lies exactly at R, if any. Vertices are
+// pairwise at least the tolerance apart, so a lookup of an endpoint's own
+// coordinates could only return that endpoint: meeting points at shared
+// corners and along coincident edges (most of them, where the operands
+// share a boundary) need no lookup.
+Vertex* endpoint_at(const Edge& a, const Edge& b, const Point2d& R) {
+  for (Vertex* v : {a.start, a.end, b.start, b.end})
+    if (v->x == R.x && v->y == R.y) return v;
+  return nullptr;
 }
 
 // Collinear overlaps found by the walk, to share their split points later.
@@ -85,8 +83,6 @@ int share_overlap_splits(BooleanEngine& e) {
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
   pr.retryReversed = 0;
-  if (extents_apart(first, second)) return 0;
-  pr.retryReversed = 0;
   pr.p0 = {first.start->x, first.start->y};
   pr.p1 = {first.end->x, first.end->y};
   pr.q0 = {second.start->x, second.start->y};
@@ -102,8 +98,13 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   const double uBx = pr.dirB.dx / pr.dirB.length, uBy = pr.dirB.dy / pr.dirB.length;
   for (int r = 0; r < k; ++r) {
     const Point2d& R = r == 0 ? pr.r1 : pr.r2;
-    Vertex* v = grid_lookup(*pr.grid, R.x, R.y, kSharedOwner);
-    if (!v) return -1;
+    Vertex* v = endpoint_at(first, second, R);
+    if (v) {
+      grid_share(*pr.grid, v);
+    } else {
+      v = grid_lookup(*pr.grid, R.x, R.y, kSharedOwner);
+      if (!v) return -1;
+    }
     const double tA = ((R.x - pr.p0.x) * uAx + (R.y - pr.p0.y) * uAy) / pr.dirA.length;
     const double tB = ((R.x - pr.q0.x) * uBx + (R.y - pr.q0.y) * uBy) / pr.dirB.length;
     if (record_split(*pr.splits, first, tA, v) != 0) return -1;
@@ -112,12 +113,8 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   return 0;
 }
 
-bool nodes_overlap(const BoxTreeNode& a, const BoxTreeNode& b) {
-  return boxes_overlap(a.xmin, a.ymin, a.xmax, a.ymax, b.xmin, b.ymin, b.xmax, b.ymax);
-}
-
 int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
-  if (!nodes_overlap(*a, *b)) return 0;
+  if (!boxes_near(*a, *b)) return 0;
   if (a->low && b->low) {
     if (walk(e, a->low, b->low) || walk(e, a->low, b->high) || walk(e, a->high, b->low) ||
         walk(e, a->high, b->high))
@@ -126,11 +123,12 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
   }
   if (a->low) return (walk(e, a->low, b) || walk(e, a->high, b)) ? -1 : 0;
   if (b->low) return (walk(e, a, b->low) || walk(e, a, b->high)) ? -1 : 0;
+  e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
   for (std::int32_t i = a->first; i <= a->last; ++i) {
-    const EdgeBox& bi = e.boxes[i];
+    const EdgeBox& bi = e.treeBoxes[i];
     for (std::int32_t j = b->first; j <= b->last; ++j) {
-      const EdgeBox& bj = e.boxes[j];
-      if (!boxes_overlap(bi.xmin, bi.ymin, bi.xmax, bi.ymax, bj.xmin, bj.ymin, bj.xmax, bj.ymax)) continue;
+      const EdgeBox& bj = e.treeBoxes[j];
+      if (!boxes_near(bi, bj)) continue;
       if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
       if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;
     }
@@ -144,6 +142,7 @@ int find_intersections(BooleanEngine& e) {
   e.probe.mode = 1;
   if (!e.a.root || !e.b.root) return -1;
   e.overlapCount = 0;
+  e.leafPairTests = 0;
   int rc = walk(e, e.a.root, e.b.root);
   for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
   if (rc == 0 && e.overlapCount > 0) rc = share_overlap_splits(e);

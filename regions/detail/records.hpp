@@ -39,14 +39,15 @@ struct Edge {
   std::int32_t open = 0;
 };
 
-// Box of an edge in integer units of 1/1000 of the normalised square.
+// Exact extent of an edge (normalised coordinates). Boxes are compared with
+// a margin (boxes_near), so no rounding of theirs can lose a meeting.
 struct EdgeBox {
-  std::int32_t xmin = 0, ymin = 0, xmax = 0, ymax = 0;
+  double xmin = 0.0, ymin = 0.0, xmax = 0.0, ymax = 0.0;
   Edge* edge = nullptr;
 };
 
 struct BoxTreeNode {
-  std::int32_t xmin = 0, ymin = 0, xmax = 0, ymax = 0;
+  double xmin = 0.0, ymin = 0.0, xmax = 0.0, ymax = 0.0;
   BoxTreeNode* low = nullptr;  // both null in a leaf
   BoxTreeNode* high = nullptr;
   std::int32_t first = 0;  // inclusive range of box indexes

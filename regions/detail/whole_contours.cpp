@@ -2,6 +2,7 @@
 // the parity of the crossings of a ray from their first point towards +x with
 // the other operand's edges.
 #include <cmath>
+#include <limits>
 
 #include "regions/detail/engine.hpp"
 
@@ -18,7 +19,7 @@ bool meets(const Edge& edge, const Vertex* v) {
 
 void count_in_node(BooleanEngine& e, const BoxTreeNode* node, const Vertex* skip) {
   const BoxTreeNode& q = e.queryBox;
-  if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, node->xmin, node->ymin, node->xmax, node->ymax)) return;
+  if (!boxes_near(q, *node)) return;
   if (node->low) {
     count_in_node(e, node->low, skip);
     count_in_node(e, node->high, skip);
@@ -26,8 +27,8 @@ void count_in_node(BooleanEngine& e, const BoxTreeNode* node, const Vertex* skip
   }
   IntersectionProbe& pr = e.probe;
   for (std::int32_t i = node->first; i <= node->last; ++i) {
-    const EdgeBox& b = e.boxes[i];
-    if (!boxes_overlap(q.xmin, q.ymin, q.xmax, q.ymax, b.xmin, b.ymin, b.xmax, b.ymax)) continue;
+    const EdgeBox& b = e.treeBoxes[i];
+    if (!boxes_near(q, b)) continue;
     const Edge& edge = *b.edge;
     if (edge.open || (skip && meets(edge, skip))) continue;
     pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
@@ -43,10 +44,11 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
   pr.qx = px;
   pr.qy = py;
   BoxTreeNode& q = e.queryBox;
-  q.xmin = box_coordinate(px, -1);
-  q.ymin = box_coordinate(py, -1);
-  q.xmax = kRayBoxXmax;
-  q.ymax = box_coordinate(py, 1);
+  // The ray itself: an edge it crosses reaches below and above py and to
+  // the right of px, so its box is near this one.
+  q.xmin = px;
+  q.xmax = std::numeric_limits<double>::max();
+  q.ymin = q.ymax = py;
   if (set.root) count_in_node(e, set.root, skip);
   return pr.crossingCount;
 }

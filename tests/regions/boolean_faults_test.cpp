@@ -115,7 +115,7 @@ TEST(BooleanMendedFaults, MedianSelectionIsLinearOnManyEqualKeys) {
     std::vector<detail::EdgeBox> boxes(n);
     for (int i = 0; i < n; ++i) {
       const int key = pattern == 0 ? 7 : pattern == 1 ? i / 2 : pattern == 2 ? i % 2 : (n - i) / 3;
-      boxes[i] = detail::EdgeBox{key, 0, key + 1, 1, nullptr};
+      boxes[i] = detail::EdgeBox{double(key), 0, double(key + 1), 1, nullptr};
     }
     const int m = (n - 1) / 2;
     const std::int64_t comparisons = detail::select_median(boxes.data(), 0, n - 1, m, true);

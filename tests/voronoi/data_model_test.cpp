@@ -2,6 +2,10 @@
 // size; the allocation failure report.
 #include <gtest/gtest.h>
 
+#include <cstdio>
+#include <string>
+#include <vector>
+
 #include "vd_test_util.hpp"
 #include "voronoi/detail/diagram.hpp"
 
@@ -22,10 +26,13 @@ TEST(DataModel, TemporaryDegree2NodesAreFoldedBackOut) {
   Engine& g = Vd();
   const std::int32_t usedEdges = g.edges.count - g.freeEdges.count;
   const std::int32_t usedNodes = g.nodes.count - g.freeNodes.count;
-  // Split a few inner edges in either direction of travel.
+  // Split a few inner edges in either direction of travel, chosen before
+  // any split (a split's new edge may reuse a freed index among them).
+  std::vector<std::int32_t> chosen;
+  for (std::int32_t e = 12; e < g.edges.count && chosen.size() < 6; e += 3)
+    if (!g.edges[e].deleted) chosen.push_back(e);
   int split = 0;
-  for (std::int32_t e = 12; e < g.edges.count && split < 6; e += 3) {
-    if (g.edges[e].deleted) continue;
+  for (const std::int32_t e : chosen) {
     const NodeRecord& a = g.nodes[g.edges[e].n1];
     const NodeRecord& b = g.nodes[g.edges[e].n2];
     const std::int32_t n = NewNode(0.5 * (a.x + b.x), 0.5 * (a.y + b.y), 0.0);

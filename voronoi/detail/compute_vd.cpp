@@ -45,7 +45,7 @@ bool PointPhase() {
   if (g.pointsFirstPass) {
     g.pointsFirstPass = false;
     BuildInitialDiagram();
-    BuildOrder(3, end);
+    BuildPointOrder(3, end);
   }
   {
     PointLookahead ahead;

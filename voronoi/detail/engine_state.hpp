@@ -132,6 +132,10 @@ struct Engine {
   bool pointsFirstPass = false, segmentsFirstPass = false, arcsFirstPass = false;
   RecordArray<std::int32_t> insertionOrder;
   std::int32_t orderRemaining = 0;  // entries of insertionOrder not yet drawn
+  bool orderPresorted = false;      // drawn front to back (BuildPointOrder)
+  // The point phase's order: partly sorted (BuildPointOrder), or fully
+  // random when false (kept for the checks that compare the two).
+  bool presortPointOrder = true;
   bool dataModified = false;
   bool lineDataInexact = false;
   bool inputSorted = false;  // the cleaning sorted the points in this computation

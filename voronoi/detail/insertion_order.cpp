@@ -2,6 +2,9 @@
 #include "voronoi/detail/insertion_order.hpp"
 
 #include <algorithm>
+#include <cmath>
+#include <utility>
+#include <vector>
 
 #include "voronoi/detail/engine_state.hpp"
 
@@ -10,11 +13,65 @@ namespace zt::vd {
 namespace {
 // How many draws ahead the entries are requested.
 constexpr int kDrawPrefetch = 12;
+// The first round of a point order: left in random order.
+constexpr std::int32_t kFirstRound = 128;
 static_assert(kDrawPrefetch <= OrderRandom::kMaxPeek);
+// Position of (x, y) on the Hilbert curve through a 2^32 x 2^32 grid.
+std::uint64_t HilbertKey(std::uint32_t x, std::uint32_t y) {
+  std::uint64_t d = 0;
+  for (std::uint32_t s = 1u << 31; s > 0; s >>= 1) {
+    const std::uint32_t rx = (x & s) ? 1 : 0, ry = (y & s) ? 1 : 0;
+    d += static_cast<std::uint64_t>(s) * s * ((3 * rx) ^ ry);
+    if (ry == 0) {  // rotate the quadrant
+      if (rx == 1) {
+        x = ~x;
+        y = ~y;
+      }
+      std::swap(x, y);
+    }
+  }
+  return d;
+}
+
 }  // namespace
+
+void BuildPointOrder(std::int32_t first, std::int32_t end) {
+  Engine& g = Vd();
+  BuildOrder(first, end);
+  std::int32_t* order = g.insertionOrder.data;
+  const std::int32_t n = g.insertionOrder.count;
+  // A set as small as the first round is drawn at random, one draw at a time.
+  if (!g.presortPointOrder || n < 2 * kFirstRound) return;
+  for (std::int32_t i = n - 1; i > 0; --i) {
+    const std::int32_t j = static_cast<std::int32_t>(g.random() % static_cast<std::uint32_t>(i + 1));
+    std::swap(order[i], order[j]);
+  }
+  g.orderPresorted = true;
+  double minX = g.points[order[0]].x, maxX = minX, minY = g.points[order[0]].y, maxY = minY;
+  for (std::int32_t i = 1; i < n; ++i) {
+    const PointRecord& p = g.points[order[i]];
+    minX = std::fmin(minX, p.x), maxX = std::fmax(maxX, p.x);
+    minY = std::fmin(minY, p.y), maxY = std::fmax(maxY, p.y);
+  }
+  const double span = std::fmax(maxX - minX, maxY - minY);
+  const double toGrid = span > 0 ? 4294967295.0 / span : 0.0;
+  std::vector<std::pair<std::uint64_t, std::int32_t>> keyed(static_cast<std::size_t>(n));
+  for (std::int32_t i = 0; i < n; ++i) {
+    const PointRecord& p = g.points[order[i]];
+    const auto gx = static_cast<std::uint32_t>(std::fmin((p.x - minX) * toGrid, 4294967295.0));
+    const auto gy = static_cast<std::uint32_t>(std::fmin((p.y - minY) * toGrid, 4294967295.0));
+    keyed[i] = {HilbertKey(gx, gy), order[i]};
+  }
+  // Rounds [n/2, n), [n/4, n/2), ... down to the first, left random.
+  for (std::int32_t hi = n; hi >= 2 * kFirstRound; hi /= 2) {
+    std::sort(keyed.begin() + hi / 2, keyed.begin() + hi);
+  }
+  for (std::int32_t i = 0; i < n; ++i) order[i] = keyed[i].second;
+}
 
 void BuildOrder(std::int32_t first, std::int32_t end) {
   Engine& g = Vd();
+  g.orderPresorted = false;
   g.insertionOrder.count = 0;
   g.insertionOrder.Reserve(std::max<std::int64_t>(end - first, 1));
   for (std::int32_t i = first; i < end; ++i) g.insertionOrder.data[g.insertionOrder.count++] = i;
@@ -24,6 +81,7 @@ void BuildOrder(std::int32_t first, std::int32_t end) {
 Draw DrawNext() {
   Engine& g = Vd();
   if (g.orderRemaining == 0) return Draw{kNone, 0};
+  if (g.orderPresorted) return Draw{g.insertionOrder[g.insertionOrder.count - g.orderRemaining--], 0};
   const std::uint32_t r = g.random();
   const std::int32_t at = static_cast<std::int32_t>(r % static_cast<std::uint32_t>(g.orderRemaining));
   const std::int32_t v = g.insertionOrder[at];

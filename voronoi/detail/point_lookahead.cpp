@@ -47,7 +47,10 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
 }
 
 void PointLookahead::Abandon() {
-  for (int i = count_ - 1; i >= 0; --i) Vd().random.GiveBack(At(i).value);
+  // A presorted order was built with the generator's values before its
+  // first draw; its draws took none.
+  if (!Vd().orderPresorted)
+    for (int i = count_ - 1; i >= 0; --i) Vd().random.GiveBack(At(i).value);
   count_ = 0;
 }
 
