@@ -1,9 +1,6 @@
 // The process-wide table of logical units.
 #include "driver/logical_units.hpp"
 
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <cassert>
 #include <cerrno>
@@ -16,6 +13,7 @@
 
 #include "driver/detail/unit_cleanup.hpp"
 #include "driver/record_stream.hpp"
+#include "runtime/text_file.hpp"
 
 namespace zt {
 
@@ -162,29 +160,8 @@ void close_unit(const std::int32_t& unit) {
   }
 }
 
-namespace {
-
-// A text file to read must be a regular file: opening a FIFO would wait for
-// a writer, a device might never end. Refused without blocking.
-std::FILE* open_regular_for_reading(const std::string& path) {
-  const int fd = ::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC);
-  if (fd < 0) return nullptr;
-  struct stat st {};
-  if (::fstat(fd, &st) != 0 || !S_ISREG(st.st_mode)) {
-    ::close(fd);
-    return nullptr;
-  }
-  const int flags = ::fcntl(fd, F_GETFL);
-  if (flags >= 0) ::fcntl(fd, F_SETFL, flags & ~O_NONBLOCK);
-  std::FILE* f = ::fdopen(fd, "r");
-  if (f == nullptr) ::close(fd);
-  return f;
-}
-
-}  // namespace
-
 bool attach_text(const std::int32_t& unit, const std::string& path, TextOpen how) {
-  std::FILE* f = how == TextOpen::kRead ? open_regular_for_reading(path)
+  std::FILE* f = how == TextOpen::kRead ? open_regular_for_reading(path.c_str())
                                         : std::fopen(path.c_str(), how == TextOpen::kCreate ? "w" : "a");
   if (f == nullptr) return false;
   Unit& u = fresh_unit(unit, Unit::Kind::kText, path);

@@ -4,6 +4,8 @@
 #include <cmath>
 #include <cstdio>
 
+#include "runtime/text_file.hpp"
+
 namespace zt {
 
 float mergeRadius = kDefaultMergeRadius;
@@ -15,7 +17,7 @@ bool usable(float v) { return std::isfinite(v) && v > 0.0f; }
 }  // namespace
 
 void read_offset_distance(const char* path, double& offsetDistance) {
-  std::FILE* f = std::fopen(path, "r");
+  std::FILE* f = open_regular_for_reading(path);
   if (!f) return;
   float value = 0.0f;
   bool read = std::fscanf(f, "%f", &value) == 1;
@@ -26,7 +28,7 @@ void read_offset_distance(const char* path, double& offsetDistance) {
 }
 
 std::int32_t read_merge_radius(const char* path, float& radius) {
-  std::FILE* f = std::fopen(path, "r");
+  std::FILE* f = open_regular_for_reading(path);
   if (!f) return -1;
   constexpr int kPairs = 4;
   float first[kPairs] = {};
