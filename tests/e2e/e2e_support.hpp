@@ -146,4 +146,11 @@ inline std::string banner_and_scale() {
   return std::string("        \n ") + kBanner + "\n        \n" + kScaleLine;
 }
 
+// The bundled example's files, copied into the run's $TMP.
+inline void copy_example(const ProgramRun& r) {
+  for (const auto& e : std::filesystem::directory_iterator(std::string(ZT_SOURCE_DIR) + "/examples/pocket"))
+    std::filesystem::copy_file(e.path(), r.path(e.path().filename().string()),
+                               std::filesystem::copy_options::overwrite_existing);
+}
+
 }  // namespace zt::e2e

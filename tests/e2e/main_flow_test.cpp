@@ -12,12 +12,6 @@
 namespace zt::e2e {
 namespace {
 
-void copy_example(const ProgramRun& r) {
-  for (const auto& e : std::filesystem::directory_iterator(std::string(ZT_SOURCE_DIR) + "/examples/pocket"))
-    std::filesystem::copy_file(e.path(), r.path(e.path().filename().string()),
-                               std::filesystem::copy_options::overwrite_existing);
-}
-
 // The bundled example, twice in one directory (the second run finds the
 // first one's scratch files and result) and once in a fresh one: the same
 // bytes each time.

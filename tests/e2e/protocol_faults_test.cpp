@@ -17,12 +17,6 @@
 namespace zt::e2e {
 namespace {
 
-void copy_example(const ProgramRun& r) {
-  for (const auto& e : std::filesystem::directory_iterator(std::string(ZT_SOURCE_DIR) + "/examples/pocket"))
-    std::filesystem::copy_file(e.path(), r.path(e.path().filename().string()),
-                               std::filesystem::copy_options::overwrite_existing);
-}
-
 std::set<std::string> names_in(const std::string& dir) {
   std::set<std::string> names;
   for (const auto& e : std::filesystem::directory_iterator(dir)) names.insert(e.path().filename().string());

@@ -32,12 +32,6 @@ RunFiles run_with(int threads, const std::function<void(const ProgramRun&)>& fil
   return {r.bytes("temp1"), r.bytes("temp2"), r.bytes("stock2.bin"), r.out};
 }
 
-void copy_example(const ProgramRun& r) {
-  for (const auto& e : std::filesystem::directory_iterator(std::string(ZT_SOURCE_DIR) + "/examples/pocket"))
-    std::filesystem::copy_file(e.path(), r.path(e.path().filename().string()),
-                               std::filesystem::copy_options::overwrite_existing);
-}
-
 // A pocket with a wavy wall on every level; per level some of: a band along
 // the wall, a blob in the floor, a piece outside the pocket (its zones are
 // cut away), nothing, or a contour of three records (too few to count).

@@ -170,6 +170,22 @@ void RedirectSegmentEnds(std::int32_t from, std::int32_t to) {
   g.xrefMerged[to] = from;
 }
 
+namespace {
+
+// Segments whose two ends are one point go; the last takes their place.
+void RemovePointSegments(Engine& g) {
+  for (std::int32_t s = 0; s < g.segments.count;) {
+    if (g.segments[s].i1 == g.segments[s].i2) {
+      g.segments[s] = g.segments[--g.segments.count];
+      ++g.removedSegments;
+    } else {
+      ++s;
+    }
+  }
+}
+
+}  // namespace
+
 void CleanInput(bool sortSegments) {
   Engine& g = Vd();
   const std::int32_t n = g.points.count;
@@ -217,15 +233,7 @@ void CleanInput(bool sortSegments) {
   }
   g.inputSorted = true;
 
-  // Segments whose two ends are one point go; the last takes their place.
-  for (std::int32_t s = 0; s < g.segments.count;) {
-    if (g.segments[s].i1 == g.segments[s].i2) {
-      g.segments[s] = g.segments[--g.segments.count];
-      ++g.removedSegments;
-    } else {
-      ++s;
-    }
-  }
+  RemovePointSegments(g);
   if (sortSegments && g.segments.count > 1) {
     SegmentRecord* b = g.segments.data;
     SegmentRecord* e = b + g.segments.count;
@@ -311,14 +319,7 @@ bool MergeShortSegments() {
     }
   }
   if (!changed) return false;
-  for (std::int32_t s = 0; s < g.segments.count;) {
-    if (g.segments[s].i1 == g.segments[s].i2) {
-      g.segments[s] = g.segments[--g.segments.count];
-      ++g.removedSegments;
-    } else {
-      ++s;
-    }
-  }
+  RemovePointSegments(g);
   // The cross-reference, if any, lists ends that have moved.
   ReleaseCrossReference();
   g.lineDataInexact = true;
