@@ -131,12 +131,13 @@ int attempt(const TaggedPointList& a, const TaggedPointList& b, const char* op, 
   collector_reset(&out, e.offsetX, e.offsetY, e.scaleX, e.scaleY);
 
   if (classify_stars(e, keep.aInsideB, keep.bInsideA) != 0) return kInconsistent;
-  classify_whole_contours(e, e.a, e.b, keep.aInsideB);
-  classify_whole_contours(e, e.b, e.a, keep.bInsideA);
+  const bool resultOnLeft = keep.aInsideB == keep.bInsideA;
+  classify_whole_contours(e, e.a, e.b, keep.aInsideB, resultOnLeft);
+  classify_whole_contours(e, e.b, e.a, keep.bInsideA, resultOnLeft);
   assert(overlay_is_consistent(e, true));
   // A difference's contours follow the pieces they start from; union and
   // intersection start each contour where the result lies on its left.
-  if (emit_result(e, keep.aInsideB == keep.bInsideA) != 0) return kInconsistent;
+  if (emit_result(e, resultOnLeft) != 0) return kInconsistent;
   return !all_closed(e) || close_result(out) ? 0 : kInconsistent;
 }
 

@@ -99,6 +99,7 @@ struct InputContour {
   std::int32_t endEdge = -1;  // exclusive
   std::int32_t hasSplits = -1;
   std::int32_t keepWhole = 0;
+  std::int32_t reversed = 0;  // kept whole, written against its input direction
   std::int32_t closed = 1;
   std::int32_t pointCount = 0;
   std::int32_t capacity = 0;

@@ -382,11 +382,17 @@ void campaign_case(const Region& ra, const Region& rb, const std::string& label,
                std::fabs(got - slab_area(ra, rb, ops[k][0])) > tol) {
       ++count.wrong;
       bad = true;
+    } else if (k < 2 && std::fabs(total_area(r) - got) > tol) {
+      // Union and intersection contours run with the result on their left
+      // (holes clockwise), so their signed areas add up to the even-odd
+      // area; a lobe turned the other way at a self-crossing does not.
+      ++count.wrong;
+      bad = true;
     }
     if (bad && count.first.empty()) {
       std::ostringstream s;
       s.precision(17);
-      s << label << " op " << ops[k] << " rc " << rc << " area " << got << " expected " << expected << "\nA:\n"
+      s << label << " op " << ops[k] << " rc " << rc << " area " << got << " signed " << total_area(r) << " expected " << expected << "\nA:\n"
         << dump(ra) << "B:\n" << dump(rb);
       count.first = s.str();
     }
