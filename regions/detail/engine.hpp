@@ -27,9 +27,13 @@ inline constexpr double kSnapQuantum = 0x1p-48;
 inline constexpr double kEngineEpsilon = 2 * kSnapQuantum;
 // A record with x above this ends a contour; one at or above it never starts one.
 inline constexpr double kSeparatorThreshold = 99990.0;
-// Grid cell and box unit: 1/1000 of the normalised square.
+// Grid cell: 1/1000 of the normalised square.
 inline constexpr double kGridCell = 0.001;
-inline constexpr double kBoxUnitsPerSquare = 1000.0;
+// Box unit: 2^-20 of the normalised square, far above the tolerance (a box
+// is padded by one unit on every side) and fine enough that the boxes of a
+// densely sampled contour overlap only near their edge's neighbours, which
+// keeps the walk of one operand's tree against itself cheap.
+inline constexpr double kBoxUnitsPerSquare = 0x1p20;
 // Cells of the vertex index proper: fine enough that densely sampled
 // contours put only a few points in one, and laid onto the bucket table in
 // tiles of 2^kFineTileBits cells a side so that neighbours share cache lines.
@@ -42,8 +46,8 @@ inline constexpr std::int32_t kMinFineBuckets = 1024;
 inline constexpr double kIndexClamp = 1073741824.0;  // 2^30
 // A box-tree node holding at most this many boxes beyond its first is a leaf.
 inline constexpr std::int32_t kLeafSpan = 20;
-// Upper x bound of a ray query box (box units).
-inline constexpr std::int32_t kRayBoxXmax = 99999001;
+// Upper x bound of a ray query box (box units): beyond every clamped box.
+inline constexpr std::int32_t kRayBoxXmax = 1073741826;  // 2^30 + 2
 // Inputs beyond this magnitude (or not finite) are refused.
 inline constexpr double kMaxInputMagnitude = 1e15;
 

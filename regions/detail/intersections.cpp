@@ -19,7 +19,7 @@ namespace {
 
 // Edges whose exact extents are farther apart than this cannot meet: every
 // point the intersection routine returns lies within the tolerance of both
-// segments. The integer boxes are much coarser (a unit is 1/1000), so this
+// segments. The integer boxes are much coarser (a unit is 2^-20), so this
 // check spares most calls of the routine.
 inline constexpr double kPairRejectMargin = 4 * kEngineEpsilon;
 

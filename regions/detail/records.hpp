@@ -39,7 +39,7 @@ struct Edge {
   std::int32_t open = 0;
 };
 
-// Box of an edge in integer units of 1/1000 of the normalised square.
+// Box of an edge in integer units of kBoxUnitsPerSquare per normalised square.
 struct EdgeBox {
   std::int32_t xmin = 0, ymin = 0, xmax = 0, ymax = 0;
   Edge* edge = nullptr;
