@@ -117,7 +117,9 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
 }
 
 // Two edges of one operand that share an end meet nowhere else unless one
-// folds back along the other (a partial spike): only then are they tested.
+// folds back along the other (a partial spike): only then are they tested,
+// or when more than two edge ends meet there (contours of the operand
+// touching, or one passing twice), so that the touching point cuts them.
 // Consecutive edges of a contour are most of the pairs a walk of one tree
 // meets, so this spares the intersection routine on nearly all of them.
 inline constexpr double kFoldSine = 1e-9;
@@ -130,6 +132,7 @@ bool worth_testing_same_operand(const Edge& a, const Edge& b) {
                          : a.end == b.start || a.end == b.end   ? a.end
                                                                 : nullptr;
   if (!shared) return true;
+  if (shared->ends > 2) return true;
   const Vertex* pa = a.start == shared ? a.end : a.start;
   const Vertex* pb = b.start == shared ? b.end : b.start;
   const double ax = pa->x - shared->x, ay = pa->y - shared->y;

@@ -24,6 +24,9 @@ struct Vertex {
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
   std::int32_t serial = 0;  // creation order within the operation
+  // Ends of closed contours' edges at the vertex: more than two where
+  // contours of one operand touch, or one passes twice.
+  std::int32_t ends = 0;
   Vertex* nextInBucket = nullptr;
   Vertex* nextShared = nullptr;
   HalfEdge* firstOut = nullptr;
