@@ -116,14 +116,12 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   return 0;
 }
 
-// Two edges of one operand that share an end meet nowhere else unless one
-// folds back along the other (a partial spike): only then are they tested,
-// or when more than two edge ends meet there (contours of the operand
-// touching, or one passing twice), so that the touching point cuts them.
+// Two edges of one operand that share an end meet nowhere else (reading
+// dropped the points where a contour turns straight back), so they are
+// tested only where more than two edge ends meet (contours of the operand
+// touching, or one passing twice), for the touching point to cut them.
 // Consecutive edges of a contour are most of the pairs a walk of one tree
 // meets, so this spares the intersection routine on nearly all of them.
-inline constexpr double kFoldSine = 1e-9;
-
 bool worth_testing_same_operand(const Edge& a, const Edge& b) {
   // Open polylines bound nothing: where they cross their own operand does
   // not matter, and they are not cut there.
@@ -131,16 +129,7 @@ bool worth_testing_same_operand(const Edge& a, const Edge& b) {
   const Vertex* shared = a.start == b.start || a.start == b.end ? a.start
                          : a.end == b.start || a.end == b.end   ? a.end
                                                                 : nullptr;
-  if (!shared) return true;
-  if (shared->ends > 2) return true;
-  const Vertex* pa = a.start == shared ? a.end : a.start;
-  const Vertex* pb = b.start == shared ? b.end : b.start;
-  const double ax = pa->x - shared->x, ay = pa->y - shared->y;
-  const double bx = pb->x - shared->x, by = pb->y - shared->y;
-  const double dot = ax * bx + ay * by;
-  if (dot <= 0) return false;
-  const double cross = ax * by - ay * bx;
-  return std::fabs(cross) <= kFoldSine * dot;
+  return !shared || shared->ends > 2;
 }
 
 bool nodes_overlap(const BoxTreeNode& a, const BoxTreeNode& b) {
