@@ -269,7 +269,9 @@ TEST(ClipperOracle, ShiftedCopiesOnIntegerGrid) {
 // ZT_CAMPAIGN_CASES sets the number of cases of each family (default 150;
 // the full campaign is 10000, see the README). Every case runs union,
 // intersection and difference; an operation counts as wrong when it returns
-// 0 with an area off Clipper's, and as refused when it returns -1. The test
+// 0 with an area off Clipper's (or, for union and intersection, contours
+// whose signed areas do not add up to that area: a lobe or a whole contour
+// turned the wrong way), and as refused when it returns -1. The test
 // prints both figures per family and fails on any of either, naming the
 // first such case as initialisers ready for a regression test.
 
