@@ -90,6 +90,32 @@ bool close_result(TaggedPointList& out) {
   return true;
 }
 
+// Union and intersection contours have the result on their left, so their
+// signed areas add up to the result's area, which is never negative; a sum
+// below minus this fraction of the operands' squared extent means a chain
+// ran the wrong way round (a misread status at some vertex).
+inline constexpr double kNegativeAreaTolerance = 0x1p-30;
+
+double signed_area_sum(const TaggedPointList& out) {
+  double sum = 0.0;
+  std::int32_t first = -1;
+  for (std::int32_t i = 0; i < out.count(); ++i) {
+    if (out[i].tag == kSeparatorTag) {
+      first = -1;
+      continue;
+    }
+    if (first < 0) {
+      first = i;
+      continue;
+    }
+    const TaggedPoint& o = out[first];
+    const TaggedPoint& p = out[i - 1];
+    const TaggedPoint& q = out[i];
+    sum += 0.5 * ((p.x - o.x) * (q.y - o.y) - (q.x - o.x) * (p.y - o.y));
+  }
+  return sum;
+}
+
 // An operand that is an empty region: the result is the other operand's
 // contours as read, or nothing.
 void emit_with_empty_operand(BooleanEngine& e, bool aEmpty, bool bEmpty, const KeepFlags& keep) {
@@ -131,13 +157,18 @@ int attempt(const TaggedPointList& a, const TaggedPointList& b, const char* op, 
   collector_reset(&out, e.offsetX, e.offsetY, e.scaleX, e.scaleY);
 
   if (classify_stars(e, keep.aInsideB, keep.bInsideA) != 0) return kInconsistent;
-  classify_whole_contours(e, e.a, e.b, keep.aInsideB);
-  classify_whole_contours(e, e.b, e.a, keep.bInsideA);
+  const bool resultOnLeft = keep.aInsideB == keep.bInsideA;
+  classify_whole_contours(e, e.a, e.b, keep.aInsideB, resultOnLeft);
+  classify_whole_contours(e, e.b, e.a, keep.bInsideA, resultOnLeft);
   assert(overlay_is_consistent(e, true));
   // A difference's contours follow the pieces they start from; union and
   // intersection start each contour where the result lies on its left.
-  if (emit_result(e, keep.aInsideB == keep.bInsideA) != 0) return kInconsistent;
-  return !all_closed(e) || close_result(out) ? 0 : kInconsistent;
+  if (emit_result(e, resultOnLeft) != 0) return kInconsistent;
+  if (!all_closed(e)) return 0;
+  if (!close_result(out)) return kInconsistent;
+  const double extent = std::fmax(box.maxX - box.minX, box.maxY - box.minY);
+  if (resultOnLeft && signed_area_sum(out) < -kNegativeAreaTolerance * extent * extent) return kInconsistent;
+  return 0;
 }
 
 }  // namespace

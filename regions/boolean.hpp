@@ -12,17 +12,19 @@
 // 1e15 in magnitude.
 //
 // Output: the result contours, each followed by one separator (tag
-// -100000000, x = y = 99999): first the contours that meet the other operand
-// nowhere and are kept whole (A's, then B's), then the contours chained from
-// cut pieces. Union and intersection give counter-clockwise outer boundaries
-// and clockwise holes (a chain through a point where its input contour
-// crosses itself turns direction there). A difference contour runs in the
-// direction of the
-// piece its chain starts from: clockwise when that is a piece of B (the two
-// overlapping squares), counter-clockwise when it is one of A; contours kept
-// whole keep their input orientation. Every point carries the tag of the
-// input edge it lies on; where the tag changes, the point is written once
-// with each tag. Consecutive points closer than 1e-7 with one tag are merged.
+// -100000000, x = y = 99999): first the contours that cross or touch no other
+// contour (of either operand) and are kept whole (A's, then B's), then the
+// contours chained from cut pieces. Union and intersection give
+// counter-clockwise outer boundaries and clockwise holes, contours kept whole
+// included (written reversed, from the same first point, when their input
+// runs the other way); a contour crossing itself is cut at the crossing, so
+// each lobe is oriented by itself. A difference contour runs in the
+// direction of the piece its chain starts from: clockwise when that is a
+// piece of B (the two overlapping squares), counter-clockwise when it is one
+// of A; contours kept whole keep their input orientation. When an operand
+// is an empty region, the other's contours come as read. Every point
+// carries the tag of the input edge it lies on; where the tag changes, the
+// point is written once with each tag. Consecutive points closer than 1e-7 with one tag are merged.
 //
 // Contours of fewer than three distinct points are left out.
 //

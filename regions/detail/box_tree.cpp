@@ -153,6 +153,12 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     if (failed) return -1;
     if (c.closed && prev != firstVertex && append_edge(e, prev, firstVertex, prevTag) != 0) return -1;
     c.endEdge = e.edges.count();
+    if (c.closed) {
+      for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) {
+        ++e.edges[k].start->ends;
+        ++e.edges[k].end->ends;
+      }
+    }
   }
   set.lastBox = e.boxes.count() - 1;
   if (set.lastBox < set.firstBox) return -1;

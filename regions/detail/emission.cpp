@@ -49,6 +49,27 @@ void emit_whole(const InputContour& c) {
   emit_separator();
 }
 
+// A closed contour kept whole, written from its first point against its
+// input direction; each edge keeps its tag (that of the point it starts
+// from as read). Blocks are found by walking, once per block.
+void emit_whole_reversed(const InputContour& c) {
+  const std::int32_t n = c.pointCount;
+  const TaggedPoint* to = &c.firstBlock->points[0];  // the edge n-1 -> 0 comes first
+  std::int32_t i = n - 1;
+  while (i >= 0) {
+    const PointBlock* b = c.firstBlock;
+    while (b->end <= i) b = b->next;
+    const std::int32_t blockStart = b->end - kPointBlockSize;
+    for (; i >= blockStart; --i) {
+      const TaggedPoint& from = b->points[i - blockStart];
+      emit_point(to->x, to->y, from.tag);
+      emit_point(from.x, from.y, from.tag);
+      to = &from;
+    }
+  }
+  emit_separator();
+}
+
 int emit_piece(BooleanEngine& e, Vertex* u, Vertex* v) {
   HalfEdge* h = u->firstOut;
   while (h && h->twin->origin != v) h = h->nextOut;
@@ -82,7 +103,11 @@ int emit_result(BooleanEngine& e, bool resultOnLeft) {
     for (std::int32_t ci = 0; ci < set->contours.count(); ++ci) {
       const InputContour& c = set->contours[ci];
       if (c.keepWhole == 1) {
-        emit_whole(c);
+        if (c.reversed == 1) {
+          emit_whole_reversed(c);
+        } else {
+          emit_whole(c);
+        }
       } else if (!c.closed && c.hasSplits == 1) {
         // An open polyline without splits that is not kept has no pieces.
         if (emit_open_contour(e, c) != 0) return -1;

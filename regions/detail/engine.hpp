@@ -104,6 +104,8 @@ struct IntersectionProbe {
   VertexGrid* grid = nullptr;
   SplitPool* splits = nullptr;
   std::int32_t retryReversed = 0;
+  // Edges [skipFirst, skipEnd) (one contour's) are left out of a ray count.
+  std::int32_t skipFirst = 0, skipEnd = 0;
 };
 
 struct SplitCandidate {
@@ -256,7 +258,11 @@ struct StarRule {
   std::int32_t keepBInsideA;
 };
 int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t keepBInsideA);
-void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag);
+// With resultOnLeft (union, intersection), a closed contour kept whole is
+// also marked to be written reversed when its operand's region lies on its
+// right, so that it too has the result on its left.
+void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag,
+                             bool resultOnLeft);
 // Crossings of the ray from (px, py) towards +x with the set's edges,
 // leaving out the edges that start, end or are split at `skip`.
 std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py,

@@ -1,7 +1,11 @@
-// Finding the meeting points of the two operands: a dual walk of their box
-// trees reaches every pair of edges (one of each operand) whose extents lie
-// within kPairRejectMargin of each other; each meeting point becomes a shared
-// vertex and a split point on both edges (split_lists.cpp).
+// Finding the meeting points of the edges: a dual walk of the two operands'
+// box trees reaches every pair of edges (one of each operand) whose extents
+// lie within kPairRejectMargin of each other, and a walk of each tree against
+// itself every such pair of one operand, so that a contour crossing itself or
+// another contour of its operand is cut there too. Each meeting point becomes
+// a shared vertex and a split point on both edges (split_lists.cpp); the star
+// sweep then reads the operand there by the even-odd rule, and a result
+// contour through it turns no direction.
 #include <algorithm>
 #include <cmath>
 #include <new>
@@ -113,26 +117,58 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   return 0;
 }
 
-int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b) {
+// Two edges of one operand that share an end meet nowhere else (reading
+// dropped the points where a contour turns straight back), so they are
+// tested only where more than two edge ends meet (contours of the operand
+// touching, or one passing twice), for the touching point to cut them.
+// Consecutive edges of a contour are most of the pairs a walk of one tree
+// meets, so this spares the intersection routine on nearly all of them.
+bool worth_testing_same_operand(const Edge& a, const Edge& b) {
+  // Open polylines bound nothing: where they cross their own operand does
+  // not matter, and they are not cut there.
+  if (a.open || b.open) return false;
+  const Vertex* shared = a.start == b.start || a.start == b.end ? a.start
+                         : a.end == b.start || a.end == b.end   ? a.end
+                                                                : nullptr;
+  return !shared || shared->ends > 2;
+}
+
+int test_boxes(BooleanEngine& e, const EdgeBox& bi, const EdgeBox& bj, bool sameOperand) {
+  if (!boxes_near(bi, bj)) return 0;
+  if (sameOperand && !worth_testing_same_operand(*bi.edge, *bj.edge)) return 0;
+  if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
+  if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;
+  return 0;
+}
+
+// Every pair of boxes, one under a and one under b, that are near; a and b
+// are disjoint subtrees (of two operands, or of one when sameOperand).
+int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, bool sameOperand) {
   if (!boxes_near(*a, *b)) return 0;
   if (a->low && b->low) {
-    if (walk(e, a->low, b->low) || walk(e, a->low, b->high) || walk(e, a->high, b->low) ||
-        walk(e, a->high, b->high))
+    if (walk(e, a->low, b->low, sameOperand) || walk(e, a->low, b->high, sameOperand) ||
+        walk(e, a->high, b->low, sameOperand) || walk(e, a->high, b->high, sameOperand))
       return -1;
     return 0;
   }
-  if (a->low) return (walk(e, a->low, b) || walk(e, a->high, b)) ? -1 : 0;
-  if (b->low) return (walk(e, a, b->low) || walk(e, a, b->high)) ? -1 : 0;
+  if (a->low) return (walk(e, a->low, b, sameOperand) || walk(e, a->high, b, sameOperand)) ? -1 : 0;
+  if (b->low) return (walk(e, a, b->low, sameOperand) || walk(e, a, b->high, sameOperand)) ? -1 : 0;
   e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
-  for (std::int32_t i = a->first; i <= a->last; ++i) {
-    const EdgeBox& bi = e.treeBoxes[i];
-    for (std::int32_t j = b->first; j <= b->last; ++j) {
-      const EdgeBox& bj = e.treeBoxes[j];
-      if (!boxes_near(bi, bj)) continue;
-      if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
-      if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;
-    }
+  for (std::int32_t i = a->first; i <= a->last; ++i)
+    for (std::int32_t j = b->first; j <= b->last; ++j)
+      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], sameOperand) != 0) return -1;
+  return 0;
+}
+
+// Every pair of distinct boxes under one node that are near.
+int walk_self(BooleanEngine& e, const BoxTreeNode* n) {
+  if (n->low) {
+    if (walk_self(e, n->low) || walk_self(e, n->high) || walk(e, n->low, n->high, true)) return -1;
+    return 0;
   }
+  for (std::int32_t i = n->first; i <= n->last; ++i)
+    for (std::int32_t j = i + 1; j <= n->last; ++j)
+      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], true) != 0) return -1;
   return 0;
 }
 
@@ -143,7 +179,9 @@ int find_intersections(BooleanEngine& e) {
   if (!e.a.root || !e.b.root) return -1;
   e.overlapCount = 0;
   e.leafPairTests = 0;
-  int rc = walk(e, e.a.root, e.b.root);
+  int rc = walk(e, e.a.root, e.b.root, false);
+  if (rc == 0) rc = walk_self(e, e.a.root);
+  if (rc == 0) rc = walk_self(e, e.b.root);
   for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
   if (rc == 0 && e.overlapCount > 0) rc = share_overlap_splits(e);
   e.halves.reset();

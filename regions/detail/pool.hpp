@@ -27,6 +27,7 @@ inline bool allocationAllowed() {
 template <typename T, std::int32_t kChunk = 512, std::int32_t kInitialTable = 512>
 class ChunkPool {
  public:
+  static constexpr std::int32_t kChunkSize = kChunk;
   ChunkPool() = default;
   ChunkPool(const ChunkPool&) = delete;
   ChunkPool& operator=(const ChunkPool&) = delete;

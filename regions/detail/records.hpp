@@ -24,6 +24,9 @@ struct Vertex {
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
   std::int32_t serial = 0;  // creation order within the operation
+  // Ends of closed contours' edges at the vertex: more than two where
+  // contours of one operand touch, or one passes twice.
+  std::int32_t ends = 0;
   Vertex* nextInBucket = nullptr;
   Vertex* nextShared = nullptr;
   HalfEdge* firstOut = nullptr;
@@ -100,6 +103,7 @@ struct InputContour {
   std::int32_t endEdge = -1;  // exclusive
   std::int32_t hasSplits = -1;
   std::int32_t keepWhole = 0;
+  std::int32_t reversed = 0;  // kept whole, written against its input direction
   std::int32_t closed = 1;
   std::int32_t pointCount = 0;
   std::int32_t capacity = 0;

@@ -150,7 +150,7 @@ TEST(RestzonesOracle, DegenerateRestMaterialAgreesWithClipper) { expect_parts_li
 // run; read even-odd, the intersection must also come out as contours of
 // the usual orientation (the final assembly grows them on their right), not
 // as one contour through the crossing with its main lobe clockwise.
-TEST(RestzonesOracle, DISABLED_ACrossingFinishingWallAgreesWithClipper) { expect_parts_like_reference(true); }
+TEST(RestzonesOracle, ACrossingFinishingWallAgreesWithClipper) { expect_parts_like_reference(true); }
 
 }  // namespace
 }  // namespace zt::e2e

@@ -61,6 +61,8 @@ TEST_P(BooleanRows, ResultAsListed) {
       } else {
         EXPECT_DOUBLE_EQ(got, want);
       }
+    } else if (key == "ccw") {
+      for (const auto& c : contours_of(r)) EXPECT_GT(signed_area(c), 0.0);
     } else if (key == "contours") {
       EXPECT_EQ(contours_of(r).size(), static_cast<std::size_t>(want));
     } else if (key == "records") {

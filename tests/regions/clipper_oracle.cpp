@@ -269,7 +269,9 @@ TEST(ClipperOracle, ShiftedCopiesOnIntegerGrid) {
 // ZT_CAMPAIGN_CASES sets the number of cases of each family (default 150;
 // the full campaign is 10000, see the README). Every case runs union,
 // intersection and difference; an operation counts as wrong when it returns
-// 0 with an area off Clipper's, and as refused when it returns -1. The test
+// 0 with an area off Clipper's (or, for union and intersection, contours
+// whose signed areas do not add up to that area: a lobe or a whole contour
+// turned the wrong way), and as refused when it returns -1. The test
 // prints both figures per family and fails on any of either, naming the
 // first such case as initialisers ready for a regression test.
 
@@ -382,11 +384,17 @@ void campaign_case(const Region& ra, const Region& rb, const std::string& label,
                std::fabs(got - slab_area(ra, rb, ops[k][0])) > tol) {
       ++count.wrong;
       bad = true;
+    } else if (k < 2 && std::fabs(total_area(r) - got) > tol) {
+      // Union and intersection contours run with the result on their left
+      // (holes clockwise), so their signed areas add up to the even-odd
+      // area; a lobe turned the other way at a self-crossing does not.
+      ++count.wrong;
+      bad = true;
     }
     if (bad && count.first.empty()) {
       std::ostringstream s;
       s.precision(17);
-      s << label << " op " << ops[k] << " rc " << rc << " area " << got << " expected " << expected << "\nA:\n"
+      s << label << " op " << ops[k] << " rc " << rc << " area " << got << " signed " << total_area(r) << " expected " << expected << "\nA:\n"
         << dump(ra) << "B:\n" << dump(rb);
       count.first = s.str();
     }
