@@ -22,7 +22,6 @@ namespace zt::bench {
 
 namespace cl = ClipperLib;
 using e2e::kArcTolerance;
-using e2e::kMergeMargin;
 using e2e::RefLevel;
 using test::kClipperScale;
 
@@ -174,25 +173,16 @@ inline cl::Paths tuned_offset(const cl::Paths& in, double delta) {
   return out;
 }
 
-// Final zones per level z, as e2e::reference_zones computes them.
+// Final zones per level z, assembled as the reference pipeline assembles them.
 inline std::map<float, cl::Paths> tuned_zones(const std::vector<RefLevel>& levels, double offsetDistance,
                                               double mergeRadius, std::size_t minRecords = 5) {
-  std::map<float, cl::Paths> finals;
-  cl::Paths carried, last;
-  bool any = false;
-  for (auto it = levels.rbegin(); it != levels.rend(); ++it) {
-    if (e2e::level_records(*it) >= minRecords) {
-      const cl::Paths zones =
-          test::clip(e2e::to_paths(it->finishing), tuned_offset(e2e::to_paths(it->rest), offsetDistance), cl::ctIntersection);
-      if (!zones.empty()) {
-        carried = test::clip(carried, tuned_offset(zones, mergeRadius + kMergeMargin), cl::ctUnion);
-        last = tuned_offset(carried, -mergeRadius);
-        any = true;
-      }
-    }
-    if (any) finals[it->z] = last;
-  }
-  return finals;
+  return e2e::assemble_zones(
+      levels, mergeRadius, minRecords,
+      [&](const RefLevel& l) {
+        return test::clip(e2e::to_paths(l.finishing), tuned_offset(e2e::to_paths(l.rest), offsetDistance),
+                          cl::ctIntersection);
+      },
+      tuned_offset);
 }
 
 }  // namespace zt::bench

@@ -76,26 +76,37 @@ inline cl::Paths level_zones(const RefLevel& l, double offsetDistance) {
   return clip(to_paths(l.finishing), grow_rest(l.rest, offsetDistance), cl::ctIntersection);
 }
 
-// Final zones per level z (levels below the deepest one with zones absent);
-// a level counts from `minRecords` records on (the driver's 5; the zone
-// builder, called directly, takes any).
-inline std::map<float, cl::Paths> reference_zones(const std::vector<RefLevel>& levels, double offsetDistance,
-                                                  double mergeRadius, std::size_t minRecords = 5) {
+// The bottom-up assembly of the zones with a pipeline's own steps:
+// level_zones_of(level) gives a level's own zones, offset(paths, delta) grows
+// (delta > 0) or shrinks them. Final zones per level z (levels below the
+// deepest one with zones absent); a level counts from `minRecords` records on.
+template <typename LevelZones, typename Offset>
+std::map<float, cl::Paths> assemble_zones(const std::vector<RefLevel>& levels, double mergeRadius,
+                                          std::size_t minRecords, LevelZones level_zones_of, Offset offset) {
   std::map<float, cl::Paths> finals;
   cl::Paths carried, last;
   bool any = false;
   for (auto it = levels.rbegin(); it != levels.rend(); ++it) {
     if (level_records(*it) >= minRecords) {
-      const cl::Paths zones = level_zones(*it, offsetDistance);
+      const cl::Paths zones = level_zones_of(*it);
       if (!zones.empty()) {
-        carried = clip(carried, round_offset(zones, mergeRadius + kMergeMargin), cl::ctUnion);
-        last = round_offset(carried, -mergeRadius);
+        carried = clip(carried, offset(zones, mergeRadius + kMergeMargin), cl::ctUnion);
+        last = offset(carried, -mergeRadius);
         any = true;
       }
     }
     if (any) finals[it->z] = last;
   }
   return finals;
+}
+
+// The reference pipeline's zones; minRecords is the driver's 5 (the zone
+// builder, called directly, takes any).
+inline std::map<float, cl::Paths> reference_zones(const std::vector<RefLevel>& levels, double offsetDistance,
+                                                  double mergeRadius, std::size_t minRecords = 5) {
+  return assemble_zones(
+      levels, mergeRadius, minRecords, [&](const RefLevel& l) { return level_zones(l, offsetDistance); },
+      [](const cl::Paths& in, double delta) { return round_offset(in, delta); });
 }
 
 inline RefPoly rectangle_poly(float x0, float y0, float x1, float y1, bool cw = false) {
