@@ -84,6 +84,21 @@ int share_overlap_splits(BooleanEngine& e) {
   return 0;
 }
 
+// Whether a split of edge at v is worth recording. A meeting point exactly
+// at one of the edge's ends has the same t whichever pair finds it (t
+// follows from the end's coordinates and the edge alone); of such repeats,
+// where boundaries run along each other or many edges meet at a corner, only
+// the first is recorded: settling would keep or drop the later ones with it
+// (same t, found later), and nothing else depends on them.
+bool first_at_end(Edge& edge, const Vertex* v, bool exact) {
+  if (!exact) return true;
+  const std::uint16_t bit = v == edge.start ? 1 : v == edge.end ? 2 : 0;
+  if (bit == 0) return true;
+  if (edge.endsSplit & bit) return false;
+  edge.endsSplit |= bit;
+  return true;
+}
+
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
   pr.retryReversed = 0;
@@ -111,8 +126,9 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
     }
     const double tA = ((R.x - pr.p0.x) * uAx + (R.y - pr.p0.y) * uAy) / pr.dirA.length;
     const double tB = ((R.x - pr.q0.x) * uBx + (R.y - pr.q0.y) * uBy) / pr.dirB.length;
-    if (record_split(*pr.splits, first, tA, v) != 0) return -1;
-    if (record_split(*pr.splits, second, tB, v) != 0) return -1;
+    const bool exact = v->x == R.x && v->y == R.y;
+    if (first_at_end(first, v, exact) && record_split(*pr.splits, first, tA, v) != 0) return -1;
+    if (first_at_end(second, v, exact) && record_split(*pr.splits, second, tB, v) != 0) return -1;
   }
   return 0;
 }

@@ -39,7 +39,11 @@ struct Edge {
   std::uint32_t tag = 0;
   // An edge of an open polyline bounds nothing: it never changes its
   // operand's inside status and no ray counts it.
-  std::int32_t open = 0;
+  std::uint16_t open = 0;
+  // Split points recorded at the edge's own start (bit 0) or end (bit 1)
+  // from a meeting point exactly there, whose t is always the same: a
+  // second one would be dropped by the settling, so it is not recorded.
+  std::uint16_t endsSplit = 0;
 };
 
 // Exact extent of an edge (normalised coordinates). Boxes are compared with
