@@ -6,6 +6,7 @@
 // dense contour's boxes on top of each other.
 #include <algorithm>
 #include <cmath>
+#include <initializer_list>
 #include <new>
 #include <utility>
 
@@ -155,8 +156,10 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     c.endEdge = e.edges.count();
     if (c.closed) {
       for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) {
-        ++e.edges[k].start->ends;
-        ++e.edges[k].end->ends;
+        for (Vertex* v : {e.edges[k].start, e.edges[k].end}) {
+          std::int16_t& ends = v->ends[set.owner - 1];
+          if (ends < kManyEnds) ++ends;
+        }
       }
     }
   }

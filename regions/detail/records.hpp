@@ -13,6 +13,8 @@ struct SplitPoint;
 
 // Owner of a vertex met by both operands, or created at a crossing.
 inline constexpr std::int32_t kSharedOwner = 300;
+// Edge ends at a vertex are counted up to this: more than two is what matters.
+inline constexpr std::int16_t kManyEnds = 3;
 // Keep marks of half-edges and star entries.
 inline constexpr std::int32_t kUndecided = -1;
 // Emission mark of a written half-edge, and direction mark of a paired star entry.
@@ -24,9 +26,10 @@ struct Vertex {
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
   std::int32_t serial = 0;  // creation order within the operation
-  // Ends of closed contours' edges at the vertex: more than two where
-  // contours of one operand touch, or one passes twice.
-  std::int32_t ends = 0;
+  // Ends of closed contours' edges at the vertex, of A's and of B's
+  // (counted up to kManyEnds): more than two where contours of one operand
+  // touch, or one passes twice.
+  std::int16_t ends[2] = {0, 0};
   Vertex* nextInBucket = nullptr;
   Vertex* nextShared = nullptr;
   HalfEdge* firstOut = nullptr;
