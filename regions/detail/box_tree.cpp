@@ -135,7 +135,7 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     Vertex* prev = nullptr;
     std::int32_t prevTag = 0;
     bool failed = false;
-    for_each_stored_point(c, [&](const TaggedPoint& p) {
+    for_each_stored_point(e, c, [&](const TaggedPoint& p) {
       if (failed) return;
       Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
       if (!v) {

@@ -101,14 +101,6 @@ struct StarEntry {
   std::int32_t open = 0;       // of an open polyline
 };
 
-inline constexpr std::int32_t kPointBlockSize = 512;
-
-struct PointBlock {
-  std::int32_t end = 0;  // the contour's capacity just after this block was added
-  TaggedPoint* points = nullptr;
-  PointBlock* next = nullptr;
-};
-
 struct InputContour {
   std::int32_t firstEdge = -1;
   std::int32_t endEdge = -1;  // exclusive
@@ -116,10 +108,9 @@ struct InputContour {
   std::int32_t keepWhole = 0;
   std::int32_t reversed = 0;  // kept whole, written against its input direction
   std::int32_t closed = 1;
+  // The contour's points as read, contiguous in the engine's point store.
+  std::int32_t firstPoint = 0;
   std::int32_t pointCount = 0;
-  std::int32_t capacity = 0;
-  PointBlock* firstBlock = nullptr;
-  PointBlock* currentBlock = nullptr;
   HalfEdge* firstHalf = nullptr;
   HalfEdge* lastHalf = nullptr;
 };
