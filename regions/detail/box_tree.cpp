@@ -16,6 +16,10 @@ namespace zt::detail {
 
 namespace {
 
+// How many points ahead of a lookup its bucket, then its first vertex, are fetched.
+constexpr std::int32_t kBucketPrefetch = 8;
+constexpr std::int32_t kVertexPrefetch = 4;
+
 int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   Edge* edge = e.edges.take();
   if (!edge) return -1;
@@ -135,8 +139,15 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     Vertex* prev = nullptr;
     std::int32_t prevTag = 0;
     bool failed = false;
+    const TaggedPoint* pts = contour_points(e, c);
+    std::int32_t at = 0;
     for_each_stored_point(e, c, [&](const TaggedPoint& p) {
       if (failed) return;
+      // Lookups go to scattered buckets: the later points' buckets and
+      // first vertices are fetched while this one is looked up.
+      if (at + kBucketPrefetch < c.pointCount) grid_prefetch(e.grid, pts[at + kBucketPrefetch].x, pts[at + kBucketPrefetch].y, false);
+      if (at + kVertexPrefetch < c.pointCount) grid_prefetch(e.grid, pts[at + kVertexPrefetch].x, pts[at + kVertexPrefetch].y, true);
+      ++at;
       Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
       if (!v) {
         failed = true;

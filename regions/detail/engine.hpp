@@ -223,6 +223,9 @@ void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// A hint that (x, y) will be looked up soon: loads its bucket, or with head
+// the bucket's first vertex, into the cache.
+void grid_prefetch(const VertexGrid& g, double x, double y, bool head);
 // What a lookup of v's own coordinates by a crossing does: v becomes shared.
 void grid_share(VertexGrid& g, Vertex* v);
 // Bucket of a fine cell, never outside the table whatever the cell's sign.
