@@ -165,6 +165,8 @@ struct BooleanEngine {
   TaggedPointList output;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
+  // Runs numbered so far (box_tree.cpp), over both sets.
+  std::int32_t runCount = 0;
   // Box pairs compared at leaf pairs by the last intersection walk.
   std::int64_t leafPairTests = 0;
 
