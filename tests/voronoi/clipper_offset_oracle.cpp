@@ -216,5 +216,52 @@ TEST(DegenerateRestMaterial, SameCurvesWhateverTheOrderOfTheContours) {
   }
 }
 
+// Squares that touch edge to edge, by a corner or along half an edge, as
+// the zone builder feeds rest material: each contour closed on a repeated
+// point. An edge two squares share is given once each way and kept once;
+// it bounds no area, so both sides of it lie inside. The curves on either
+// side are those of Clipper whatever the order of the squares and where
+// each starts.
+struct SquareLayout {
+  const char* name;
+  std::vector<Pt> corners;  // lower left corners of unit squares
+};
+
+class TouchingSquares : public ::testing::TestWithParam<SquareLayout> {};
+
+TEST_P(TouchingSquares, OffsetLikeClipperWhateverTheOrder) {
+  constexpr int kOrders = 8;
+  std::vector<Ring> rings;
+  for (const Pt& c : GetParam().corners)
+    rings.push_back({{c.x, c.y}, {c.x + 1, c.y}, {c.x + 1, c.y + 1}, {c.x, c.y + 1}});
+  std::mt19937 rng(1414);
+  for (int order = 0; order < kOrders; ++order) {
+    if (order > 0) {
+      std::shuffle(rings.begin(), rings.end(), rng);
+      for (Ring& r : rings) std::rotate(r.begin(), r.begin() + rng() % r.size(), r.end());
+    }
+    for (const double t : {0.1, 0.3})
+      for (const std::int32_t side : {kSideLeft, kSideRight})
+        ExpectLikeClipper(rings, t, side,
+                          "order " + std::to_string(order) + " t " + std::to_string(t) + " side " + std::to_string(side));
+  }
+}
+
+std::vector<Pt> Grid(int n) {
+  std::vector<Pt> c;
+  for (int i = 0; i < n; ++i)
+    for (int j = 0; j < n; ++j) c.push_back({1.0 * i, 1.0 * j});
+  return c;
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    DegenerateRestMaterial, TouchingSquares,
+    ::testing::Values(SquareLayout{"Grid2x2", Grid(2)}, SquareLayout{"Grid3x3", Grid(3)},
+                      SquareLayout{"Grid4x4", Grid(4)},
+                      SquareLayout{"CornersOnly", {{0, 0}, {1, 1}, {2, 0}, {0, 2}, {2, 2}}},
+                      SquareLayout{"HalfEdges", {{0, 0}, {1, 0}, {2, 0}, {0.5, 1}, {1.5, 1}, {3, 0.5}}},
+                      SquareLayout{"RingAroundAHole", {{0, 0}, {1, 0}, {2, 0}, {2, 1}, {2, 2}, {1, 2}, {0, 2}, {0, 1}}}),
+    [](const ::testing::TestParamInfo<SquareLayout>& info) { return std::string(info.param.name); });
+
 }  // namespace
 }  // namespace zt
