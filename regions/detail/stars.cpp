@@ -129,13 +129,16 @@ std::int32_t group_end(StarPool& pool, std::int32_t i, std::int32_t n) {
 // Inside status of operand x (1 or 2) in the sector just clockwise of the
 // first entry. A group toggles it when it holds an odd number of x's
 // entries: a piece run along twice (a doubled segment, a spike, a
-// there-and-back contour) bounds nothing. Taken from a piece already decided
-// from its far end when there is one (the statuses on its left are those
-// just counter-clockwise of its group), else from the crossings of a ray
-// towards +x with x's edges that do not meet the vertex: the ray runs just
-// below the +x axis. Where the operands' boundaries run along each other,
-// every vertex has pieces of both, so the far ends are what spares a ray
-// at each of them.
+// there-and-back contour) bounds nothing. Taken from a piece of the other
+// operand already decided from its far end when there is one; else from a
+// piece along which both operands' boundaries run, decided from its far end
+// (the statuses on its left are those just counter-clockwise of its group:
+// where the boundaries coincide, every vertex has only such pieces, and this
+// spares a ray at each); else from the crossings of a ray towards +x with
+// x's edges that do not meet the vertex: the ray runs just below the +x
+// axis. A piece of x alone is no anchor for x: next to a piece of the other
+// operand that is collinear within the last bits, the two ends may order
+// them differently.
 std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int32_t n) {
   StarPool& pool = e.stars;
   std::int32_t toggles = 0;
@@ -143,8 +146,22 @@ std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int3
     const std::int32_t j = group_end(pool, i, n);
     std::int32_t count = 0;
     for (std::int32_t k = i; k < j; ++k) count += operand_of(pool[k]) == x && !pool[k].open;
+    if (count == 0) {
+      for (std::int32_t k = i; k < j; ++k)
+        if (operand_of(pool[k]) != x && pool[k].half->otherState >= 0) return pool[k].half->otherState ^ toggles;
+    }
     toggles ^= count & 1;
-    for (std::int32_t k = i; k < j; ++k) {
+    i = j;
+  }
+  toggles = 0;
+  for (std::int32_t i = 0; i < n;) {
+    const std::int32_t j = group_end(pool, i, n);
+    std::int32_t count = 0;
+    for (std::int32_t k = i; k < j; ++k) count += operand_of(pool[k]) == x && !pool[k].open;
+    toggles ^= count & 1;
+    bool both = false;
+    for (std::int32_t k = i; k < j; ++k) both |= operand_of(pool[k]) != operand_of(pool[i]);
+    for (std::int32_t k = i; k < j && both; ++k) {
       const std::int32_t states = pool[k].half->leftStates;
       if (states >= 0) return ((states >> (x - 1)) & 1) ^ toggles;
     }
