@@ -182,10 +182,12 @@ void SlopeDomain::initOutput(std::int32_t curves) {
 void SlopeDomain::initCurve(double, double startX, double startY, std::int32_t) {
   assert(curveStart == -1 && "curves do not nest");
   curveStart = out_->count();
+  make_room(*out_, 1);
   out_->Add({0, startX, startY});
 }
 
 void SlopeDomain::writeLineSegment(double, double, double endX, double endY, SiteRef) {
+  make_room(*out_, 1);
   out_->Add({0, endX, endY});
 }
 
@@ -196,6 +198,7 @@ void SlopeDomain::writeCircularArc(double startX, double startY, double endX, do
 
 void SlopeDomain::endCurve(std::int32_t, std::int32_t) {
   if (curveStart != -1) {
+    make_room(*out_, 2);
     out_->Add(out_->At(curveStart));
     curveStart = -1;
   }
