@@ -78,10 +78,6 @@ struct HalfEdge {
   std::int32_t side = 0;  // +owner along its contour, -owner against it
   std::int32_t keep = kUndecided;
   std::int32_t emitted = -1;
-  // Set by the star classification along the whole chain: the inside status
-  // of each operand on the half-edge's left (bit 0 A, bit 1 B), or -1 before
-  // a sweep reached the chain.
-  std::int32_t leftStates = -1;
   Vertex* origin = nullptr;
   HalfEdge* twin = nullptr;
   HalfEdge* nextOut = nullptr;
