@@ -74,7 +74,7 @@ bool SegmentPhase() {
   if (g.segmentsDone) return true;
   if (g.segmentsFirstPass) {
     g.segmentsFirstPass = false;
-    BuildOrder(0, g.segments.count);
+    BuildSegmentOrder(0, g.segments.count);
   }
   while (g.orderRemaining > 0) {
     const std::int32_t s = DrawNext().entry;

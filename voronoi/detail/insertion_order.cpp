@@ -6,6 +6,7 @@
 #include <utility>
 #include <vector>
 
+#include "core/points.hpp"
 #include "voronoi/detail/engine_state.hpp"
 
 namespace zt::vd {
@@ -35,21 +36,25 @@ std::uint64_t HilbertKey(std::uint32_t x, std::uint32_t y) {
 
 }  // namespace
 
-void BuildPointOrder(std::int32_t first, std::int32_t end) {
+namespace {
+
+// Shuffles the order built by BuildOrder and sorts its rounds along the
+// Hilbert curve through the box of the sites' positions (at(i) gives the
+// position of entry i); the draws then take it front to back.
+template <class At>
+void PresortRounds(At&& at) {
   Engine& g = Vd();
-  BuildOrder(first, end);
   std::int32_t* order = g.insertionOrder.data;
   const std::int32_t n = g.insertionOrder.count;
-  // A set as small as the first round is drawn at random, one draw at a time.
-  if (!g.presortPointOrder || n < 2 * kFirstRound) return;
   for (std::int32_t i = n - 1; i > 0; --i) {
     const std::int32_t j = static_cast<std::int32_t>(g.random() % static_cast<std::uint32_t>(i + 1));
     std::swap(order[i], order[j]);
   }
   g.orderPresorted = true;
-  double minX = g.points[order[0]].x, maxX = minX, minY = g.points[order[0]].y, maxY = minY;
+  const Point2d p0 = at(order[0]);
+  double minX = p0.x, maxX = minX, minY = p0.y, maxY = minY;
   for (std::int32_t i = 1; i < n; ++i) {
-    const PointRecord& p = g.points[order[i]];
+    const Point2d p = at(order[i]);
     minX = std::fmin(minX, p.x), maxX = std::fmax(maxX, p.x);
     minY = std::fmin(minY, p.y), maxY = std::fmax(maxY, p.y);
   }
@@ -57,7 +62,7 @@ void BuildPointOrder(std::int32_t first, std::int32_t end) {
   const double toGrid = span > 0 ? 4294967295.0 / span : 0.0;
   std::vector<std::pair<std::uint64_t, std::int32_t>> keyed(static_cast<std::size_t>(n));
   for (std::int32_t i = 0; i < n; ++i) {
-    const PointRecord& p = g.points[order[i]];
+    const Point2d p = at(order[i]);
     const auto gx = static_cast<std::uint32_t>(std::fmin((p.x - minX) * toGrid, 4294967295.0));
     const auto gy = static_cast<std::uint32_t>(std::fmin((p.y - minY) * toGrid, 4294967295.0));
     keyed[i] = {HilbertKey(gx, gy), order[i]};
@@ -67,6 +72,27 @@ void BuildPointOrder(std::int32_t first, std::int32_t end) {
     std::sort(keyed.begin() + hi / 2, keyed.begin() + hi);
   }
   for (std::int32_t i = 0; i < n; ++i) order[i] = keyed[i].second;
+}
+
+}  // namespace
+
+void BuildPointOrder(std::int32_t first, std::int32_t end) {
+  Engine& g = Vd();
+  BuildOrder(first, end);
+  // A set as small as the first round is drawn at random, one draw at a time.
+  if (!g.presortPointOrder || g.insertionOrder.count < 2 * kFirstRound) return;
+  PresortRounds([&](std::int32_t i) { return Point2d{g.points[i].x, g.points[i].y}; });
+}
+
+void BuildSegmentOrder(std::int32_t first, std::int32_t end) {
+  Engine& g = Vd();
+  BuildOrder(first, end);
+  if (!g.presortPointOrder || g.insertionOrder.count < 2 * kFirstRound) return;
+  PresortRounds([&](std::int32_t s) {
+    const PointRecord& a = g.points[g.segments[s].i1];
+    const PointRecord& b = g.points[g.segments[s].i2];
+    return Point2d{0.5 * (a.x + b.x), 0.5 * (a.y + b.y)};
+  });
 }
 
 void BuildOrder(std::int32_t first, std::int32_t end) {
