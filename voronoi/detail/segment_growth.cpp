@@ -4,6 +4,7 @@
 
 #include "voronoi/detail/diagram.hpp"
 #include "voronoi/detail/input_repair.hpp"
+#include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_on_edge.hpp"
 #include "voronoi/detail/root_selection.hpp"
 #include "voronoi/detail/segment_insertion.hpp"
@@ -11,6 +12,9 @@
 
 namespace zt::vd {
 namespace {
+
+// Conflict values within this of zero are ties of rounding (internal units).
+constexpr double kTieBand = 1e-9;
 
 thread_local ThreadScratch<std::int32_t> gSegmentsBeside;  // segment sites beside the tree
 
@@ -26,6 +30,21 @@ void RecordSite(std::int32_t site, std::int32_t kind) {
   if (p.marked || p.hasNode) return;
   p.marked = 1;
   g.markedSites.Append(site, kScratchGrowth);
+}
+
+// A node whose conflict with the segment (value) is a tie within rounding (a node
+// on a circle through one of the segment's end points, its foot at that
+// end) may sit at the far end of an edge whose middle is plainly outside
+// the conflict: taking it would hand the whole edge to the segment and cut
+// the region on its side off from its site. Such a node is not reached
+// along that edge.
+bool TieAcrossEdge(const SegmentInsertion& si, std::int32_t e, double value, double tol) {
+  if (!(value > -kTieBand)) return false;
+  const geo::EdgeFrame f = EdgeFromRecords(e);
+  const Point2d mid = geo::edge_point(f, 0.5);
+  const double lam = si.line.lambda(mid);
+  if (!(lam >= -tol && lam <= si.line.len + tol)) return true;
+  return std::fabs(si.line.D(mid)) - f.left.dist(mid) > kTieBand;
 }
 
 // One attempt: depth first from the start node, through every node in
@@ -52,7 +71,7 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
           // A node on an input point: part of the tree only when the point
           // ends this segment, and never passed through.
           TouchNode(w, (wn.site == si.i1 || wn.site == si.i2) ? VISITED : CHECKED);
-        } else if (!IsFarNode(w) && ConflictValue(si, w, tol) <= tol) {
+        } else if (double v; !IsFarNode(w) && (v = ConflictValue(si, w, tol)) <= tol && !TieAcrossEdge(si, e, v, tol)) {
           TouchNode(w, VISITED);
           g.stack.Append(w, kScratchGrowth);
           // The growth goes on from w along its other edges.
