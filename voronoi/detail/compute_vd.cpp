@@ -77,7 +77,7 @@ bool SegmentPhase() {
   if (g.segmentsDone) return true;
   if (g.segmentsFirstPass) {
     g.segmentsFirstPass = false;
-    BuildOrder(0, g.segments.count);
+    BuildSegmentOrder();
   }
   while (g.orderRemaining > 0) {
     const std::int32_t s = DrawNext().entry;
