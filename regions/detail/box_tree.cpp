@@ -6,6 +6,7 @@
 // dense contour's boxes on top of each other.
 #include <algorithm>
 #include <cmath>
+#include <initializer_list>
 #include <new>
 #include <utility>
 
@@ -134,7 +135,7 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     Vertex* prev = nullptr;
     std::int32_t prevTag = 0;
     bool failed = false;
-    for_each_stored_point(c, [&](const TaggedPoint& p) {
+    for_each_stored_point(e, c, [&](const TaggedPoint& p) {
       if (failed) return;
       Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
       if (!v) {
@@ -155,8 +156,10 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     c.endEdge = e.edges.count();
     if (c.closed) {
       for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) {
-        ++e.edges[k].start->ends;
-        ++e.edges[k].end->ends;
+        for (Vertex* v : {e.edges[k].start, e.edges[k].end}) {
+          std::int16_t& ends = v->ends[set.owner - 1];
+          if (ends < kManyEnds) ++ends;
+        }
       }
     }
   }

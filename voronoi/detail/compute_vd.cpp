@@ -47,8 +47,11 @@ bool PointPhase() {
     BuildInitialDiagram();
     BuildPointOrder(3, end);
   }
+  // A presorted order finds nearest points by walking the diagram: the
+  // search structure is not needed.
+  if (g.orderPresorted) ReleaseNearestSearch();
   {
-    PointLookahead ahead;
+    PointLookahead ahead(g.orderPresorted, kInitialDiagramPoint);
     Nearest nearest;
     for (std::int32_t p = ahead.Next(nearest); p >= 0; p = ahead.Next(nearest)) {
       InsertPoint(p, nearest, ahead);
@@ -74,7 +77,7 @@ bool SegmentPhase() {
   if (g.segmentsDone) return true;
   if (g.segmentsFirstPass) {
     g.segmentsFirstPass = false;
-    BuildOrder(0, g.segments.count);
+    BuildSegmentOrder();
   }
   while (g.orderRemaining > 0) {
     const std::int32_t s = DrawNext().entry;
@@ -156,6 +159,7 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
     g.suspect.set = false;
     g.pointsFirstPass = g.segmentsFirstPass = g.arcsFirstPass = true;
     g.pointsDone = false;
+    g.nearestRescans = 0;
     g.segmentsDone = g.segments.count == 0 || args.pointsOnly;
     g.arcsDone = g.arcs.count == 0 || args.pointsOnly;
     // 5. Frame: bounding box and scaling of a new computation.

@@ -2,6 +2,7 @@
 #include "voronoi/detail/point_lookahead.hpp"
 
 #include "voronoi/detail/insertion_order.hpp"
+#include "voronoi/detail/nearest_walk.hpp"
 
 namespace zt::vd {
 
@@ -14,6 +15,7 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
     g.points.Prefetch(d.entry);
   }
   if (count_ == 0) return kNone;
+  if (walk_) return NextByWalk(nearest);
   // Slots advance in order, so the searches run in draw order.
   for (int i = 0; i < count_; ++i) {
     Slot& s = At(i);
@@ -41,6 +43,20 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
   const Slot& front = At(0);
   nearest = front.nearest;
   const std::int32_t p = front.point;
+  first_ = (first_ + 1) % kSlots;
+  --count_;
+  return p;
+}
+
+std::int32_t PointLookahead::NextByWalk(Nearest& nearest) {
+  Engine& g = Vd();
+  // The walk starts at the point inserted last; a point merged away has no
+  // region, and then the site its own walk ended at is as close.
+  if (last_ >= 0 && g.points[last_].vd >= 0 && !g.points[last_].deleted) from_ = last_;
+  const std::int32_t p = At(0).point;
+  nearest = g.points[p].deleted ? Nearest{} : WalkToNearest(from_, p);
+  if (nearest.point >= 0) from_ = nearest.point;
+  last_ = p;
   first_ = (first_ + 1) % kSlots;
   --count_;
   return p;
