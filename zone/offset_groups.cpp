@@ -1,5 +1,5 @@
 // SlopeDomain::compute_in_groups: the offsets of a list as independent
-// groups of polylines, each remembered on the thread that computed it.
+// groups of polylines, each remembered for every thread.
 //
 // Polylines whose boxes lie farther apart than twice the offset distance
 // (and a margin) cannot meet in their offset curves: every curve point lies
@@ -15,12 +15,16 @@
 //
 // What a group gives depends only on its fed coordinates, the distances,
 // the side and the arc tolerance (the engine resets all it reads, its random
-// draws included), so the result is the same whatever the thread computed
-// or remembered before: the files stay the same for every thread count.
+// draws included), so the result is the same whichever thread computed it
+// and whatever was remembered before: the files stay the same for every
+// thread count. The groups are remembered once for all threads (a level
+// four levels down may have been offset on another thread), behind a lock
+// taken only to look a group up and to add one.
 #include <algorithm>
 #include <bit>
 #include <cmath>
 #include <cstdint>
+#include <mutex>
 #include <numeric>
 #include <vector>
 
@@ -31,8 +35,7 @@ namespace zt {
 
 namespace {
 
-// Groups and points remembered per thread; the least recently used group
-// goes first.
+// Groups and points remembered; the least recently used group goes first.
 constexpr std::size_t kRememberedGroups = 64;
 constexpr std::size_t kRememberedGroupPoints = std::size_t{1} << 16;
 // More polylines than this are offset as one group (the grouping compares
@@ -57,8 +60,17 @@ struct RememberedGroup {
   std::uint64_t used = 0;
 };
 
-thread_local std::vector<RememberedGroup> tl_groups;
-thread_local std::uint64_t tl_clock = 0;
+struct GroupMemory {
+  std::mutex mutex;
+  std::vector<RememberedGroup> groups;
+  std::uint64_t clock = 0;
+};
+
+// Never destroyed: a worker may still offset while the process ends.
+GroupMemory& group_memory() {
+  static GroupMemory* const memory = new GroupMemory;
+  return *memory;
+}
 
 std::uint64_t mix(std::uint64_t z) {
   z += 0x9e3779b97f4a7c15ULL;
@@ -127,8 +139,9 @@ std::vector<std::int32_t> group_runs(const std::vector<FedRun>& runs, double gap
   return group;
 }
 
-RememberedGroup* find_group(const RememberedGroup& key) {
-  for (RememberedGroup& g : tl_groups) {
+// The remembered group equal to `key`, or nullptr; the caller holds the lock.
+RememberedGroup* find_group(std::vector<RememberedGroup>& groups, const RememberedGroup& key) {
+  for (RememberedGroup& g : groups) {
     if (g.hash == key.hash && g.distanceBits == key.distanceBits && g.tBits == key.tBits &&
         g.arcBits == key.arcBits && g.side == key.side && g.lengths == key.lengths &&
         g.input.size() == key.input.size() &&
@@ -142,26 +155,45 @@ RememberedGroup* find_group(const RememberedGroup& key) {
   return nullptr;
 }
 
-std::size_t points_held() {
-  std::size_t n = 0;
-  for (const RememberedGroup& g : tl_groups) n += g.input.size() + g.output.size();
-  return n;
+// Copies the curves of the remembered group equal to `key` into `curves`;
+// false when none is remembered.
+bool recall_group(const RememberedGroup& key, TaggedPointList& curves) {
+  GroupMemory& memory = group_memory();
+  std::lock_guard<std::mutex> lock(memory.mutex);
+  RememberedGroup* known = find_group(memory.groups, key);
+  if (!known) return false;
+  known->used = ++memory.clock;
+  make_room(curves, static_cast<std::int32_t>(known->output.size()));
+  for (const TaggedPoint& p : known->output) curves.Add(p);
+  return true;
 }
 
 void remember_group(RememberedGroup&& group) {
   const std::size_t size = group.input.size() + group.output.size();
   if (size > kRememberedGroupPoints / 4) return;  // a group that large rarely repeats
-  std::size_t held = points_held();
-  while (!tl_groups.empty() && (tl_groups.size() >= kRememberedGroups || held + size > kRememberedGroupPoints)) {
-    auto oldest = std::min_element(tl_groups.begin(), tl_groups.end(),
+  GroupMemory& memory = group_memory();
+  std::lock_guard<std::mutex> lock(memory.mutex);
+  if (find_group(memory.groups, group)) return;  // another thread offset it meanwhile
+  std::vector<RememberedGroup>& groups = memory.groups;
+  std::size_t held = 0;
+  for (const RememberedGroup& g : groups) held += g.input.size() + g.output.size();
+  while (!groups.empty() && (groups.size() >= kRememberedGroups || held + size > kRememberedGroupPoints)) {
+    auto oldest = std::min_element(groups.begin(), groups.end(),
                                    [](const RememberedGroup& a, const RememberedGroup& b) { return a.used < b.used; });
     held -= oldest->input.size() + oldest->output.size();
-    tl_groups.erase(oldest);
+    groups.erase(oldest);
   }
-  tl_groups.push_back(std::move(group));
+  group.used = ++memory.clock;
+  groups.push_back(std::move(group));
 }
 
 }  // namespace
+
+void forget_offset_groups() {
+  GroupMemory& memory = group_memory();
+  std::lock_guard<std::mutex> lock(memory.mutex);
+  memory.groups.clear();
+}
 
 std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t side) {
   // The fed polylines, thinned as feed_contours thins them and put on the grid.
@@ -216,11 +248,7 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
     }
     key.hash = hash;
     curves.Clear();
-    if (RememberedGroup* known = find_group(key)) {
-      known->used = ++tl_clock;
-      make_room(curves, static_cast<std::int32_t>(known->output.size()));
-      for (const TaggedPoint& p : known->output) curves.Add(p);
-    } else {
+    if (!recall_group(key, curves)) {
       engine_.reset();
       std::int32_t tag = 0;  // the polyline's number within the group
       for (std::size_t r = 0; r < runs.size(); ++r) {
@@ -242,7 +270,6 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
       emit_offsets(engine_, *this);
       out_ = &list;
       key.output.assign(curves.begin(), curves.end());
-      key.used = ++tl_clock;
       remember_group(std::move(key));
     }
     // One separator between groups: each group's curves start with one.

@@ -42,6 +42,9 @@ inline constexpr std::int32_t kSideLeft = 1;
 inline constexpr std::int32_t kSideRight = 2;
 inline constexpr std::int32_t kSideBoth = 3;
 
+// Forgets the groups compute_in_groups remembers (tests only: a fresh start).
+void forget_offset_groups();
+
 struct FeedBox {
   double xmin = kSeparatorCoord;
   double xmax = -kSeparatorCoord;
@@ -79,7 +82,7 @@ class SlopeDomain : public VD_OffsetHandler {
   // compute_offsets with the fed coordinates rounded to the feed grid and
   // the polylines split into groups that lie too far apart for their curves
   // to meet, each offset in a diagram of its own at the distance the whole
-  // list asks for, or taken from the groups the thread remembers
+  // list asks for, or taken from the groups remembered for all threads
   // (offset_groups.cpp). The curves are those of the groups, one after
   // another; -1 and the list unchanged when a group cannot be computed.
   std::int32_t compute_in_groups(TaggedPointList& list, std::int32_t side);

@@ -64,6 +64,7 @@ BooleanEngine* prepare_thread_engine() {
   reset_set(e, e.a);
   reset_set(e, e.b);
   e.pointCount = 0;
+  e.runCount = 0;
   e.edges.reset();
   e.boxes.reset();
   e.nodes.reset();

@@ -165,6 +165,8 @@ struct BooleanEngine {
   TaggedPointList output;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
+  // Runs numbered so far (box_tree.cpp), over both sets.
+  std::int32_t runCount = 0;
   // Box pairs compared at leaf pairs by the last intersection walk.
   std::int64_t leafPairTests = 0;
 
@@ -223,6 +225,9 @@ void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// A hint that (x, y) will be looked up soon: loads its bucket, or with head
+// the bucket's first vertex, into the cache.
+void grid_prefetch(const VertexGrid& g, double x, double y, bool head);
 // What a lookup of v's own coordinates by a crossing does: v becomes shared.
 void grid_share(VertexGrid& g, Vertex* v);
 // Bucket of a fine cell, never outside the table whatever the cell's sign.

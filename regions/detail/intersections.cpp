@@ -163,6 +163,8 @@ int test_boxes(BooleanEngine& e, const EdgeBox& bi, const EdgeBox& bj, std::int3
 // are disjoint subtrees (of two operands, or of one when sameOwner).
 int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, std::int32_t sameOwner) {
   if (!boxes_near(*a, *b)) return 0;
+  // Pairs within one run are never worth a test (box_tree.cpp).
+  if (sameOwner != 0 && a->run >= 0 && a->run == b->run) return 0;
   if (a->low && b->low) {
     if (walk(e, a->low, b->low, sameOwner) || walk(e, a->low, b->high, sameOwner) ||
         walk(e, a->high, b->low, sameOwner) || walk(e, a->high, b->high, sameOwner))
@@ -180,6 +182,7 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, std::int3
 
 // Every pair of distinct boxes under one node that are near.
 int walk_self(BooleanEngine& e, const BoxTreeNode* n, std::int32_t owner) {
+  if (n->run >= 0) return 0;
   if (n->low) {
     if (walk_self(e, n->low, owner) || walk_self(e, n->high, owner) || walk(e, n->low, n->high, owner)) return -1;
     return 0;

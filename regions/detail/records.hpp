@@ -47,6 +47,8 @@ struct Edge {
   // from a meeting point exactly there, whose t is always the same: a
   // second one would be dropped by the settling, so it is not recorded.
   std::uint16_t endsSplit = 0;
+  // The monotone run of its contour the edge belongs to (box_tree.cpp).
+  std::int32_t run = -1;
 };
 
 // Exact extent of an edge (normalised coordinates). Boxes are compared with
@@ -62,6 +64,8 @@ struct BoxTreeNode {
   BoxTreeNode* high = nullptr;
   std::int32_t first = 0;  // inclusive range of box indexes
   std::int32_t last = -1;
+  // The run all its boxes' edges belong to, or -1 (they belong to several).
+  std::int32_t run = -1;
 };
 
 struct SplitPoint {

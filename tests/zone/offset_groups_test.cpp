@@ -1,7 +1,7 @@
 // SlopeDomain::compute with the Voronoi engine, where polylines too far
 // apart for their curves to meet are offset as separate groups and
-// remembered per thread: the same curves, byte for byte, whether a group is
-// offset with others, alone, fresh or remembered, on any thread; inputs a
+// remembered: the same curves, byte for byte, whether a group is offset
+// with others, alone, fresh or remembered, on any thread; inputs a
 // last bit apart give the same curves; groups close enough to meet stay one
 // diagram.
 #include <gtest/gtest.h>
@@ -42,10 +42,11 @@ struct Bits {
   bool operator==(const Bits&) const = default;
 };
 
-// The offset curves of `polylines`, computed on a fresh thread after
-// `before` (other offsets the thread computes first, which it remembers).
+// The offset curves of `polylines`, computed on a fresh thread with nothing
+// remembered, after `before` (other offsets computed first, and remembered).
 Bits offset_on_fresh_thread(const std::vector<std::vector<Point2d>>& polylines, double distance, int side,
                             const std::vector<std::vector<std::vector<Point2d>>>& before = {}) {
+  forget_offset_groups();
   Bits out;
   std::thread([&] {
     voronoi_offset_engine().initialize();

@@ -91,6 +91,20 @@ bool SegmentPhase() {
   return true;
 }
 
+// Every live node at finite coordinates with a finite clearance of at
+// least zero. A node that is not would put a wrong diagram (and offsets
+// from nowhere) behind a success; one pass over the nodes costs little
+// beside building them.
+bool NodesFinite() {
+  const Engine& g = Vd();
+  for (std::int32_t n = 0; n < g.nodes.count; ++n) {
+    const NodeRecord& r = g.nodes[n];
+    if (r.status == DELETED) continue;
+    if (!std::isfinite(r.x) || !std::isfinite(r.y) || !std::isfinite(r.r) || !(r.r >= 0.0)) return false;
+  }
+  return true;
+}
+
 }  // namespace
 
 void ClearDiagram() {
@@ -226,9 +240,10 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
   // A fallback builds what it can; its diagram counts as computed only when
   // it passes the checker's local tests (topology, every node equidistant
   // from its sites, no site across an edge inside a node's circle, every
-  // point with a region). Otherwise the computation ends without a diagram
-  // rather than report a wrong one.
-  if (g.recoveryMode && !CheckDiagram(CheckOptions{true, false, true}).empty()) {
+  // point with a region). Otherwise, or with a node of no finite place or
+  // clearance, the computation ends without a diagram rather than report a
+  // wrong one.
+  if (!NodesFinite() || (g.recoveryMode && !CheckDiagram(CheckOptions{true, false, true}).empty())) {
     g.upToDate = false;
     g.computing = false;
     finished = true;

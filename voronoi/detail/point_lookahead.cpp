@@ -8,6 +8,7 @@ namespace zt::vd {
 
 std::int32_t PointLookahead::Next(Nearest& nearest) {
   Engine& g = Vd();
+  if (walk_) return NextByWalk(nearest);
   while (count_ < kSlots) {
     const Draw d = DrawNext();
     if (d.entry < 0) break;
@@ -15,7 +16,6 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
     g.points.Prefetch(d.entry);
   }
   if (count_ == 0) return kNone;
-  if (walk_) return NextByWalk(nearest);
   // Slots advance in order, so the searches run in draw order.
   for (int i = 0; i < count_; ++i) {
     Slot& s = At(i);
@@ -53,12 +53,15 @@ std::int32_t PointLookahead::NextByWalk(Nearest& nearest) {
   // The walk starts at the point inserted last; a point merged away has no
   // region, and then the site its own walk ended at is as close.
   if (last_ >= 0 && g.points[last_].vd >= 0 && !g.points[last_].deleted) from_ = last_;
-  const std::int32_t p = At(0).point;
+  const std::int32_t p = DrawNext().entry;
+  if (p < 0) return kNone;
+  // A presorted order is drawn front to back: the record of the point
+  // kSlots - 1 draws ahead is requested now.
+  const std::int32_t ahead = g.insertionOrder.count - g.orderRemaining + kSlots - 2;
+  if (ahead < g.insertionOrder.count) g.points.Prefetch(g.insertionOrder[ahead]);
   nearest = g.points[p].deleted ? Nearest{} : WalkToNearest(from_, p);
   if (nearest.point >= 0) from_ = nearest.point;
   last_ = p;
-  first_ = (first_ + 1) % kSlots;
-  --count_;
   return p;
 }
 

@@ -53,7 +53,9 @@ class PointLookahead {
   // A checkpoint inside an insertion: one step of one of the walks under
   // way, in turn, so that a walk's next record has time to arrive.
   void Step(Engine& g) {
-    if (count_ == 0) return;
+    // Walks through the diagram need no hints: the last insertion left the
+    // records around the next point in cache.
+    if (walk_ || count_ == 0) return;
     if (++turn_ >= count_) turn_ = 0;
     Slot& s = At(turn_);
     if (s.pathNode >= 0) s.pathNode = NearestPathStep(s.pathNode, s.x, s.y);

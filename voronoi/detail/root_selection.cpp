@@ -108,7 +108,8 @@ double radius_band(const EdgeFrame& e, Point2d c) {
 
 bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain& chain) {
   // A root at an end node lies on the edge, whichever side of that node the
-  // rounding puts it: C1 decides only beyond the rounding band.
+  // rounding puts it, and a root at the edge's apex lies within its radius
+  // band: C1 and C3 decide only beyond the rounding band.
   const auto extent = [&](Point2d c) {
     const double x = extent_on_edge(e, c);
     return x <= kRootExtentBand ? 0.0 : x;
@@ -117,7 +118,11 @@ bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain
   for (int i = 0; i < chain.count; ++i) {
     if (int v = compare(chain.c2[i]->beyond(n1), chain.c2[i]->beyond(n2))) return v < 0;
   }
-  if (int v = compare(radius_band(e, n1), radius_band(e, n2))) return v < 0;
+  const auto band = [&](Point2d c) {
+    const double x = radius_band(e, c);
+    return x <= kRootExtentBand ? 0.0 : x;
+  };
+  if (int v = compare(band(n1), band(n2))) return v < 0;
   const Point2d g = e.gone().p;
   return !(norm2(sub(n2, g)) < norm2(sub(n1, g)));
 }

@@ -9,7 +9,7 @@
 //   C2  for a segment: how far the candidate's foot lies beyond it;
 //   C3  radius band: how far the candidate's clearance lies outside the
 //       radii of the edge's end nodes (down to the clearance of the edge's
-//       apex where the edge passes it);
+//       apex where the edge passes it), 0 within kRootExtentBand;
 //   C4  0 for the candidate nearer to the deleted end node, 1 for the other.
 #pragma once
 
@@ -17,8 +17,8 @@
 
 namespace zt::vd::geo {
 
-// Distances to the edge's nearer end up to this count as on the edge in C1:
-// the rounding of a root that coincides with an end node.
+// Distances up to this count as 0 in C1 and C3: the rounding of a root that
+// coincides with an end node, or with the apex of the edge.
 inline constexpr double kRootExtentBand = 1e-11;
 
 // Signed position of end node x along the edge relative to candidate c, as a
