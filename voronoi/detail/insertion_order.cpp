@@ -40,32 +40,33 @@ namespace {
 
 // Shuffles the order built by BuildOrder and sorts its rounds along the
 // Hilbert curve through the box of the sites' positions (at(i) gives the
-// position of entry i); the draws then take it front to back.
+// position of entry i); the draws then take it front to back. The keys are
+// taken in index order, before the shuffle moves them with their entries:
+// the records are read one after the other, not scattered.
 template <class At>
 void PresortRounds(At&& at) {
   Engine& g = Vd();
   std::int32_t* order = g.insertionOrder.data;
   const std::int32_t n = g.insertionOrder.count;
-  for (std::int32_t i = n - 1; i > 0; --i) {
-    const std::int32_t j = static_cast<std::int32_t>(g.random() % static_cast<std::uint32_t>(i + 1));
-    std::swap(order[i], order[j]);
-  }
   g.orderPresorted = true;
-  const Point2d p0 = at(order[0]);
-  double minX = p0.x, maxX = minX, minY = p0.y, maxY = minY;
+  std::vector<Point2d> pos(static_cast<std::size_t>(n));
+  for (std::int32_t i = 0; i < n; ++i) pos[i] = at(order[i]);
+  double minX = pos[0].x, maxX = minX, minY = pos[0].y, maxY = minY;
   for (std::int32_t i = 1; i < n; ++i) {
-    const Point2d p = at(order[i]);
-    minX = std::fmin(minX, p.x), maxX = std::fmax(maxX, p.x);
-    minY = std::fmin(minY, p.y), maxY = std::fmax(maxY, p.y);
+    minX = std::fmin(minX, pos[i].x), maxX = std::fmax(maxX, pos[i].x);
+    minY = std::fmin(minY, pos[i].y), maxY = std::fmax(maxY, pos[i].y);
   }
   const double span = std::fmax(maxX - minX, maxY - minY);
   const double toGrid = span > 0 ? 4294967295.0 / span : 0.0;
   std::vector<std::pair<std::uint64_t, std::int32_t>> keyed(static_cast<std::size_t>(n));
   for (std::int32_t i = 0; i < n; ++i) {
-    const Point2d p = at(order[i]);
-    const auto gx = static_cast<std::uint32_t>(std::fmin((p.x - minX) * toGrid, 4294967295.0));
-    const auto gy = static_cast<std::uint32_t>(std::fmin((p.y - minY) * toGrid, 4294967295.0));
+    const auto gx = static_cast<std::uint32_t>(std::fmin((pos[i].x - minX) * toGrid, 4294967295.0));
+    const auto gy = static_cast<std::uint32_t>(std::fmin((pos[i].y - minY) * toGrid, 4294967295.0));
     keyed[i] = {HilbertKey(gx, gy), order[i]};
+  }
+  for (std::int32_t i = n - 1; i > 0; --i) {
+    const std::int32_t j = static_cast<std::int32_t>(g.random() % static_cast<std::uint32_t>(i + 1));
+    std::swap(keyed[i], keyed[j]);
   }
   // Rounds [n/2, n), [n/4, n/2), ... down to the first, left random.
   for (std::int32_t hi = n; hi >= 2 * kFirstRound; hi /= 2) {
