@@ -17,6 +17,8 @@
 #include <limits>
 #include <new>
 
+#include "core/fatal_gate.hpp"
+
 namespace zt {
 
 // Line numbers the fatal report names for each operation; the calling suite's
@@ -34,6 +36,7 @@ inline constexpr const char* kInvalidArrayIndex = "Invalid Array Index";
 
 // Writes the fatal report to standard output and ends the process with status 1.
 [[noreturn]] inline void FatalError(const char* file, int line, const char* message) {
+  claim_fatal_end();
   std::fputs("\n\a", stdout);
   std::fputs("*************************************\n", stdout);
   std::printf("*** ERROR : %s\n", message ? message : "");

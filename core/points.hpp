@@ -7,6 +7,7 @@
 #pragma once
 
 #include <cstdint>
+#include <limits>
 
 #include "core/array_impl.hpp"
 
@@ -47,5 +48,18 @@ struct Point2f {
 };
 
 using TaggedPointList = Array<TaggedPoint>;
+
+// Makes room for `extra` more elements, at least doubling the storage when
+// it grows: lists filled element by element (growth steps of a hundred)
+// would otherwise copy themselves over and over on large levels.
+template <typename T>
+void make_room(Array<T>& list, std::int32_t extra) {
+  const std::int64_t wanted = std::int64_t{list.count()} + extra;
+  if (wanted <= list.capacity()) return;
+  const std::int64_t doubled = 2 * std::int64_t{list.capacity()};
+  const std::int64_t size = wanted > doubled ? wanted : doubled;
+  list.SetCapacity(size > std::numeric_limits<std::int32_t>::max() ? std::numeric_limits<std::int32_t>::max()
+                                                                   : static_cast<std::int32_t>(size));
+}
 
 }  // namespace zt

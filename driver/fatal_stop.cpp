@@ -4,6 +4,8 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "core/fatal_gate.hpp"
+
 namespace zt {
 
 namespace {
@@ -42,6 +44,7 @@ std::string fatal_stop_text(std::initializer_list<StopPiece> message,
 
 void fatal_stop(std::string_view routine, std::initializer_list<StopPiece> message,
                 std::span<const std::int32_t> values) {
+  claim_fatal_end();
   const std::string text = fatal_stop_text(message, values);
   if (!trim_right(routine).empty()) {
     std::printf(" Fatal error in %.*s : \n", static_cast<int>(routine.size()), routine.data());

@@ -45,20 +45,28 @@ bool find_level(const float& z, const LevelTable& table, std::int32_t& first, st
   return false;
 }
 
-void read_level_points(const std::int32_t& unit, const std::int32_t& first, const std::int32_t& last,
-                       std::vector<Point2f>& points) {
+bool read_level_points(const std::int32_t& unit, const std::int32_t& first, const std::int32_t& last,
+                       std::vector<Point2f>& points, RecordFaultInfo& fault) {
   points.clear();
-  if (first < 1 || last < first) return;
-  if (record_position(unit) > first) rewind_unit(unit);
+  fault = {};
+  if (first < 1 || last < first) return true;
+  if (record_position(unit) > first && !rewind_unit(unit, fault)) return false;
   float x = 0, y = 0, z = 0;
   while (record_position(unit) < first) {
-    if (!read_record_xyz(unit, x, y, z)) return;
+    if (!read_record_xyz(unit, x, y, z, fault)) return fault.fault == RecordFault::kNone;
   }
   const std::int64_t n = static_cast<std::int64_t>(last) - first + 1;
   for (std::int64_t i = 0; i < n; ++i) {
-    if (!read_record_xyz(unit, x, y, z)) return;
+    if (!read_record_xyz(unit, x, y, z, fault)) return fault.fault == RecordFault::kNone;
     points.push_back({x, y});
   }
+  return true;
+}
+
+void read_level_points(const std::int32_t& unit, const std::int32_t& first, const std::int32_t& last,
+                       std::vector<Point2f>& points) {
+  RecordFaultInfo fault;
+  if (!read_level_points(unit, first, last, points, fault)) record_stop(fault);
 }
 
 }  // namespace zt

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "core/points.hpp"
+#include "driver/record_fault.hpp"
 
 namespace zt {
 
@@ -51,7 +52,11 @@ bool find_level(const float& z, const LevelTable& table, std::int32_t& first, st
 // range can be read in any order. An empty or inverted range, or a file that
 // ends before `first`, gives no points; a file that ends inside the range
 // gives the points up to its end.
+// With `fault`, a fault of the file is handed back (false, the points read
+// so far kept) instead of stopping the program.
 void read_level_points(const std::int32_t& unit, const std::int32_t& first, const std::int32_t& last,
                        std::vector<Point2f>& points);
+bool read_level_points(const std::int32_t& unit, const std::int32_t& first, const std::int32_t& last,
+                       std::vector<Point2f>& points, RecordFaultInfo& fault);
 
 }  // namespace zt

@@ -102,24 +102,34 @@ void attach_record_output(const std::int32_t& unit, const std::string& path) {
   }
 }
 
-bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z) {
+bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z, RecordFaultInfo& fault) {
   Unit& u = reader_unit(unit);
+  fault = {};
   std::uint8_t head[kPointXyzBytes];
   std::size_t length = 0;
   switch (u.in.read(head, length)) {
     case ReadStatus::kEnd: return false;
-    case ReadStatus::kFault: record_stop(u.in.fault());
+    case ReadStatus::kFault: fault = u.in.fault(); return false;
     case ReadStatus::kRecord: break;
   }
   const std::int64_t record = u.in.next_record() - 1;
   if (length < kPointXyzBytes) {
-    record_stop({RecordFault::kShortRecord, u.path, record, std::to_string(length) + " bytes"});
+    fault = {RecordFault::kShortRecord, u.path, record, std::to_string(length) + " bytes"};
+    return false;
   }
   decode_xyz(head, x, y, z);
   if (!std::isfinite(x) || !std::isfinite(y) || !std::isfinite(z)) {
-    record_stop({RecordFault::kNonFinite, u.path, record, {}});
+    fault = {RecordFault::kNonFinite, u.path, record, {}};
+    return false;
   }
   return true;
+}
+
+bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z) {
+  RecordFaultInfo fault;
+  if (read_record_xyz(unit, x, y, z, fault)) return true;
+  if (fault.fault != RecordFault::kNone) record_stop(fault);
+  return false;
 }
 
 std::int32_t record_position(const std::int32_t& unit) {
@@ -130,9 +140,17 @@ std::int32_t record_position(const std::int32_t& unit) {
   return static_cast<std::int32_t>(next);
 }
 
-void rewind_unit(const std::int32_t& unit) {
+bool rewind_unit(const std::int32_t& unit, RecordFaultInfo& fault) {
   Unit& u = reader_unit(unit);
-  if (!u.in.rewind()) record_stop(u.in.fault());
+  fault = {};
+  if (u.in.rewind()) return true;
+  fault = u.in.fault();
+  return false;
+}
+
+void rewind_unit(const std::int32_t& unit) {
+  RecordFaultInfo fault;
+  if (!rewind_unit(unit, fault)) record_stop(fault);
 }
 
 void write_point_record(const std::int32_t& unit, float x, float y, float z, std::int32_t code,

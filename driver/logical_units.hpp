@@ -10,6 +10,8 @@
 #include <cstdint>
 #include <string>
 
+#include "driver/record_fault.hpp"
+
 namespace zt {
 
 inline constexpr std::int32_t kFirstUnit = 3;
@@ -29,10 +31,15 @@ void attach_record_output(const std::int32_t& unit, const std::string& path);
 // Stops on a fault, on a record shorter than three floats and on a
 // non-finite value.
 bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z);
+// read_record_xyz that hands a fault to the caller instead of stopping:
+// false with `fault` set (kNone at the end of the file).
+bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z, RecordFaultInfo& fault);
 // Number (from 1) of the record the next read returns.
 std::int32_t record_position(const std::int32_t& unit);
 // Back to the first record.
 void rewind_unit(const std::int32_t& unit);
+// rewind_unit that hands a fault to the caller: false with `fault` set.
+bool rewind_unit(const std::int32_t& unit, RecordFaultInfo& fault);
 
 // Writes one point record (18 bytes). Stops on a fault.
 void write_point_record(const std::int32_t& unit, float x, float y, float z, std::int32_t code,

@@ -103,14 +103,18 @@ void show_banner() {
 struct StockLevels final : LevelSource {
   const std::int32_t unit = free_unit();
   std::int32_t count() const override { return g_stockLevels.count(); }
-  bool read(std::int32_t i, float& z, std::vector<Point2f>& points) override {
+  RecordFaultInfo pending;  // the fault of the last level read
+  LevelRead read(std::int32_t i, float& z, std::vector<Point2f>& points) override {
     z = g_stockLevels.z[static_cast<std::size_t>(i - 1)];
     std::int32_t first = 0, last = 0;
-    if (!find_level(z, g_stockLevels, first, last)) return false;
-    read_level_points(unit, first, last, points);
-    return static_cast<std::int32_t>(points.size()) > kMinLevelRecords;
+    if (!find_level(z, g_stockLevels, first, last)) return LevelRead::kNothing;
+    // A fault stops the run only once the levels before are done, as when
+    // the levels are read one at a time.
+    if (!read_level_points(unit, first, last, points, pending)) return LevelRead::kFault;
+    return static_cast<std::int32_t>(points.size()) > kMinLevelRecords ? LevelRead::kPoints : LevelRead::kNothing;
   }
   void done(std::int32_t i) override { progress(count(), i); }
+  void fault(std::int32_t) override { record_stop(pending); }
 };
 
 }  // namespace

@@ -5,6 +5,8 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "core/fatal_gate.hpp"
+
 #include "driver/detail/unit_cleanup.hpp"
 
 namespace zt {
@@ -45,6 +47,7 @@ std::string record_fault_message(const RecordFaultInfo& info) {
 }
 
 void record_stop(const RecordFaultInfo& info) {
+  claim_fatal_end();
   detail::abandon_record_outputs();
   std::fflush(stdout);
   const std::string m = record_fault_message(info);

@@ -44,6 +44,7 @@ void SlopeDomain::approximate_arc(const Point2d& s, const Point2d& e, const Poin
   const double chords = std::floor(angle / (2.0 * half));
   const std::int32_t n =
       chords < kMaxChords ? static_cast<std::int32_t>(chords) + 1 : static_cast<std::int32_t>(kMaxChords);
+  make_room(out, n + 1);
   const double delta = (ccw ? 1.0 : -1.0) * angle / n;
   const double cd = std::cos(delta), sd = std::sin(delta);
   if (withStart) out.Add({0, s.x, s.y});

@@ -34,6 +34,7 @@ bool expand_name(const char* name, char (&buffer)[kNameCapacity]) {
 }
 
 void append_all(const TaggedPointList& from, TaggedPointList& to) {
+  make_room(to, from.count());
   for (const TaggedPoint& p : from) to.Add(p);
 }
 
@@ -190,6 +191,7 @@ std::int32_t assemble_at_once(ZoneBuilderState& state, ScratchFile& zones, std::
 std::int32_t grow_level_zones(const Point2f* points, std::int32_t n, TaggedPointList& B,
                               TaggedPointList& C) {
   B.Clear();
+  make_room(B, n);
   for (std::int32_t i = 0; i < n; ++i) {
     const std::int32_t tag = points[i].x >= kMergeSeparatorX ? kSeparatorTag : 0;
     B.Add({tag, double{points[i].x}, double{points[i].y}});

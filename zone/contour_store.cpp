@@ -98,6 +98,8 @@ std::int32_t read_contour_level(ContourStore& store, std::int32_t index, TaggedP
   // Records of 12 or 16 bytes carry no flag: their points get the tag every
   // record of this suite carries, never bytes left from another record.
   const bool withFlag = reader.recordSize() >= kRecordWithFlag;
+  const std::int64_t records = level.last - level.first + 1;
+  if (records < std::numeric_limits<std::int32_t>::max()) make_room(list, static_cast<std::int32_t>(records));
   for (std::int64_t r = level.first; r <= level.last; ++r) {
     float x = 0.0f, y = 0.0f, z = 0.0f;
     std::int32_t code = 0;

@@ -72,6 +72,7 @@ std::int32_t store_level_zone(ZoneBuilderState& state, float z, const std::vecto
 struct LevelJob {
   std::int32_t index = 0;
   bool active = false;  // the source gave points to add
+  bool faulted = false;  // the source could not read the level
   bool failed = false;  // the context or the finishing contours could not be read
   float z = 0.0f;
   double offsetDistance = kMinOffsetDistance;
@@ -98,7 +99,13 @@ void add_levels_in_turn(LevelSource& source, std::int32_t& ierr) {
   std::vector<Point2f> points;
   for (std::int32_t i = 1; i <= source.count(); ++i) {
     float z = 0.0f;
-    if (source.read(i, z, points)) {
+    const LevelRead got = source.read(i, z, points);
+    if (got == LevelRead::kFault) {
+      source.fault(i);
+      ierr = -1;
+      return;
+    }
+    if (got == LevelRead::kPoints) {
       wf_add_level(z, points.data(), static_cast<std::int32_t>(points.size()), ierr);
       if (ierr != 0) return;
     }
@@ -151,6 +158,10 @@ void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
   // Stores the oldest level and reports it done; false when it failed.
   auto finish_oldest = [&]() {
     LevelJob& job = *running.front();
+    if (job.faulted) {
+      source.fault(job.index);
+      return false;
+    }
     if (job.active) {
       if (job.done.valid()) job.done.wait();
       if (job.failed || job.status != 0 || store_level_zone(state, job.z, job.result) != 0) return false;
@@ -170,8 +181,12 @@ void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
     }
     auto job = std::make_unique<LevelJob>();
     job->index = i;
-    job->active = source.read(i, job->z, job->points);
-    if (job->active) {
+    const LevelRead got = source.read(i, job->z, job->points);
+    job->active = got == LevelRead::kPoints;
+    if (got == LevelRead::kFault) {
+      job->faulted = true;
+      reading = false;  // the levels before it end first, in order
+    } else if (job->active) {
       ZoneContext* context = level_context(state);
       if (!context || read_level_contours(*context, double{job->z}, job->contour) != 0) {
         job->failed = true;

@@ -40,22 +40,33 @@ void wf_add_level(const float& z, const Point2f* points, const std::int32_t& cou
                   std::int32_t& ierr);
 
 // The stock levels as the driver hands them to wf_add_levels.
+// What reading a level gave.
+enum class LevelRead { kNothing, kPoints, kFault };
+
 class LevelSource {
  public:
   virtual ~LevelSource() = default;
   // Number of stock levels.
   virtual std::int32_t count() const = 0;
-  // Level i (from 1, top down): its z and rest-material pairs; false when
-  // the level has nothing to add. Called in level order on one thread.
-  virtual bool read(std::int32_t i, float& z, std::vector<Point2f>& points) = 0;
+  // Level i (from 1, top down): its z and rest-material pairs (kPoints), or
+  // nothing to add (kNothing), or a fault of the source that must end the
+  // run (kFault). Called in level order on one thread, possibly ahead of
+  // the levels being computed.
+  virtual LevelRead read(std::int32_t i, float& z, std::vector<Point2f>& points) = 0;
   // Level i is done: its zones are in "$TMP/temp1". Called in level order.
   virtual void done(std::int32_t i) = 0;
+  // Ends the run on the fault that reading level i gave (the driver's stop
+  // does not return). Called once every level before i is done and none of
+  // them failed: a level read ahead ends the run as it would have ended had
+  // it been read in turn. When it returns, the run ends with ierr -1.
+  virtual void fault(std::int32_t i) = 0;
 };
 
 // wf_add_level for every level of `source`, several levels at once on
 // worker threads (see zone/worker_pool.hpp). temp1 and the level range table
 // come out as from one wf_add_level per level in order; a level that fails
-// ends the run there (ierr -1) with every level before it stored and done.
+// ends the run there (ierr -1) with every level before it stored and done;
+// so does a level whose reading faulted, after source.fault.
 void wf_add_levels(LevelSource& source, std::int32_t& ierr);
 
 // Assembles the final zones over all levels and writes them, as closed

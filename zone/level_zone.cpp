@@ -82,7 +82,8 @@ std::int32_t level_zone_from_contours(ZoneContext& work, TaggedPointList& contou
   build_level_zones(work, points, count);
   result.clear();
   if (!has_edge(work.zonePoints)) return 0;
-  if (rg_boolean(contour, work.zonePoints, "i", &contour) != 0) return -1;
+  simplify_polylines(contour, work.finishingPoints, kFinishingThinTolerance);
+  if (rg_boolean(work.finishingPoints, work.zonePoints, "i", &contour) != 0) return -1;
   result.reserve(static_cast<std::size_t>(contour.count()));
   for (const TaggedPoint& p : contour) {
     result.push_back({static_cast<float>(p.x), static_cast<float>(p.y)});

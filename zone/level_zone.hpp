@@ -6,7 +6,8 @@
 // bound intersected with the region of the finishing contours of the same z.
 // When the engine cannot offset, the rest material itself stands in for its
 // offset. The result goes to context.levelResult as single-precision pairs,
-// separators (99999, 99999) included. Rest material that grows into no curve
+// separators (99999, 99999) included. The finishing contours enter the
+// intersection thinned within kFinishingThinTolerance. Rest material that grows into no curve
 // at all (nothing to feed: points, contours below the engine's extent) gives
 // the level no zones rather than an empty operand of the intersection.
 #pragma once
@@ -15,6 +16,7 @@
 #include <vector>
 
 #include "core/points.hpp"
+#include "zone/slope_domain.hpp"
 #include "zone/zone_context.hpp"
 
 namespace zt {
@@ -25,6 +27,12 @@ inline constexpr float kInputSeparatorX = 99990.0f;
 inline constexpr std::int32_t kLevelListCapacity = 10000;
 // Tolerance of the thinning of the offset curves.
 inline constexpr double kLevelSimplifyTolerance = 0.005;
+// The finishing contours are thinned within this before the intersection:
+// they are sampled far more densely than the zones need (fillets every few
+// microns), and the intersection's work grows with their points. A tenth of
+// the arc tolerance of the offsets, so the zones move by no more than a
+// tenth of what the offsets' chords already allow.
+inline constexpr double kFinishingThinTolerance = kArcTolerance / 10;
 // Tag of a rest-material point.
 inline constexpr std::int32_t kRestPointTag = 0;
 

@@ -139,6 +139,7 @@ void simplify_polylines(const TaggedPointList& in, TaggedPointList& out, double 
     for (std::int32_t k = start; k < i; ++k) work.push_back({in[k].x, in[k].y});
     const std::int32_t kept = simplifier.simplify(work.data(), static_cast<std::int32_t>(work.size()),
                                                   kPolylineRadialEps, tolerance);
+    make_room(out, kept + 1);
     out.Add(TaggedPoint::separator());
     for (std::int32_t k = 0; k < kept; ++k) out.Add({1, work[k].x, work[k].y});
   }

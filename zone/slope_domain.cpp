@@ -97,7 +97,7 @@ std::int32_t SlopeDomain::compute(TaggedPointList& list, std::int32_t side) {
     slot->side = side;
   }
   copy_list(list, slot->input);
-  const std::int32_t r = compute_offsets(list, side);
+  const std::int32_t r = compute_in_groups(list, side);
   if (r == 0) {
     copy_list(list, slot->output);
   } else {
@@ -123,16 +123,12 @@ std::int32_t SlopeDomain::compute_offsets(TaggedPointList& list, std::int32_t si
   return 0;
 }
 
-std::int32_t SlopeDomain::feed_contours(const TaggedPointList& list, FeedBox& box) {
+bool SlopeDomain::next_fed_polyline(const TaggedPointList& list, std::int32_t& i) {
   const std::int32_t count = list.count();
-  if (count > polyline_.capacity()) polyline_.SetCapacity(count);
-  if (count == 0) return 0;
-  std::int32_t fed = 0;
-  std::int32_t i = 0;
   for (;;) {
     polyline_.Clear();
     while (i < count && list[i].x >= kFeedSeparatorX) ++i;
-    if (i == count) return fed;
+    if (i == count) return false;
     double xmin = list[i].x, xmax = list[i].x, ymin = list[i].y, ymax = list[i].y;
     for (; i < count && list[i].x <= kFeedSeparatorX; ++i) {
       const TaggedPoint& p = list[i];
@@ -151,6 +147,15 @@ std::int32_t SlopeDomain::feed_contours(const TaggedPointList& list, FeedBox& bo
       polyline_.Clear();
       for (const Point2d& p : *thinned) polyline_.Add(p);
     }
+    return true;
+  }
+}
+
+std::int32_t SlopeDomain::feed_contours(const TaggedPointList& list, FeedBox& box) {
+  const std::int32_t count = list.count();
+  if (count > polyline_.capacity()) polyline_.SetCapacity(count);
+  std::int32_t fed = 0;
+  for (std::int32_t i = 0; next_fed_polyline(list, i);) {
     const std::int32_t n = polyline_.count();
     auto widen = [&box](const Point2d& p) {
       box.xmin = std::min(box.xmin, p.x);
@@ -171,6 +176,7 @@ std::int32_t SlopeDomain::feed_contours(const TaggedPointList& list, FeedBox& bo
     }
     ++fed;
   }
+  return fed;
 }
 
 void SlopeDomain::initOutput(std::int32_t curves) {
@@ -182,10 +188,12 @@ void SlopeDomain::initOutput(std::int32_t curves) {
 void SlopeDomain::initCurve(double, double startX, double startY, std::int32_t) {
   assert(curveStart == -1 && "curves do not nest");
   curveStart = out_->count();
+  make_room(*out_, 1);
   out_->Add({0, startX, startY});
 }
 
 void SlopeDomain::writeLineSegment(double, double, double endX, double endY, SiteRef) {
+  make_room(*out_, 1);
   out_->Add({0, endX, endY});
 }
 
@@ -196,6 +204,7 @@ void SlopeDomain::writeCircularArc(double startX, double startY, double endX, do
 
 void SlopeDomain::endCurve(std::int32_t, std::int32_t) {
   if (curveStart != -1) {
+    make_room(*out_, 2);
     out_->Add(out_->At(curveStart));
     curveStart = -1;
   }

@@ -31,10 +31,19 @@ inline constexpr double kMinFeedExtent = 0.001;
 inline constexpr double kFeedSeparatorX = 90000.0;
 // The half diagonal factor of the fed contours' box that bounds the offset.
 inline constexpr double kDiagonalFactor = 0.49;
+// Polylines whose boxes lie farther apart than twice the offset distance
+// and this are offset as separate groups (compute_in_groups).
+inline constexpr double kGroupGapMargin = 0.01;
+// compute_in_groups feeds coordinates rounded to multiples of 2^-this (about
+// a nanometre in millimetres): inputs a last bit apart feed alike.
+inline constexpr int kFeedGridExponent = 30;
 // Offset sides as the engine takes them.
 inline constexpr std::int32_t kSideLeft = 1;
 inline constexpr std::int32_t kSideRight = 2;
 inline constexpr std::int32_t kSideBoth = 3;
+
+// Forgets the groups compute_in_groups remembers (tests only: a fresh start).
+void forget_offset_groups();
 
 struct FeedBox {
   double xmin = kSeparatorCoord;
@@ -65,15 +74,26 @@ class SlopeDomain : public VD_OffsetHandler {
   // diagram or the offsets, the list unchanged.
   // An input equal in its coordinates to one of the last few the thread
   // offset at the same distance and side gets that result again without the
-  // engine (the Voronoi engine only: a stand-in is asked every time).
+  // engine; any other goes through compute_in_groups (the Voronoi engine
+  // only: a stand-in is asked every time, through compute_offsets).
   std::int32_t compute(TaggedPointList& list, std::int32_t side);
   // compute without looking at what was computed before.
   std::int32_t compute_offsets(TaggedPointList& list, std::int32_t side);
+  // compute_offsets with the fed coordinates rounded to the feed grid and
+  // the polylines split into groups that lie too far apart for their curves
+  // to meet, each offset in a diagram of its own at the distance the whole
+  // list asks for, or taken from the groups remembered for all threads
+  // (offset_groups.cpp). The curves are those of the groups, one after
+  // another; -1 and the list unchanged when a group cannot be computed.
+  std::int32_t compute_in_groups(TaggedPointList& list, std::int32_t side);
 
   // Feeds every polyline of two or more points and of extent at least
   // kMinFeedExtent, thinned, widening `box` with the fed points; returns the
   // number of polylines fed.
   std::int32_t feed_contours(const TaggedPointList& list, FeedBox& box);
+  // The next polyline to feed from list[i..], thinned, into the buffer;
+  // false when none is left.
+  bool next_fed_polyline(const TaggedPointList& list, std::int32_t& i);
 
   // Appends to the output list the chord points of the arc from s to e
   // around c (counter-clockwise when ccw), with s and e when asked.

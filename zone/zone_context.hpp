@@ -37,6 +37,7 @@ struct ZoneContext {
   TaggedPointList zonePoints{0, kContextListGrowth};
   std::vector<Point2f> levelResult;
   TaggedPointList restPoints{0, kContextListGrowth};
+  TaggedPointList finishingPoints{0, kContextListGrowth};  // thinned for the intersection
   double offsetDistance = kMinOffsetDistance;
 };
 

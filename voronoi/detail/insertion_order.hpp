@@ -27,12 +27,6 @@ void BuildOrder(std::int32_t first, std::int32_t end);
 // points are drawn as a random order.
 void BuildPointOrder(std::int32_t first, std::int32_t end);
 
-// The segment phase's order of the segment indices first .. end-1, partly
-// sorted as the point order is, by the segments' midpoints: consecutive
-// insertions then work on nearby records of the diagram, which the point
-// phase laid out in the same curve's order.
-void BuildSegmentOrder(std::int32_t first, std::int32_t end);
-
 struct Draw {
   std::int32_t entry;   // -1 when the order is exhausted
   std::uint32_t value;  // the generator's value behind it

@@ -259,6 +259,7 @@ void CleanInput(bool sortSegments) {
     SegmentRecord* out = b;
     for (SegmentRecord* it = b; it != e; ++it) {
       if (out != b && key(*(out - 1)) == key(*it)) {
+        AbsorbRepeatedSegment(*(out - 1), *it);
         ++g.removedSegments;
         continue;
       }

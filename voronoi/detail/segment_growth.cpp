@@ -48,12 +48,18 @@ bool TieAcrossEdge(const SegmentInsertion& si, std::int32_t e, double value, dou
 }
 
 // One attempt: depth first from the start node, through every node in
-// conflict within tol. True when the end node was reached.
-bool GrowOnce(const SegmentInsertion& si, double tol) {
+// conflict within tol. True when the end node was reached. `isTree` tells
+// whether the nodes marked VISITED form a tree: they are connected, so they
+// do when their edges among themselves number one less than they.
+bool GrowOnce(const SegmentInsertion& si, double tol, bool& isTree) {
   Engine& g = Vd();
   g.stack.count = 0;
   TouchNode(si.start, VISITED);
   g.stack.Append(si.start, kScratchGrowth);
+  // Nodes on the segment's end points are marked VISITED but not entered: an
+  // edge between two entered nodes is met from both, one to such a leaf once.
+  std::int64_t visited = 1, twiceInner = 0, leafEdges = 0;
+  const auto isLeaf = [&](std::int32_t w) { return w != si.start && g.nodes[w].site >= 0; };
   while (g.stack.count > 0) {
     const std::int32_t n = g.stack[--g.stack.count];
     const std::int32_t e0 = g.nodes[n].edge;
@@ -66,13 +72,29 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
       RecordSite(er.lft, er.ltype);
       RecordSite(er.rgt, er.rtype);
       const NodeRecord& wn = g.nodes[w];
-      if (wn.status == UNCHECKED) {
+      if (wn.status == VISITED) {
+        ++(isLeaf(w) ? leafEdges : twiceInner);
+      } else if (wn.status == UNCHECKED) {
         if (wn.site >= 0) {
           // A node on an input point: part of the tree only when the point
           // ends this segment, and never passed through.
-          TouchNode(w, (wn.site == si.i1 || wn.site == si.i2) ? VISITED : CHECKED);
+          const bool end = wn.site == si.i1 || wn.site == si.i2;
+          TouchNode(w, end ? VISITED : CHECKED);
+          if (end) {
+            ++visited, ++leafEdges;
+            // Edges between two such leaves are met from neither.
+            const std::int32_t f0 = wn.edge;
+            std::int32_t f = f0;
+            do {
+              const EdgeRecord& fr = g.edges[f];
+              const std::int32_t u = OtherNode(fr, w);
+              if (u != w && g.nodes[u].status == VISITED && isLeaf(u)) ++leafEdges;
+              f = CcwAt(fr, w);
+            } while (f != f0);
+          }
         } else if (double v; !IsFarNode(w) && (v = ConflictValue(si, w, tol)) <= tol && !TieAcrossEdge(si, e, v, tol)) {
           TouchNode(w, VISITED);
+          ++visited, ++twiceInner;
           g.stack.Append(w, kScratchGrowth);
           // The growth goes on from w along its other edges.
           g.edges.Prefetch(CcwAt(er, w));
@@ -84,6 +106,7 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
       e = CcwAt(er, n);
     } while (e != e0);
   }
+  isTree = twiceInner % 2 == 0 && twiceInner / 2 + leafEdges == visited - 1;
   return g.nodes[si.end].status == VISITED;
 }
 
@@ -252,10 +275,11 @@ void CopyIntoDegree2(std::int32_t e, std::int32_t n) {
 
 bool GrowDeletedTree(SegmentInsertion& si) {
   Engine& g = Vd();
-  bool reached = false;
+  bool reached = false, isTree = false;
+  si.grownTree = false;
   for (double tol = kGrowthTol; tol <= kLadderTop; tol = NextTolerance(tol)) {
     ResetInsertionMarks();
-    if ((reached = GrowOnce(si, tol))) break;
+    if ((reached = GrowOnce(si, tol, isTree))) break;
   }
   if (!reached) {
     if (RepairInput(si.s, SEG, false)) {
@@ -264,7 +288,8 @@ bool GrowDeletedTree(SegmentInsertion& si) {
     }
     ResetInsertionMarks();
     si.end = si.start;
-    GrowOnce(si, kLadderTop);
+    GrowOnce(si, kLadderTop, isTree);
+    isTree = false;
     g.errorFlag = true;
     g.recoveryMode = true;
   }
@@ -278,6 +303,7 @@ bool GrowDeletedTree(SegmentInsertion& si) {
     }
   }
   // Every recorded point keeps part of its region.
+  const std::int32_t degree2Before = g.degree2.count;
   for (std::int32_t i = 0; i < g.markedSites.count; ++i) {
     const std::int32_t p = g.markedSites[i];
     if (!RegionSwallowed(p)) continue;
@@ -286,6 +312,9 @@ bool GrowDeletedTree(SegmentInsertion& si) {
       return false;
     }
   }
+  // A protection splits an edge of the collected set: the tree check must
+  // walk the set again.
+  si.grownTree = isTree && g.degree2.count == degree2Before && !g.errorFlag;
   return true;
 }
 

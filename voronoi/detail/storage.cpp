@@ -9,6 +9,7 @@
 #include <sys/mman.h>
 #endif
 
+#include "core/fatal_gate.hpp"
 #include "voronoi/detail/engine_state.hpp"
 #include "voronoi/detail/fatal.hpp"
 
@@ -43,6 +44,7 @@ void AdviseHugePages(void* block, std::int64_t bytes) {
 }  // namespace
 
 void VdFatal(const char* message) {
+  claim_fatal_end();  // one report and one status when threads fail at once
   Vd().errorFlag = true;
   std::fprintf(stdout, "\nerror in %s\n", message);
   std::fflush(stdout);
