@@ -190,6 +190,7 @@ void remember_group(RememberedGroup&& group) {
 }  // namespace
 
 void forget_offset_groups() {
+  forget_remembered_offsets();
   GroupMemory& memory = group_memory();
   std::lock_guard<std::mutex> lock(memory.mutex);
   memory.groups.clear();

@@ -75,6 +75,10 @@ void copy_list(const TaggedPointList& from, TaggedPointList& to) {
 
 }  // namespace
 
+void forget_remembered_offsets() {
+  for (RememberedOffset& r : tl_remembered) r.side = -1;
+}
+
 std::int32_t SlopeDomain::compute(TaggedPointList& list, std::int32_t side) {
   // Only the Voronoi engine computes purely from its input; a stand-in is
   // asked every time.

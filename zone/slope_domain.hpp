@@ -42,8 +42,10 @@ inline constexpr std::int32_t kSideLeft = 1;
 inline constexpr std::int32_t kSideRight = 2;
 inline constexpr std::int32_t kSideBoth = 3;
 
-// Forgets the groups compute_in_groups remembers (tests only: a fresh start).
+// Forgets the groups compute_in_groups remembers, and the offsets this
+// thread remembers (tests and benchmarks only: a fresh start).
 void forget_offset_groups();
+void forget_remembered_offsets();
 
 struct FeedBox {
   double xmin = kSeparatorCoord;

@@ -22,6 +22,7 @@ TEST(PlaceLevel, CursorPassesOnlyLevelsAboveTheStockLevel) {
   cursor = 0;
   EXPECT_EQ(place_level(r, 3, cursor, 7.0f), 1);  // the first level not above 7.0001
   EXPECT_EQ(place_level(r, 3, cursor, 5.00005f), 1);
+  EXPECT_EQ(place_level(r, 3, cursor, 4.99995f), 1);  // within the tolerance below level 5
   EXPECT_EQ(place_level(r, 3, cursor, -1.0f), -1);
   EXPECT_EQ(cursor, 3);
   cursor = 0;
