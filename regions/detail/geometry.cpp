@@ -114,9 +114,14 @@ int ray_crossing(double px, double py, double ax, double ay, double bx, double b
   if (!(by > ay)) {
     lowX = bx, lowY = by, highX = ax, highY = ay;
   }
-  if (std::fabs(lowY - py) <= eps) lowY = py + eps;
-  if (std::fabs(highY - py) <= eps) highY = py + eps;
-  if (py > lowY && highY > py && (py - lowY) / (highY - lowY) * (highX - lowX) > px - lowX) return 1;
+  // An end within eps of the line lies just above it, where it is: the
+  // segment then meets the line at that end. Lifting the end by eps instead
+  // would move the meeting point along a shallow segment by eps over its
+  // slope, past a vertex of the star the ray starts from (a sliver's end a
+  // few eps beside it) and so misread the status there.
+  if (std::fabs(lowY - py) <= eps || !(py > lowY)) return 0;
+  if (std::fabs(highY - py) <= eps) return highX > px || (highX == px && lowX > px) ? 1 : 0;
+  if (highY > py && (py - lowY) / (highY - lowY) * (highX - lowX) > px - lowX) return 1;
   return 0;
 }
 
