@@ -1,6 +1,7 @@
 // The diagram of points beside Boost.Polygon's Voronoi diagram on the same
 // integer input in the same run: 1e5 and 1e6 uniform points, 1e5 clustered
-// points. Each case also reports the peak memory of one construction
+// points; and half-clustered points (half of them in a box 1e-3 of the
+// whole side) beside our own time on as many uniform points. Each case also reports the peak memory of one construction
 // (growth of the resident set's high-water mark, in a child process), and
 // BM_OursOverBoost runs the two in turn and reports the ratio of times.
 #include <benchmark/benchmark.h>
@@ -39,10 +40,23 @@ std::vector<BPoint> Clustered(int n) {
   return pts;
 }
 
+// Every other point uniform, the rest uniform in a box of side 1e-3 of the
+// whole, placed at random.
+std::vector<BPoint> HalfClustered(int n) {
+  std::mt19937 rng(3);
+  constexpr int kSide = 1 << 24, kSmall = kSide / 1000;
+  std::uniform_int_distribution<int> u(0, kSide - 1), v(0, kSmall - 1);
+  const int x0 = u(rng) % (kSide - kSmall), y0 = u(rng) % (kSide - kSmall);
+  std::vector<BPoint> pts(n);
+  for (int i = 0; i < n; ++i)
+    pts[i] = i % 2 == 0 ? BPoint(u(rng), u(rng)) : BPoint(x0 + v(rng), y0 + v(rng));
+  return pts;
+}
+
 const std::vector<BPoint>& Input(int kind, int n) {
   static std::map<std::pair<int, int>, std::vector<BPoint>> cache;
   auto& v = cache[{kind, n}];
-  if (v.empty()) v = kind == 0 ? Uniform(n) : Clustered(n);
+  if (v.empty()) v = kind == 0 ? Uniform(n) : kind == 1 ? Clustered(n) : HalfClustered(n);
   return v;
 }
 
@@ -72,14 +86,35 @@ void BM_Boost(benchmark::State& state) {
 
 void BM_OursOverBoost(benchmark::State& state) {
   const auto& pts = Input(static_cast<int>(state.range(0)), static_cast<int>(state.range(1)));
+  state.counters["ours_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(pts); });
+  state.counters["peer_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunBoost(pts); });
   zt::bench::paired_case(state, zt::VD_Terminate, [&] { RunOurs(pts); }, [&] { RunBoost(pts); });
 }
 
-// Arguments: (0 uniform | 1 clustered, number of points).
-#define CASES ->Args({0, 100000})->Args({0, 1000000})->Args({1, 100000})->Unit(benchmark::kMillisecond)
-BENCHMARK(BM_Ours) CASES;
+// Ours on half-clustered points paired with ours on as many uniform points
+// (ratio: half-clustered over uniform).
+void BM_HalfOverUniform(benchmark::State& state) {
+  const auto n = static_cast<int>(state.range(0));
+  const auto& half = Input(2, n);
+  const auto& uniform = Input(0, n);
+  state.counters["ours_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(half); });
+  state.counters["peer_MB"] = zt::bench::peak_mb(zt::VD_Terminate, [&] { RunOurs(uniform); });
+  zt::bench::paired_case(
+      state, zt::VD_Terminate, [&] { RunOurs(half); },
+      [&] {
+        zt::VD_Terminate();
+        RunOurs(uniform);
+        zt::VD_Terminate();
+      });
+}
+
+// Arguments: (0 uniform | 1 clustered | 2 half-clustered, number of points).
+#define CASES \
+  ->Args({0, 100000})->Args({0, 1000000})->Args({1, 100000})->Args({2, 200000})->Unit(benchmark::kMillisecond)
+BENCHMARK(BM_Ours) CASES->Args({0, 200000});
 BENCHMARK(BM_Boost) CASES;
 BENCHMARK(BM_OursOverBoost) CASES->MinTime(8);
+BENCHMARK(BM_HalfOverUniform)->Arg(200000)->Unit(benchmark::kMillisecond)->MinTime(8);
 
 }  // namespace
 

@@ -121,8 +121,8 @@ double signed_area_sum(const TaggedPointList& out) {
 void emit_with_empty_operand(BooleanEngine& e, bool aEmpty, bool bEmpty, const KeepFlags& keep) {
   const bool keepA = !aEmpty && keep.aInsideB == 0;                 // union, difference
   const bool keepB = !bEmpty && keep.aInsideB == 0 && keep.bInsideA == 0;  // union
-  if (keepA) emit_whole_contours(e.a);
-  if (keepB) emit_whole_contours(e.b);
+  if (keepA) emit_whole_contours(e, e.a);
+  if (keepB) emit_whole_contours(e, e.b);
 }
 
 int attempt(const TaggedPointList& a, const TaggedPointList& b, const char* op, TaggedPointList& out,

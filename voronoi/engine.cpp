@@ -152,6 +152,7 @@ std::int32_t API_AddSegment(std::int32_t i1, std::int32_t i2, std::int32_t tag) 
   s.i1 = i1;
   s.i2 = i2;
   s.flag = 0;
+  s.directions = 1;
   s.vd = kNone;
   s.tag = tag;
   s.arc = kNone;

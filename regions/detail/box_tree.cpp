@@ -6,6 +6,7 @@
 // dense contour's boxes on top of each other.
 #include <algorithm>
 #include <cmath>
+#include <initializer_list>
 #include <new>
 #include <utility>
 
@@ -14,6 +15,10 @@
 namespace zt::detail {
 
 namespace {
+
+// How many points ahead of a lookup its bucket, then its first vertex, are fetched.
+constexpr std::int32_t kBucketPrefetch = 8;
+constexpr std::int32_t kVertexPrefetch = 4;
 
 int append_edge(BooleanEngine& e, Vertex* from, Vertex* to, std::int32_t tag) {
   Edge* edge = e.edges.take();
@@ -88,7 +93,12 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t first, st
     ymax = std::max(ymax, b.ymax);
   }
   node->xmin = xmin, node->ymin = ymin, node->xmax = xmax, node->ymax = ymax;
-  if (last - first <= kLeafSpan) return node;
+  if (last - first <= kLeafSpan) {
+    node->run = boxes[first].edge->run;
+    for (std::int32_t i = first + 1; i <= last && node->run >= 0; ++i)
+      if (boxes[i].edge->run != node->run) node->run = -1;
+    return node;
+  }
   const bool byX = node->xmax - node->xmin > node->ymax - node->ymin;
   const std::int32_t m = first + (last - first) / 2;
   select_median(boxes, first, last, m, byX);
@@ -96,6 +106,7 @@ BoxTreeNode* build_node(BooleanEngine& e, EdgeBox* boxes, std::int32_t first, st
   if (!node->low) return nullptr;
   node->high = build_node(e, boxes, m + 1, last);
   if (!node->high) return nullptr;
+  if (node->low->run == node->high->run) node->run = node->low->run;
   return node;
 }
 
@@ -119,6 +130,45 @@ int build_tree(BooleanEngine& e, PolygonSet& set) {
   return set.root ? 0 : -1;
 }
 
+// Runs: stretches of consecutive edges of one contour that the walk of
+// their operand against itself may skip. In a closed contour, edges that
+// each advance by more than kPairRejectMargin in one direction of one axis
+// cannot be near unless consecutive (the edge between keeps them apart),
+// and consecutive ones are tested only where more than two of their
+// operand's edge ends meet, which no run passes. An open contour is one run:
+// no pair of its edges is tested.
+bool advances(const Edge& edge, int direction) {
+  const double m = kPairRejectMargin;
+  switch (direction) {
+    case 0: return edge.end->x > edge.start->x + m;
+    case 1: return edge.start->x > edge.end->x + m;
+    case 2: return edge.end->y > edge.start->y + m;
+    default: return edge.start->y > edge.end->y + m;
+  }
+}
+
+void mark_runs(BooleanEngine& e, const InputContour& c, std::int32_t owner) {
+  if (!c.closed) {
+    const std::int32_t run = e.runCount++;
+    for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) e.edges[k].run = run;
+    return;
+  }
+  std::int32_t k = c.firstEdge;
+  while (k < c.endEdge) {
+    Edge& first = e.edges[k];
+    const double dx = first.end->x - first.start->x, dy = first.end->y - first.start->y;
+    const int direction = std::fabs(dx) >= std::fabs(dy) ? (dx > 0 ? 0 : 1) : (dy > 0 ? 2 : 3);
+    const std::int32_t run = e.runCount++;
+    first.run = run;
+    ++k;
+    if (!advances(first, direction)) continue;
+    while (k < c.endEdge && advances(e.edges[k], direction) && e.edges[k].start->ends[owner - 1] <= 2) {
+      e.edges[k].run = run;
+      ++k;
+    }
+  }
+}
+
 }  // namespace
 
 std::int64_t select_median(EdgeBox* boxes, std::int32_t lo, std::int32_t hi, std::int32_t m, bool byX) {
@@ -134,8 +184,15 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     Vertex* prev = nullptr;
     std::int32_t prevTag = 0;
     bool failed = false;
-    for_each_stored_point(c, [&](const TaggedPoint& p) {
+    const TaggedPoint* pts = contour_points(e, c);
+    std::int32_t at = 0;
+    for_each_stored_point(e, c, [&](const TaggedPoint& p) {
       if (failed) return;
+      // Lookups go to scattered buckets: the later points' buckets and
+      // first vertices are fetched while this one is looked up.
+      if (at + kBucketPrefetch < c.pointCount) grid_prefetch(e.grid, pts[at + kBucketPrefetch].x, pts[at + kBucketPrefetch].y, false);
+      if (at + kVertexPrefetch < c.pointCount) grid_prefetch(e.grid, pts[at + kVertexPrefetch].x, pts[at + kVertexPrefetch].y, true);
+      ++at;
       Vertex* v = grid_lookup(e.grid, p.x, p.y, set.owner);
       if (!v) {
         failed = true;
@@ -155,13 +212,17 @@ int finish_set(BooleanEngine& e, PolygonSet& set) {
     c.endEdge = e.edges.count();
     if (c.closed) {
       for (std::int32_t k = c.firstEdge; k < c.endEdge; ++k) {
-        ++e.edges[k].start->ends;
-        ++e.edges[k].end->ends;
+        for (Vertex* v : {e.edges[k].start, e.edges[k].end}) {
+          std::int16_t& ends = v->ends[set.owner - 1];
+          if (ends < kManyEnds) ++ends;
+        }
       }
     }
   }
   set.lastBox = e.boxes.count() - 1;
   if (set.lastBox < set.firstBox) return -1;
+  // Every end is counted now, so runs can stop where contours touch.
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) mark_runs(e, set.contours[ci], set.owner);
   return build_tree(e, set);
 }
 

@@ -34,10 +34,10 @@ int write_chain(BooleanEngine& e, HalfEdge* h) {
   return 0;
 }
 
-void emit_whole(const InputContour& c) {
+void emit_whole(const BooleanEngine& e, const InputContour& c) {
   const TaggedPoint* first = nullptr;
   const TaggedPoint* last = nullptr;
-  for_each_stored_point(c, [&](const TaggedPoint& p) {
+  for_each_stored_point(e, c, [&](const TaggedPoint& p) {
     if (!first) first = &p;
     last = &p;
     emit_point(p.x, p.y, p.tag);
@@ -51,21 +51,15 @@ void emit_whole(const InputContour& c) {
 
 // A closed contour kept whole, written from its first point against its
 // input direction; each edge keeps its tag (that of the point it starts
-// from as read). Blocks are found by walking, once per block.
-void emit_whole_reversed(const InputContour& c) {
-  const std::int32_t n = c.pointCount;
-  const TaggedPoint* to = &c.firstBlock->points[0];  // the edge n-1 -> 0 comes first
-  std::int32_t i = n - 1;
-  while (i >= 0) {
-    const PointBlock* b = c.firstBlock;
-    while (b->end <= i) b = b->next;
-    const std::int32_t blockStart = b->end - kPointBlockSize;
-    for (; i >= blockStart; --i) {
-      const TaggedPoint& from = b->points[i - blockStart];
-      emit_point(to->x, to->y, from.tag);
-      emit_point(from.x, from.y, from.tag);
-      to = &from;
-    }
+// from as read).
+void emit_whole_reversed(const BooleanEngine& e, const InputContour& c) {
+  const TaggedPoint* pts = contour_points(e, c);
+  const TaggedPoint* to = &pts[0];  // the edge n-1 -> 0 comes first
+  for (std::int32_t i = c.pointCount - 1; i >= 0; --i) {
+    const TaggedPoint& from = pts[i];
+    emit_point(to->x, to->y, from.tag);
+    emit_point(from.x, from.y, from.tag);
+    to = &from;
   }
   emit_separator();
 }
@@ -94,8 +88,8 @@ int emit_open_contour(BooleanEngine& e, const InputContour& c) {
 
 }  // namespace
 
-void emit_whole_contours(const PolygonSet& set) {
-  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) emit_whole(set.contours[ci]);
+void emit_whole_contours(const BooleanEngine& e, const PolygonSet& set) {
+  for (std::int32_t ci = 0; ci < set.contours.count(); ++ci) emit_whole(e, set.contours[ci]);
 }
 
 int emit_result(BooleanEngine& e, bool resultOnLeft) {
@@ -104,9 +98,9 @@ int emit_result(BooleanEngine& e, bool resultOnLeft) {
       const InputContour& c = set->contours[ci];
       if (c.keepWhole == 1) {
         if (c.reversed == 1) {
-          emit_whole_reversed(c);
+          emit_whole_reversed(e, c);
         } else {
-          emit_whole(c);
+          emit_whole(e, c);
         }
       } else if (!c.closed && c.hasSplits == 1) {
         // An open polyline without splits that is not kept has no pieces.

@@ -20,14 +20,7 @@ BooleanEngine::BooleanEngine() {
 }
 
 BooleanEngine::~BooleanEngine() {
-  reset_set(*this, a);
-  reset_set(*this, b);
-  while (freeBlocks) {
-    PointBlock* next = freeBlocks->next;
-    delete[] freeBlocks->points;
-    delete freeBlocks;
-    freeBlocks = next;
-  }
+  delete[] points;
   delete grid.vertices;
   delete[] grid.buckets;
   delete[] treeBoxes;
@@ -37,19 +30,7 @@ BooleanEngine::~BooleanEngine() {
   delete[] overlaps;
 }
 
-void reset_set(BooleanEngine& e, PolygonSet& set) {
-  for (std::int32_t i = 0; i < set.contours.count(); ++i) {
-    InputContour& c = set.contours[i];
-    // Hand the contour's blocks back to the engine's free list.
-    PointBlock* blk = c.firstBlock;
-    while (blk) {
-      PointBlock* next = blk->next;
-      blk->next = e.freeBlocks;
-      e.freeBlocks = blk;
-      blk = next;
-    }
-    c = InputContour{};
-  }
+void reset_set(BooleanEngine&, PolygonSet& set) {
   set.contours.reset();
   set.root = nullptr;
   set.firstBox = 0;
@@ -82,6 +63,8 @@ BooleanEngine* prepare_thread_engine() {
   BooleanEngine& e = *tl_engine.engine;
   reset_set(e, e.a);
   reset_set(e, e.b);
+  e.pointCount = 0;
+  e.runCount = 0;
   e.edges.reset();
   e.boxes.reset();
   e.nodes.reset();

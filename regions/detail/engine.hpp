@@ -137,7 +137,10 @@ struct BooleanEngine {
   HalfEdgePool halves;
   SplitPool splits;
   StarPool stars;
-  PointBlock* freeBlocks = nullptr;
+  // The points of both sets' contours as read, each contour's contiguous.
+  TaggedPoint* points = nullptr;
+  std::int32_t pointCount = 0;
+  std::int32_t pointCapacity = 0;
   BoxTreeNode queryBox;
   IntersectionProbe probe;
   VertexGrid grid;
@@ -162,6 +165,8 @@ struct BooleanEngine {
   TaggedPointList output;
   double eps = kEngineEpsilon;
   double offsetX = 0.0, offsetY = 0.0, scaleX = 1.0, scaleY = 1.0;
+  // Runs numbered so far (box_tree.cpp), over both sets.
+  std::int32_t runCount = 0;
   // Box pairs compared at leaf pairs by the last intersection walk.
   std::int64_t leafPairTests = 0;
 
@@ -201,14 +206,16 @@ double snap_coordinate(double v);
 inline constexpr int kEmptyOperand = 1;
 int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list, std::int32_t owner,
                  bool coarseGrid = false);
-bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p);
+// Stores n points as contour c's, after those stored before; false when
+// storage cannot be had.
+bool contour_store(BooleanEngine& e, InputContour& c, const TaggedPoint* pts, std::int32_t n);
+inline const TaggedPoint* contour_points(const BooleanEngine& e, const InputContour& c) {
+  return e.points + c.firstPoint;
+}
 template <typename F>
-void for_each_stored_point(const InputContour& c, F&& f) {
-  std::int32_t i = 0;
-  for (const PointBlock* b = c.firstBlock; b && i < c.pointCount; b = b->next) {
-    const std::int32_t blockStart = b->end - kPointBlockSize;
-    for (; i < c.pointCount && i < b->end; ++i) f(b->points[i - blockStart]);
-  }
+void for_each_stored_point(const BooleanEngine& e, const InputContour& c, F&& f) {
+  const TaggedPoint* p = contour_points(e, c);
+  for (std::int32_t i = 0; i < c.pointCount; ++i) f(p[i]);
 }
 
 // ---- vertex grid (vertex_grid.cpp)
@@ -218,6 +225,9 @@ void clear_grid(VertexGrid& g);
 // The vertex within eps of (x, y), made shared when met by another owner, or a
 // new one; null on storage failure.
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner);
+// A hint that (x, y) will be looked up soon: loads its bucket, or with head
+// the bucket's first vertex, into the cache.
+void grid_prefetch(const VertexGrid& g, double x, double y, bool head);
 // What a lookup of v's own coordinates by a crossing does: v becomes shared.
 void grid_share(VertexGrid& g, Vertex* v);
 // Bucket of a fine cell, never outside the table whatever the cell's sign.
@@ -273,7 +283,7 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
 // their left (union, intersection), else from those along their contour.
 int emit_result(BooleanEngine& e, bool resultOnLeft);
 // Every contour of the set as read, closed ones closed on their first point.
-void emit_whole_contours(const PolygonSet& set);
+void emit_whole_contours(const BooleanEngine& e, const PolygonSet& set);
 
 // ---- debug validator (validate.cpp)
 // Checks the overlay's invariants that are cheap to check; after the star

@@ -49,8 +49,8 @@ int make_pair(BooleanEngine& e, ContourCursor& cur, Vertex* u, Vertex* v, Edge* 
   if (!r) return -1;
   note_branching(e, u);
   note_branching(e, v);
-  *f = HalfEdge{owner, kUndecided, -1, u, r, u->firstOut, nullptr, edge};
-  *r = HalfEdge{-owner, kUndecided, -1, v, f, v->firstOut, nullptr, edge};
+  *f = HalfEdge{owner, kUndecided, -1, -1, u, r, u->firstOut, nullptr, edge};
+  *r = HalfEdge{-owner, kUndecided, -1, -1, v, f, v->firstOut, nullptr, edge};
   u->firstOut = f;
   v->firstOut = r;
   if (cur.previousReverse) link_pair(cur.previousReverse, f);

@@ -84,6 +84,21 @@ int share_overlap_splits(BooleanEngine& e) {
   return 0;
 }
 
+// Whether a split of edge at v is worth recording. A meeting point exactly
+// at one of the edge's ends has the same t whichever pair finds it (t
+// follows from the end's coordinates and the edge alone); of such repeats,
+// where boundaries run along each other or many edges meet at a corner, only
+// the first is recorded: settling would keep or drop the later ones with it
+// (same t, found later), and nothing else depends on them.
+bool first_at_end(Edge& edge, const Vertex* v, bool exact) {
+  if (!exact) return true;
+  const std::uint16_t bit = v == edge.start ? 1 : v == edge.end ? 2 : 0;
+  if (bit == 0) return true;
+  if (edge.endsSplit & bit) return false;
+  edge.endsSplit |= bit;
+  return true;
+}
+
 int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
   IntersectionProbe& pr = e.probe;
   pr.retryReversed = 0;
@@ -111,8 +126,9 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
     }
     const double tA = ((R.x - pr.p0.x) * uAx + (R.y - pr.p0.y) * uAy) / pr.dirA.length;
     const double tB = ((R.x - pr.q0.x) * uBx + (R.y - pr.q0.y) * uBy) / pr.dirB.length;
-    if (record_split(*pr.splits, first, tA, v) != 0) return -1;
-    if (record_split(*pr.splits, second, tB, v) != 0) return -1;
+    const bool exact = v->x == R.x && v->y == R.y;
+    if (first_at_end(first, v, exact) && record_split(*pr.splits, first, tA, v) != 0) return -1;
+    if (first_at_end(second, v, exact) && record_split(*pr.splits, second, tB, v) != 0) return -1;
   }
   return 0;
 }
@@ -123,52 +139,57 @@ int test_edge_pair(BooleanEngine& e, Edge& first, Edge& second) {
 // touching, or one passing twice), for the touching point to cut them.
 // Consecutive edges of a contour are most of the pairs a walk of one tree
 // meets, so this spares the intersection routine on nearly all of them.
-bool worth_testing_same_operand(const Edge& a, const Edge& b) {
+bool worth_testing_same_operand(const Edge& a, const Edge& b, std::int32_t owner) {
   // Open polylines bound nothing: where they cross their own operand does
   // not matter, and they are not cut there.
   if (a.open || b.open) return false;
   const Vertex* shared = a.start == b.start || a.start == b.end ? a.start
                          : a.end == b.start || a.end == b.end   ? a.end
                                                                 : nullptr;
-  return !shared || shared->ends > 2;
+  return !shared || shared->ends[owner - 1] > 2;
 }
 
-int test_boxes(BooleanEngine& e, const EdgeBox& bi, const EdgeBox& bj, bool sameOperand) {
+// sameOwner: the operand both boxes belong to, or 0 when they belong to
+// different operands.
+int test_boxes(BooleanEngine& e, const EdgeBox& bi, const EdgeBox& bj, std::int32_t sameOwner) {
   if (!boxes_near(bi, bj)) return 0;
-  if (sameOperand && !worth_testing_same_operand(*bi.edge, *bj.edge)) return 0;
+  if (sameOwner != 0 && !worth_testing_same_operand(*bi.edge, *bj.edge, sameOwner)) return 0;
   if (test_edge_pair(e, *bi.edge, *bj.edge) != 0) return -1;
   if (e.probe.retryReversed && test_edge_pair(e, *bj.edge, *bi.edge) != 0) return -1;
   return 0;
 }
 
 // Every pair of boxes, one under a and one under b, that are near; a and b
-// are disjoint subtrees (of two operands, or of one when sameOperand).
-int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, bool sameOperand) {
+// are disjoint subtrees (of two operands, or of one when sameOwner).
+int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, std::int32_t sameOwner) {
   if (!boxes_near(*a, *b)) return 0;
+  // Pairs within one run are never worth a test (box_tree.cpp).
+  if (sameOwner != 0 && a->run >= 0 && a->run == b->run) return 0;
   if (a->low && b->low) {
-    if (walk(e, a->low, b->low, sameOperand) || walk(e, a->low, b->high, sameOperand) ||
-        walk(e, a->high, b->low, sameOperand) || walk(e, a->high, b->high, sameOperand))
+    if (walk(e, a->low, b->low, sameOwner) || walk(e, a->low, b->high, sameOwner) ||
+        walk(e, a->high, b->low, sameOwner) || walk(e, a->high, b->high, sameOwner))
       return -1;
     return 0;
   }
-  if (a->low) return (walk(e, a->low, b, sameOperand) || walk(e, a->high, b, sameOperand)) ? -1 : 0;
-  if (b->low) return (walk(e, a, b->low, sameOperand) || walk(e, a, b->high, sameOperand)) ? -1 : 0;
+  if (a->low) return (walk(e, a->low, b, sameOwner) || walk(e, a->high, b, sameOwner)) ? -1 : 0;
+  if (b->low) return (walk(e, a, b->low, sameOwner) || walk(e, a, b->high, sameOwner)) ? -1 : 0;
   e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
   for (std::int32_t i = a->first; i <= a->last; ++i)
     for (std::int32_t j = b->first; j <= b->last; ++j)
-      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], sameOperand) != 0) return -1;
+      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], sameOwner) != 0) return -1;
   return 0;
 }
 
 // Every pair of distinct boxes under one node that are near.
-int walk_self(BooleanEngine& e, const BoxTreeNode* n) {
+int walk_self(BooleanEngine& e, const BoxTreeNode* n, std::int32_t owner) {
+  if (n->run >= 0) return 0;
   if (n->low) {
-    if (walk_self(e, n->low) || walk_self(e, n->high) || walk(e, n->low, n->high, true)) return -1;
+    if (walk_self(e, n->low, owner) || walk_self(e, n->high, owner) || walk(e, n->low, n->high, owner)) return -1;
     return 0;
   }
   for (std::int32_t i = n->first; i <= n->last; ++i)
     for (std::int32_t j = i + 1; j <= n->last; ++j)
-      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], true) != 0) return -1;
+      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], owner) != 0) return -1;
   return 0;
 }
 
@@ -179,9 +200,9 @@ int find_intersections(BooleanEngine& e) {
   if (!e.a.root || !e.b.root) return -1;
   e.overlapCount = 0;
   e.leafPairTests = 0;
-  int rc = walk(e, e.a.root, e.b.root, false);
-  if (rc == 0) rc = walk_self(e, e.a.root);
-  if (rc == 0) rc = walk_self(e, e.b.root);
+  int rc = walk(e, e.a.root, e.b.root, 0);
+  if (rc == 0) rc = walk_self(e, e.a.root, e.a.owner);
+  if (rc == 0) rc = walk_self(e, e.b.root, e.b.owner);
   for (std::int32_t i = 0; rc == 0 && i < e.edges.count(); ++i) rc = settle_splits(e, e.edges[i], e.eps);
   if (rc == 0 && e.overlapCount > 0) rc = share_overlap_splits(e);
   e.halves.reset();

@@ -1,6 +1,8 @@
 // Operand preparation: the bounding box of both operands, the normalisation
 // into the unit square, snapping, and the reading of each operand's contours
 // into its polygon set.
+#include <algorithm>
+#include <climits>
 #include <cmath>
 #include <initializer_list>
 #include <new>
@@ -56,33 +58,22 @@ double snap_coordinate(double v) {
   return whole + static_cast<double>(k) * kSnapQuantum;
 }
 
-bool contour_append(BooleanEngine& e, InputContour& c, const TaggedPoint& p) {
-  if (c.pointCount == c.capacity) {
-    PointBlock* blk = e.freeBlocks;
-    if (blk) {
-      e.freeBlocks = blk->next;
-    } else {
-      if (!allocationAllowed()) return false;
-      blk = new (std::nothrow) PointBlock;
-      if (!blk) return false;
-      blk->points = new (std::nothrow) TaggedPoint[kPointBlockSize];
-      if (!blk->points) {
-        delete blk;
-        return false;
-      }
-    }
-    blk->next = nullptr;
-    blk->end = c.capacity + kPointBlockSize;
-    if (c.currentBlock) {
-      c.currentBlock->next = blk;
-    } else {
-      c.firstBlock = blk;
-    }
-    c.currentBlock = blk;
-    c.capacity = blk->end;
+bool contour_store(BooleanEngine& e, InputContour& c, const TaggedPoint* pts, std::int32_t n) {
+  const std::int64_t need = std::int64_t{e.pointCount} + n;
+  if (need > e.pointCapacity) {
+    if (need > INT32_MAX / 2 || !allocationAllowed()) return false;
+    const std::int32_t capacity = static_cast<std::int32_t>(std::max<std::int64_t>(need, 2 * std::int64_t{e.pointCapacity}));
+    TaggedPoint* grown = new (std::nothrow) TaggedPoint[static_cast<std::size_t>(capacity)];
+    if (!grown) return false;
+    std::copy(e.points, e.points + e.pointCount, grown);
+    delete[] e.points;
+    e.points = grown;
+    e.pointCapacity = capacity;
   }
-  c.currentBlock->points[c.pointCount - (c.capacity - kPointBlockSize)] = p;
-  ++c.pointCount;
+  c.firstPoint = e.pointCount;
+  c.pointCount = n;
+  std::copy(pts, pts + n, e.points + e.pointCount);
+  e.pointCount += n;
   return true;
 }
 
@@ -233,8 +224,7 @@ int read_operand(BooleanEngine& e, PolygonSet& set, const TaggedPointList& list,
     if (!c) return -1;
     *c = InputContour{};
     c->closed = closed ? 1 : 0;
-    for (std::int32_t k = 0; k < kept; ++k)
-      if (!contour_append(e, *c, pts[k])) return -1;
+    if (!contour_store(e, *c, pts, kept)) return -1;
   }
   // An operand made only of parts that bound nothing is an empty region.
   if (set.contours.count() == 0 && set.cancelled) return kEmptyOperand;

@@ -13,6 +13,8 @@ struct SplitPoint;
 
 // Owner of a vertex met by both operands, or created at a crossing.
 inline constexpr std::int32_t kSharedOwner = 300;
+// Edge ends at a vertex are counted up to this: more than two is what matters.
+inline constexpr std::int16_t kManyEnds = 3;
 // Keep marks of half-edges and star entries.
 inline constexpr std::int32_t kUndecided = -1;
 // Emission mark of a written half-edge, and direction mark of a paired star entry.
@@ -24,9 +26,10 @@ struct Vertex {
   double x = 0.0;          // normalised coordinates
   double y = 0.0;
   std::int32_t serial = 0;  // creation order within the operation
-  // Ends of closed contours' edges at the vertex: more than two where
-  // contours of one operand touch, or one passes twice.
-  std::int32_t ends = 0;
+  // Ends of closed contours' edges at the vertex, of A's and of B's
+  // (counted up to kManyEnds): more than two where contours of one operand
+  // touch, or one passes twice.
+  std::int16_t ends[2] = {0, 0};
   Vertex* nextInBucket = nullptr;
   Vertex* nextShared = nullptr;
   HalfEdge* firstOut = nullptr;
@@ -39,7 +42,13 @@ struct Edge {
   std::uint32_t tag = 0;
   // An edge of an open polyline bounds nothing: it never changes its
   // operand's inside status and no ray counts it.
-  std::int32_t open = 0;
+  std::uint16_t open = 0;
+  // Split points recorded at the edge's own start (bit 0) or end (bit 1)
+  // from a meeting point exactly there, whose t is always the same: a
+  // second one would be dropped by the settling, so it is not recorded.
+  std::uint16_t endsSplit = 0;
+  // The monotone run of its contour the edge belongs to (box_tree.cpp).
+  std::int32_t run = -1;
 };
 
 // Exact extent of an edge (normalised coordinates). Boxes are compared with
@@ -55,6 +64,8 @@ struct BoxTreeNode {
   BoxTreeNode* high = nullptr;
   std::int32_t first = 0;  // inclusive range of box indexes
   std::int32_t last = -1;
+  // The run all its boxes' edges belong to, or -1 (they belong to several).
+  std::int32_t run = -1;
 };
 
 struct SplitPoint {
@@ -67,6 +78,10 @@ struct HalfEdge {
   std::int32_t side = 0;  // +owner along its contour, -owner against it
   std::int32_t keep = kUndecided;
   std::int32_t emitted = -1;
+  // Set by the star classification along the whole chain: the inside status
+  // of each operand on the half-edge's left (bit 0 A, bit 1 B), or -1 before
+  // a sweep reached the chain.
+  std::int32_t leftStates = -1;
   Vertex* origin = nullptr;
   HalfEdge* twin = nullptr;
   HalfEdge* nextOut = nullptr;
@@ -90,14 +105,6 @@ struct StarEntry {
   std::int32_t open = 0;       // of an open polyline
 };
 
-inline constexpr std::int32_t kPointBlockSize = 512;
-
-struct PointBlock {
-  std::int32_t end = 0;  // the contour's capacity just after this block was added
-  TaggedPoint* points = nullptr;
-  PointBlock* next = nullptr;
-};
-
 struct InputContour {
   std::int32_t firstEdge = -1;
   std::int32_t endEdge = -1;  // exclusive
@@ -105,10 +112,9 @@ struct InputContour {
   std::int32_t keepWhole = 0;
   std::int32_t reversed = 0;  // kept whole, written against its input direction
   std::int32_t closed = 1;
+  // The contour's points as read, contiguous in the engine's point store.
+  std::int32_t firstPoint = 0;
   std::int32_t pointCount = 0;
-  std::int32_t capacity = 0;
-  PointBlock* firstBlock = nullptr;
-  PointBlock* currentBlock = nullptr;
   HalfEdge* firstHalf = nullptr;
   HalfEdge* lastHalf = nullptr;
 };

@@ -51,26 +51,30 @@ bool agrees(const HalfEdge* h, std::int32_t keep, std::int32_t other) {
   return other < 0 || h->otherState < 0 || h->otherState == other;
 }
 
-void mark(HalfEdge* h, std::int32_t keep, std::int32_t other, std::int32_t left) {
+void mark(HalfEdge* h, std::int32_t keep, std::int32_t other, std::int32_t left, std::int32_t states) {
   h->keep = keep;
   if (other >= 0) h->otherState = other;
   if (keep == 1 && left >= 0 && h->resultLeft < 0) h->resultLeft = left;
+  if (h->leftStates < 0) h->leftStates = states;
 }
 
 // Verdict for h and its twin, carried along the contour up to the next
 // shared vertex (returned in far), with the other operand's status along
-// the chain and the side the result lies on. A different earlier verdict is
-// an inconsistency.
-int propagate(HalfEdge* h0, std::int32_t keep, std::int32_t other, std::int32_t left, Vertex*& far) {
+// the chain, the side the result lies on and both operands' statuses on
+// each side (leftStates on h's left, rightStates on its right: no other
+// piece meets the chain between shared vertices). A different earlier
+// verdict is an inconsistency.
+int propagate(HalfEdge* h0, std::int32_t keep, std::int32_t other, std::int32_t left, std::int32_t leftStates,
+              std::int32_t rightStates, Vertex*& far) {
   far = nullptr;
   const std::int32_t twinLeft = left < 0 ? -1 : 1 - left;
   HalfEdge* h = h0;
   for (;;) {
     if (h->keep != kUndecided) return agrees(h, keep, other) ? 0 : -1;
-    mark(h, keep, other, left);
+    mark(h, keep, other, left, leftStates);
     HalfEdge* t = h->twin;
     if (t->keep != kUndecided && !agrees(t, keep, other)) return -1;
-    mark(t, keep, other, twinLeft);
+    mark(t, keep, other, twinLeft, rightStates);
     if (t->origin->owner == kSharedOwner) {
       far = t->origin;
       return 0;
@@ -126,9 +130,15 @@ std::int32_t group_end(StarPool& pool, std::int32_t i, std::int32_t n) {
 // first entry. A group toggles it when it holds an odd number of x's
 // entries: a piece run along twice (a doubled segment, a spike, a
 // there-and-back contour) bounds nothing. Taken from a piece of the other
-// operand already decided from its far end when there is one, else from the
-// crossings of a ray towards +x with x's edges that do not meet the vertex:
-// the ray runs just below the +x axis.
+// operand already decided from its far end when there is one; else from a
+// piece along which both operands' boundaries run, decided from its far end
+// (the statuses on its left are those just counter-clockwise of its group:
+// where the boundaries coincide, every vertex has only such pieces, and this
+// spares a ray at each); else from the crossings of a ray towards +x with
+// x's edges that do not meet the vertex: the ray runs just below the +x
+// axis. A piece of x alone is no anchor for x: next to a piece of the other
+// operand that is collinear within the last bits, the two ends may order
+// them differently.
 std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int32_t n) {
   StarPool& pool = e.stars;
   std::int32_t toggles = 0;
@@ -141,6 +151,20 @@ std::int32_t anchor_state(BooleanEngine& e, Vertex* v, std::int32_t x, std::int3
         if (operand_of(pool[k]) != x && pool[k].half->otherState >= 0) return pool[k].half->otherState ^ toggles;
     }
     toggles ^= count & 1;
+    i = j;
+  }
+  toggles = 0;
+  for (std::int32_t i = 0; i < n;) {
+    const std::int32_t j = group_end(pool, i, n);
+    std::int32_t count = 0;
+    for (std::int32_t k = i; k < j; ++k) count += operand_of(pool[k]) == x && !pool[k].open;
+    toggles ^= count & 1;
+    bool both = false;
+    for (std::int32_t k = i; k < j; ++k) both |= operand_of(pool[k]) != operand_of(pool[i]);
+    for (std::int32_t k = i; k < j && both; ++k) {
+      const std::int32_t states = pool[k].half->leftStates;
+      if (states >= 0) return ((states >> (x - 1)) & 1) ^ toggles;
+    }
     i = j;
   }
   // The ray takes every point within eps of its line as lying above it, so
@@ -236,7 +260,7 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
       s.direction = k == kept ? (resultAfter == pairSide ? 1 : -1) : 0;
       Vertex* far = nullptr;
       const std::int32_t left = k == kept && !s.open ? resultAfter : -1;
-      if (propagate(s.half, s.keep, other, left, far) != 0) return -1;
+      if (propagate(s.half, s.keep, other, left, afterA | afterB << 1, stateA | stateB << 1, far) != 0) return -1;
       if (far && far->sweepMark == 0 && !push_pending(e, pending, far)) return -1;
     }
     stateA = afterA;

@@ -129,6 +129,15 @@ void grid_share(VertexGrid& g, Vertex* v) {
   if (v->owner != kSharedOwner) make_shared(g, v);
 }
 
+void grid_prefetch(const VertexGrid& g, double x, double y, bool head) {
+  Vertex* const* bucket = &g.buckets[grid_bucket_of(g, fine_index(y, g.fineScale), fine_index(x, g.fineScale))];
+  if (!head) {
+    __builtin_prefetch(bucket);
+  } else if (const Vertex* v = *bucket) {
+    __builtin_prefetch(v);
+  }
+}
+
 Vertex* grid_lookup(VertexGrid& g, double x, double y, std::int32_t owner) {
   const double s = g.fineScale;
   const std::int64_t f0 = fine_index(x - g.eps, s), f1 = fine_index(x + g.eps, s);

@@ -121,7 +121,7 @@ void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std
       c.keepWhole = 0;
       continue;
     }
-    const TaggedPoint& p = c.firstBlock->points[0];
+    const TaggedPoint& p = contour_points(e, c)[0];
     const std::int32_t parity = count_ray_crossings(e, y, p.x, p.y) % 2;
     c.keepWhole = flag == 1 ? parity : 1 - parity;
     if (resultOnLeft && c.keepWhole == 1 && c.closed && c.endEdge > c.firstEdge)

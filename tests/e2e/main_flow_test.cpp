@@ -1,7 +1,7 @@
 // restzones run as the suite runs it: the bundled example run again and
-// elsewhere, and what an interrupted result write leaves behind (and the
-// guard that removes it). Its stops, faults and plain ends are rows of
-// data/runs.txt.
+// elsewhere, and the guard that removes an interrupted result (interrupted
+// writes are in protocol_faults_test.cpp; stops, faults and plain ends are
+// rows of data/runs.txt).
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -36,22 +36,6 @@ TEST(MainFlowEnd, ExampleGivesTheSameResultEveryRun) {
   EXPECT_EQ(r.bytes("stock2.bin"), result);
   ASSERT_EQ(fresh.run(), 0) << fresh.err;
   EXPECT_EQ(fresh.bytes("stock2.bin"), result);
-}
-
-// The result file grows beyond what the process may write: the record layer
-// stops the program, and the half-written result goes with it. The example's
-// scratch files stay below the limit, its result does not.
-TEST(MainFlowFaults, InterruptedResultWriteLeavesNoResult) {
-  constexpr std::size_t kLimitKiB = 100;
-  ProgramRun r;
-  copy_example(r);
-  const std::string bytes = std::to_string(kLimitKiB * 1024);
-  const int status = r.run("trap '' XFSZ", "prlimit --fsize=" + bytes + ":" + bytes);
-  ASSERT_LT(r.bytes("temp2").size(), kLimitKiB * 1024) << "the example outgrew this test";
-  EXPECT_TRUE(status == 11 || status == 12) << status << r.out << r.err;
-  EXPECT_NE(r.err.find("stock2.bin"), std::string::npos) << r.err;
-  EXPECT_TRUE(r.marker_left());
-  EXPECT_FALSE(r.has("stock2.bin"));
 }
 
 // The result guard underneath: a result being written disappears with any

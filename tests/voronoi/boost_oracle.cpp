@@ -191,10 +191,16 @@ TEST(BoostOracle, ClusteredIntegerPoints) {
     const BPoint& c = centres[i % 6];
     pts.emplace_back(c.x() + int(std::lround(spread(rng))), c.y() + int(std::lround(spread(rng))));
   }
-  const Match o = ComparePoints(pts);
-  EXPECT_EQ(o.error, "");
-  EXPECT_TRUE(vd::Vd().usedQuadtree);
-  EXPECT_GT(o.oursChecked, 5000);
+  // Nearest points by walks through the diagram (the partly sorted order),
+  // and by the quadtree (a random order).
+  for (const bool presorted : {true, false}) {
+    vd::Vd().presortPointOrder = presorted;
+    const Match o = ComparePoints(pts);
+    vd::Vd().presortPointOrder = true;
+    EXPECT_EQ(o.error, "") << presorted;
+    EXPECT_EQ(vd::Vd().usedQuadtree, !presorted);
+    EXPECT_GT(o.oursChecked, 5000);
+  }
 }
 
 TEST(BoostOracle, CollinearIntegerPoints) {

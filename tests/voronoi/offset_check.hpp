@@ -158,4 +158,17 @@ std::vector<P> Star(std::mt19937& rng, double cx, double cy, double rmin, double
   return c;
 }
 
+// A star-shaped pocket of radius 70 to 100 about the origin with `vertices`
+// corners (counter-clockwise) and `islands` clockwise star-shaped islands
+// of radius 8 to 18 and `islandVertices` corners: one at the centre, or
+// several on a circle of radius 35.
+inline std::vector<Contour> PocketWithIslands(std::mt19937& rng, int vertices, int islands, int islandVertices) {
+  std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, vertices, false)};
+  for (int h = 0; h < islands; ++h) {
+    const double a = 2 * std::numbers::pi * h / islands, off = islands == 1 ? 0.0 : 35.0;
+    cs.push_back(Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, islandVertices, true));
+  }
+  return cs;
+}
+
 }  // namespace zt::test

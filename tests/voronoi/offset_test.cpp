@@ -256,13 +256,7 @@ TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
 TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
   std::mt19937 rng(11);
   for (int trial = 0; trial < 200; ++trial) {
-    std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 8 + trial % 40, false)};
-    const int holes = trial % 4;
-    for (int h = 0; h < holes; ++h) {
-      const double a = 2 * std::numbers::pi * h / std::max(holes, 1);
-      const double off = holes == 1 ? 0.0 : 35.0;
-      cs.push_back(Star(rng, off * std::cos(a), off * std::sin(a), 8, 18, 5 + trial % 9, true));
-    }
+    const std::vector<Contour> cs = PocketWithIslands(rng, 8 + trial % 40, trial % 4, 5 + trial % 9);
     const int side = 1 + trial % 3;
     std::uniform_real_distribution<double> td(0.5, 12.0);
     const double t = td(rng);

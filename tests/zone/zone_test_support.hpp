@@ -12,7 +12,6 @@
 #include <filesystem>
 #include <fstream>
 #include <map>
-#include <sstream>
 #include <string>
 #include <vector>
 
@@ -30,15 +29,14 @@ struct FakeElement {
 };
 using FakeCurve = std::vector<FakeElement>;
 
-// Records every call; a successful offset request fills the store with
-// trace() (the scripted curves unless overridden).
+// A successful offset request fills the store with trace() (the scripted
+// curves unless overridden).
 class FakeEngine : public OffsetEngine {
  public:
   struct Added {
     double x, y;
     std::int32_t tag;
   };
-  std::vector<std::string> calls;
   std::vector<Added> points;
   std::vector<std::array<std::int32_t, 3>> segments;  // i1, i2, tag
   std::vector<FakeCurve> script;
@@ -48,10 +46,9 @@ class FakeEngine : public OffsetEngine {
   Point2d shift;
   double requestT = 0.0;
 
-  bool initialize() override { return log("initialize"), true; }
-  void terminate() override { log("terminate"); }
+  bool initialize() override { return true; }
+  void terminate() override {}
   void reset() override {
-    log("reset");
     points.clear();
     segments.clear();
     store_.clear();
@@ -64,18 +61,10 @@ class FakeEngine : public OffsetEngine {
     segments.push_back({i1, i2, tag});
     return static_cast<std::int32_t>(segments.size()) - 1;
   }
-  bool computeDiagram(bool clean, std::int32_t bound, bool pointsOnly, bool keepArcLinks,
-                      std::int32_t density, std::int32_t pieces, double tol, double tol2,
-                      bool autoTol) override {
-    std::ostringstream s;
-    s << "diagram " << clean << bound << pointsOnly << keepArcLinks << density << pieces << tol
-      << tol2 << autoTol;
-    return log(s.str()), diagramOk;
+  bool computeDiagram(bool, std::int32_t, bool, bool, std::int32_t, std::int32_t, double, double, bool) override {
+    return diagramOk;
   }
-  bool computeOffsets(std::int32_t side, double t, double d) override {
-    std::ostringstream s;
-    s << "offsets " << side << ' ' << t << ' ' << d;
-    log(s.str());
+  bool computeOffsets(std::int32_t side, double t, double) override {
     requestT = t;
     if (offsetsOk) store_ = trace(side, t);
     return offsetsOk;
@@ -108,7 +97,6 @@ class FakeEngine : public OffsetEngine {
 
  protected:
   virtual std::vector<FakeCurve> trace(std::int32_t, double) { return script; }
-  void log(const std::string& call) { calls.push_back(call); }
   Point2d internal(const Point2d& u) const { return {(u.x - shift.x) * scale, (u.y - shift.y) * scale}; }
 
  private:

@@ -19,6 +19,10 @@ namespace {
 
 constexpr const char* kName = "offset";
 constexpr const char* kUsage = "usage: zonetool offset FILE --distance T --side 1|2|3 [--raw]";
+// The curves come back in the list that held the contours, one Add a point:
+// a small growth step would copy the whole list every few points of a large
+// output.
+constexpr std::int32_t kListGrowth = 1 << 16;
 
 bool parse_distance(const char* text, double& value) {
   char* end = nullptr;
@@ -94,7 +98,7 @@ int zonetool::cmd_offset(int argc, char** argv) {
   std::string error;
   if (!read_polylines(file, polylines, error)) return usage_error(kName, (std::string(path) + ": " + error).c_str());
 
-  zt::TaggedPointList list;
+  zt::TaggedPointList list{0, kListGrowth};
   for (std::size_t k = 0; k < polylines.size(); ++k) {
     for (std::size_t j = 0; j < polylines[k].size(); ++j) {
       const TextPoint& p = polylines[k][j];

@@ -45,6 +45,20 @@ double SiteDistance(std::int32_t site, std::int32_t kind, double x, double y) {
   return NAN;  // arcs are never in the diagram
 }
 
+// True when the foot of (x, y) on the segment's line lies on the segment
+// within tol.
+bool WithinExtent(std::int32_t site, double x, double y, double tol) {
+  const Engine& g = Vd();
+  const SegmentRecord& s = g.segments[site];
+  const PointRecord& a = g.points[s.i1];
+  const PointRecord& b = g.points[s.i2];
+  const double dx = b.x - a.x, dy = b.y - a.y;
+  const double len = std::sqrt(dx * dx + dy * dy);
+  if (!(len > 0.0)) return true;
+  const double t = ((x - a.x) * dx + (y - a.y) * dy) / len;
+  return t >= -tol && t <= len + tol;
+}
+
 std::string CheckTopology(std::int32_t& liveNodes, std::int32_t& liveEdges) {
   const Engine& g = Vd();
   liveNodes = liveEdges = 0;
@@ -157,6 +171,11 @@ std::string CheckGeometry(const CheckOptions& options) {
         if (!(std::fabs(d - r) <= tol))
           return Fail("node %ld: distance to site %ld differs from its radius (x1e12: %ld)", n, site,
                       static_cast<long>((d - r) * 1e12));
+        // A segment's region lies over the segment: beyond its ends the
+        // end points own the plane. At a tie of distances only this tells a
+        // region handed to the wrong site.
+        if (kind == SEG && !WithinExtent(site, node.x, node.y, tol))
+          return Fail("node %ld: lies beyond the ends of segment %ld, whose region it bounds", n, site);
       }
       // Local emptiness: the site beyond the neighbour node.
       const std::int32_t w = OtherNode(er, n);

@@ -31,11 +31,17 @@ bool Circumcentre(std::int32_t i, std::int32_t j, std::int32_t k, double& x, dou
     return true;
   }
   constexpr double kSuspect2 = kSuspectDistance * kSuspectDistance;
+  // Squared side lengths, side m opposite vertex m; computed once for the
+  // closeness test and the choice of bisectors.
+  double side2[3];
   for (int m = 0; m < 3; ++m) {
-    const PointRecord& a = *p[m];
-    const PointRecord& b = *p[(m + 1) % 3];
-    const double dx = b.x - a.x, dy = b.y - a.y;
-    if (dx * dx + dy * dy <= kSuspect2) {
+    const PointRecord& a = *p[(m + 1) % 3];
+    const PointRecord& b = *p[(m + 2) % 3];
+    side2[m] = (b.x - a.x) * (b.x - a.x) + (b.y - a.y) * (b.y - a.y);
+  }
+  // Pairs (0,1), (1,2), (2,0) in turn: the first too close is the suspect.
+  for (int m = 0; m < 3; ++m) {
+    if (side2[(m + 2) % 3] <= kSuspect2) {
       RecordSuspect(idx[m], idx[(m + 1) % 3]);
       return false;
     }
@@ -45,12 +51,6 @@ bool Circumcentre(std::int32_t i, std::int32_t j, std::int32_t k, double& x, dou
   // Twice the triangle's area is the same cross product at every vertex, so
   // that vertex is the one whose two sides have the smallest product of
   // lengths: the vertex opposite the longest side.
-  double side2[3];
-  for (int m = 0; m < 3; ++m) {
-    const PointRecord& a = *p[(m + 1) % 3];
-    const PointRecord& b = *p[(m + 2) % 3];
-    side2[m] = (b.x - a.x) * (b.x - a.x) + (b.y - a.y) * (b.y - a.y);  // opposite vertex m
-  }
   const int best = side2[0] >= side2[1] ? (side2[0] >= side2[2] ? 0 : 2) : (side2[1] >= side2[2] ? 1 : 2);
   const PointRecord& a = *p[best];
   const PointRecord& b = *p[(best + 1) % 3];

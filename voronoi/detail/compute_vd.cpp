@@ -47,8 +47,11 @@ bool PointPhase() {
     BuildInitialDiagram();
     BuildPointOrder(3, end);
   }
+  // A presorted order finds nearest points by walking the diagram: the
+  // search structure is not needed.
+  if (g.orderPresorted) ReleaseNearestSearch();
   {
-    PointLookahead ahead;
+    PointLookahead ahead(g.orderPresorted, kInitialDiagramPoint);
     Nearest nearest;
     for (std::int32_t p = ahead.Next(nearest); p >= 0; p = ahead.Next(nearest)) {
       InsertPoint(p, nearest, ahead);
@@ -74,7 +77,7 @@ bool SegmentPhase() {
   if (g.segmentsDone) return true;
   if (g.segmentsFirstPass) {
     g.segmentsFirstPass = false;
-    BuildOrder(0, g.segments.count);
+    BuildSegmentOrder();
   }
   while (g.orderRemaining > 0) {
     const std::int32_t s = DrawNext().entry;
@@ -85,6 +88,20 @@ bool SegmentPhase() {
   }
   ReleaseCrossReference();  // built on demand by the start-node search
   g.segmentsDone = true;
+  return true;
+}
+
+// Every live node at finite coordinates with a finite clearance of at
+// least zero. A node that is not would put a wrong diagram (and offsets
+// from nowhere) behind a success; one pass over the nodes costs little
+// beside building them.
+bool NodesFinite() {
+  const Engine& g = Vd();
+  for (std::int32_t n = 0; n < g.nodes.count; ++n) {
+    const NodeRecord& r = g.nodes[n];
+    if (r.status == DELETED) continue;
+    if (!std::isfinite(r.x) || !std::isfinite(r.y) || !std::isfinite(r.r) || !(r.r >= 0.0)) return false;
+  }
   return true;
 }
 
@@ -156,6 +173,7 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
     g.suspect.set = false;
     g.pointsFirstPass = g.segmentsFirstPass = g.arcsFirstPass = true;
     g.pointsDone = false;
+    g.nearestRescans = 0;
     g.segmentsDone = g.segments.count == 0 || args.pointsOnly;
     g.arcsDone = g.arcs.count == 0 || args.pointsOnly;
     // 5. Frame: bounding box and scaling of a new computation.
@@ -222,9 +240,10 @@ void ComputeVD(const ComputeArgs& args, bool& finished) {
   // A fallback builds what it can; its diagram counts as computed only when
   // it passes the checker's local tests (topology, every node equidistant
   // from its sites, no site across an edge inside a node's circle, every
-  // point with a region). Otherwise the computation ends without a diagram
-  // rather than report a wrong one.
-  if (g.recoveryMode && !CheckDiagram(CheckOptions{true, false, true}).empty()) {
+  // point with a region). Otherwise, or with a node of no finite place or
+  // clearance, the computation ends without a diagram rather than report a
+  // wrong one.
+  if (!NodesFinite() || (g.recoveryMode && !CheckDiagram(CheckOptions{true, false, true}).empty())) {
     g.upToDate = false;
     g.computing = false;
     finished = true;

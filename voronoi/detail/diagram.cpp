@@ -2,6 +2,7 @@
 #include "voronoi/detail/diagram.hpp"
 
 #include <cassert>
+#include <cmath>
 #include <cstdio>
 
 namespace zt::vd {
@@ -41,6 +42,7 @@ void Redirect(std::int32_t f, std::int32_t n, std::int32_t from, std::int32_t to
 
 std::int32_t NewNode(double x, double y, double r) {
   Engine& g = Vd();
+  assert(std::isfinite(x) && std::isfinite(y) && std::isfinite(r) && r >= 0.0);
   const std::int32_t n =
       PopOrAppend(g.freeNodes, g.nodes.count, g.nodes.capacity, kNodeGrowth, g.nodes);
   g.nodes[n] = NodeRecord{x, y, r, UNCHECKED, kNone, kNone, 0, kNone};

@@ -133,6 +133,7 @@ struct Engine {
   RecordArray<std::int32_t> insertionOrder;
   std::int32_t orderRemaining = 0;  // entries of insertionOrder not yet drawn
   bool orderPresorted = false;      // drawn front to back (BuildPointOrder)
+  std::int32_t nearestRescans = 0;  // brute-force checks of walk answers (nearest_walk.hpp)
   // The point phase's order: partly sorted (BuildPointOrder), or fully
   // random when false (kept for the checks that compare the two).
   bool presortPointOrder = true;

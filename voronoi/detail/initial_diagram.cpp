@@ -24,7 +24,7 @@ void BuildInitialDiagram() {
   g.nodes.count = g.edges.count = g.freeNodes.count = g.freeEdges.count = 0;
 
   const std::int32_t n = g.points.count;
-  const std::int32_t c0 = 0, c1 = 1, c2 = n - 1, c3 = n - 2, p = 2;
+  const std::int32_t c0 = 0, c1 = 1, c2 = n - 1, c3 = n - 2, p = kInitialDiagramPoint;
   const std::int32_t tri[4][3] = {{c0, c1, p}, {c1, p, c2}, {p, c3, c2}, {c0, p, c3}};
   double cx[4], cy[4], cr[4];
   for (int i = 0; i < 4; ++i) {

@@ -6,11 +6,16 @@
 // corner points, ending at a far node) never carry anything of interest.
 #pragma once
 
+#include <cstdint>
+
 namespace zt::vd {
 
 // How far the far nodes are moved out from their circumcentres: their
 // squared distances stay finite.
 inline constexpr double kFarNodeDistanceDivisor = 10.0;
+
+// The caller point the initial diagram holds.
+inline constexpr std::int32_t kInitialDiagramPoint = 2;
 
 void BuildInitialDiagram();
 

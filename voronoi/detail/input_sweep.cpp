@@ -280,7 +280,9 @@ bool SweepOnce() {
         const SegmentRecord r1 = g.segments[s], r2 = g.segments[t];
         const bool shared1 = r2.i1 == r1.i1 || r2.i1 == r1.i2, shared2 = r2.i2 == r1.i1 || r2.i2 == r1.i2;
         if (shared1 && shared2) {
-          removed[r2.arc >= 0 && r1.arc < 0 ? s : t] = 1;
+          const bool dropFirst = r2.arc >= 0 && r1.arc < 0;
+          AbsorbRepeatedSegment(g.segments[dropFirst ? t : s], dropFirst ? r1 : r2);
+          removed[dropFirst ? s : t] = 1;
           changed = true;
           continue;
         }

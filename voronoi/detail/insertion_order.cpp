@@ -2,6 +2,7 @@
 #include "voronoi/detail/insertion_order.hpp"
 
 #include <algorithm>
+#include <array>
 #include <cmath>
 #include <utility>
 #include <vector>
@@ -16,19 +17,44 @@ constexpr int kDrawPrefetch = 12;
 // The first round of a point order: left in random order.
 constexpr std::int32_t kFirstRound = 128;
 static_assert(kDrawPrefetch <= OrderRandom::kMaxPeek);
-// Position of (x, y) on the Hilbert curve through a 2^32 x 2^32 grid.
+// Ahead of this many entries, the key of a shuffled entry is requested.
+constexpr std::int32_t kKeyPrefetch = 16;
+
+// Hilbert curve digits four levels at a time: indexed by the orientation
+// state (2 bits) and a nibble of x and y, an entry holds the next state
+// (bits 8-9) and the eight bits of curve position of those four levels.
+// A level is the usual step: the quadrant's digit, and below a lower
+// quadrant the remaining bits swapped (and complemented on the right); as
+// both act on all lower bits at once, the state is just those two flags.
+constexpr std::array<std::uint16_t, 1024> MakeHilbertTable() {
+  std::array<std::uint16_t, 1024> t{};
+  for (unsigned state = 0; state < 4; ++state)
+    for (unsigned xn = 0; xn < 16; ++xn)
+      for (unsigned yn = 0; yn < 16; ++yn) {
+        unsigned complemented = state & 1, swapped = state >> 1, digits = 0;
+        for (int b = 3; b >= 0; --b) {
+          unsigned bx = (xn >> b) & 1, by = (yn >> b) & 1;
+          if (complemented) bx ^= 1, by ^= 1;
+          if (swapped) std::swap(bx, by);
+          digits = digits << 2 | ((3 * bx) ^ by);
+          if (by == 0) complemented ^= bx, swapped ^= 1;
+        }
+        t[state << 8 | xn << 4 | yn] = static_cast<std::uint16_t>((swapped << 1 | complemented) << 8 | digits);
+      }
+  return t;
+}
+constexpr std::array<std::uint16_t, 1024> kHilbertTable = MakeHilbertTable();
+
+// Position of (x, y) on the Hilbert curve through a 2^32 x 2^32 grid. A
+// table, not a loop over the 32 levels: that loop's branches on the bits
+// of random points are mispredicted half the time.
 std::uint64_t HilbertKey(std::uint32_t x, std::uint32_t y) {
   std::uint64_t d = 0;
-  for (std::uint32_t s = 1u << 31; s > 0; s >>= 1) {
-    const std::uint32_t rx = (x & s) ? 1 : 0, ry = (y & s) ? 1 : 0;
-    d += static_cast<std::uint64_t>(s) * s * ((3 * rx) ^ ry);
-    if (ry == 0) {  // rotate the quadrant
-      if (rx == 1) {
-        x = ~x;
-        y = ~y;
-      }
-      std::swap(x, y);
-    }
+  unsigned state = 0;
+  for (int shift = 28; shift >= 0; shift -= 4) {
+    const std::uint16_t t = kHilbertTable[state << 8 | ((x >> shift) & 15) << 4 | ((y >> shift) & 15)];
+    d = d << 8 | (t & 0xff);
+    state = t >> 8;
   }
   return d;
 }
@@ -47,20 +73,27 @@ void BuildPointOrder(std::int32_t first, std::int32_t end) {
     std::swap(order[i], order[j]);
   }
   g.orderPresorted = true;
-  double minX = g.points[order[0]].x, maxX = minX, minY = g.points[order[0]].y, maxY = minY;
-  for (std::int32_t i = 1; i < n; ++i) {
-    const PointRecord& p = g.points[order[i]];
+  // Box and keys in index order: the points are read front to back, not
+  // at the shuffled order's random places.
+  double minX = g.points[first].x, maxX = minX, minY = g.points[first].y, maxY = minY;
+  for (std::int32_t i = first + 1; i < end; ++i) {
+    const PointRecord& p = g.points[i];
     minX = std::fmin(minX, p.x), maxX = std::fmax(maxX, p.x);
     minY = std::fmin(minY, p.y), maxY = std::fmax(maxY, p.y);
   }
   const double span = std::fmax(maxX - minX, maxY - minY);
   const double toGrid = span > 0 ? 4294967295.0 / span : 0.0;
-  std::vector<std::pair<std::uint64_t, std::int32_t>> keyed(static_cast<std::size_t>(n));
+  std::vector<std::uint64_t> key(static_cast<std::size_t>(n));
   for (std::int32_t i = 0; i < n; ++i) {
-    const PointRecord& p = g.points[order[i]];
+    const PointRecord& p = g.points[first + i];
     const auto gx = static_cast<std::uint32_t>(std::fmin((p.x - minX) * toGrid, 4294967295.0));
     const auto gy = static_cast<std::uint32_t>(std::fmin((p.y - minY) * toGrid, 4294967295.0));
-    keyed[i] = {HilbertKey(gx, gy), order[i]};
+    key[i] = HilbertKey(gx, gy);
+  }
+  std::vector<std::pair<std::uint64_t, std::int32_t>> keyed(static_cast<std::size_t>(n));
+  for (std::int32_t i = 0; i < n; ++i) {
+    if (i + kKeyPrefetch < n) __builtin_prefetch(key.data() + (order[i + kKeyPrefetch] - first));
+    keyed[i] = {key[order[i] - first], order[i]};
   }
   // Rounds [n/2, n), [n/4, n/2), ... down to the first, left random.
   for (std::int32_t hi = n; hi >= 2 * kFirstRound; hi /= 2) {

@@ -54,13 +54,18 @@ geo::EdgeFrame EdgeFromRecords(std::int32_t e) {
 
 bool ComputeNodeOnEdge(std::int32_t e, std::int32_t s, std::int32_t kind, double& x, double& y, double& r,
                        bool& copied, std::int32_t& onPoint) {
+  return ComputeNodeOnEdge(e, SiteFromRecords(s, kind), x, y, r, copied, onPoint);
+}
+
+bool ComputeNodeOnEdge(std::int32_t e, const geo::SiteRef& fresh, double& x, double& y, double& r, bool& copied,
+                       std::int32_t& onPoint) {
   Engine& vd = Vd();
   copied = false;
   onPoint = -1;
   const EdgeRecord& rec = vd.edges[e];
-  if (rec.ltype == PNT && rec.rtype == PNT && kind == PNT) {
+  if (rec.ltype == PNT && rec.rtype == PNT && fresh.kind == PNT) {
     double r2 = 0.0;
-    if (!Circumcentre(rec.lft, rec.rgt, s, x, y, r2)) return false;
+    if (!Circumcentre(rec.lft, rec.rgt, fresh.pnt.index, x, y, r2)) return false;
     r = std::sqrt(r2);
     return true;
   }
@@ -68,7 +73,7 @@ bool ComputeNodeOnEdge(std::int32_t e, std::int32_t s, std::int32_t kind, double
   geo::NodeMemory memory{vd.pssOrientByKeptNode};
   geo::SuspectPair suspect;
   geo::NodeResult out;
-  const bool ok = geo::compute_node(frame, SiteFromRecords(s, kind), memory, suspect, out);
+  const bool ok = geo::compute_node(frame, fresh, memory, suspect, out);
   vd.pssOrientByKeptNode = memory.orient_by_kept;
   if (suspect.set) {
     vd.suspect.set = true;

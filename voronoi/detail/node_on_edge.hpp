@@ -16,6 +16,10 @@ namespace zt::vd {
 
 bool ComputeNodeOnEdge(std::int32_t e, std::int32_t s, std::int32_t kind, double& x, double& y, double& r,
                        bool& copied, std::int32_t& onPoint);
+// The same with the new site's geometry given: an insertion computes nodes
+// on many edges for one site, and builds its geometry once.
+bool ComputeNodeOnEdge(std::int32_t e, const geo::SiteRef& fresh, double& x, double& y, double& r, bool& copied,
+                       std::int32_t& onPoint);
 
 // The plain geometry of a site and of an edge, copied from the records.
 geo::SiteRef SiteFromRecords(std::int32_t site, std::int32_t kind);

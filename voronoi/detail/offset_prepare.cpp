@@ -1,6 +1,7 @@
 // Offset preparation and side classification (see offset_prepare.hpp).
 #include "voronoi/detail/offset_prepare.hpp"
 
+#include <algorithm>
 #include <cassert>
 #include <cmath>
 #include <cstdio>
@@ -119,13 +120,12 @@ void Take(Engine& g, OffsetState& o, std::int32_t e, std::int32_t at) {
 
 // Flood fill of the part of the diagram around edge e0 bounded by the input
 // segments (nodes of zero clearance are never passed): one face of the
-// input, whose edges that may carry offsets end up in `component`. `start`
-// is a node of e0 of non-zero clearance.
+// input, whose edges that may carry offsets are appended to `component`.
+// `start` is a node of e0 of non-zero clearance.
 void CollectPart(std::int32_t e0, std::int32_t start) {
   Engine& g = Vd();
   OffsetState& o = Offs();
   o.stack.count = 0;
-  o.component.count = 0;
   Take(g, o, e0, start);
   Push(e0, start);
   Push(e0, OtherNode(g.edges[e0], start));
@@ -142,29 +142,97 @@ void CollectPart(std::int32_t e0, std::int32_t start) {
   }
 }
 
-// Whether the current part lies on the wanted side of the input. A segment
-// with the part on both of its sides (a spike, a there-and-back contour, an
-// open polyline) lies on both sides of it and decides nothing; the others
-// decide by their lengths, so the answer is the same whatever edge the part
-// was reached from. A part bordered only by such two-sided segments lies on
-// both sides: its offsets are strokes around them. One-sided segments
-// disagree where an edge shared by two touching contours was given both
-// ways and only the first direction kept: a tie then leaves the part out,
-// so a square whose neighbours' directions were kept for two of its edges
-// is still inside.
-bool PartOnSide(bool left) {
+std::int32_t Group(OffsetState& o, std::int32_t p) {
+  while (o.parts[p].parent != p) p = o.parts[p].parent = o.parts[o.parts[p].parent].parent;
+  return p;
+}
+
+void Link(OffsetState& o, std::int32_t p, std::int32_t q) {
+  p = Group(o, p);
+  q = Group(o, q);
+  if (p != q) o.parts[std::max(p, q)].parent = std::min(p, q);
+}
+
+// Closes part `p`, just collected, from the segments it borders. A segment
+// with the part on one side votes by its length for that side, in the
+// direction it was given most. A segment with the part on both of its
+// sides (an open polyline, a there-and-back piece) decides nothing. A
+// segment given both ways (a spike, an edge two touching contours share)
+// bounds no area: it decides nothing either, and the parts on its two sides
+// lie on the same side of the input, so they join one group.
+void ClosePart(std::int32_t p) {
   Engine& g = Vd();
   OffsetState& o = Offs();
-  double leftLength = 0.0, rightLength = 0.0;
+  PartRecord& part = o.parts[p];
   for (std::int32_t i = 0; i < o.bordered.count; ++i) {
-    std::uint8_t& m = o.segmentSides[o.bordered[i]];
-    if (m == kOnLeft) leftLength += g.segments[o.bordered[i]].length;
-    if (m == kOnRight) rightLength += g.segments[o.bordered[i]].length;
+    const std::int32_t seg = o.bordered[i];
+    std::uint8_t& m = o.segmentSides[seg];
+    const SegmentRecord& s = g.segments[seg];
+    if (s.directions == 0) {
+      std::int32_t& beside = o.segmentPart[seg];
+      if (beside < 0) beside = p;
+      else Link(o, beside, p);
+    } else if (m != (kOnLeft | kOnRight)) {
+      ((m == kOnLeft) == (s.directions > 0) ? part.leftLength : part.rightLength) += s.length;
+    }
     m = 0;
   }
   o.bordered.count = 0;
-  if (leftLength == 0.0 && rightLength == 0.0) return true;
-  return left ? leftLength > rightLength : rightLength > leftLength;
+}
+
+// Whether the group of root `p` lies on the wanted side of the input, by
+// the lengths its parts' one-sided segments vote for, so the answer is the
+// same whatever edge, site or contour came first. A group with no such
+// segment lies on both sides: its offsets are strokes around its segments.
+// A tie leaves it out.
+bool GroupOnSide(const PartRecord& root, bool left) {
+  if (root.leftLength == 0.0 && root.rightLength == 0.0) return true;
+  return left ? root.leftLength > root.rightLength : root.rightLength > root.leftLength;
+}
+
+// Splits the diagram into parts bounded by the input segments, groups the
+// parts across segments given both ways and lists, part after part, the
+// edges of the groups on the wanted side.
+void ListEdgesOnSide(bool left) {
+  Engine& g = Vd();
+  OffsetState& o = Offs();
+  const std::int32_t n = g.edges.count;
+  o.segmentSides.Reserve(std::int64_t{g.segments.count} + 1);
+  o.segmentPart.Reserve(std::int64_t{g.segments.count} + 1);
+  o.segmentSides.count = o.segmentPart.count = g.segments.count;
+  for (std::int32_t k = 0; k < g.segments.count; ++k) {
+    o.segmentSides[k] = 0;
+    o.segmentPart[k] = -1;
+  }
+  o.component.count = 0;
+  o.parts.count = 0;
+  for (std::int32_t e = kFirstInnerEdge; e < n; ++e) {
+    if (!o.candidate[e]) continue;
+    const EdgeRecord& r = g.edges[e];
+    if (!Qualifies(r)) continue;
+    if (r.ltype == ARC || r.rtype == ARC) {
+      std::fputs("InitializeEdgeData: circular arcs not supported\n", stderr);
+      continue;
+    }
+    if (r.ltype != SEG && r.rtype != SEG) continue;
+    const std::int32_t start = g.nodes[r.n1].r >= g.nodes[r.n2].r ? r.n1 : r.n2;
+    if (g.nodes[start].r <= kOffsetZero) continue;
+    const std::int32_t p = o.parts.count;
+    o.parts.Append(PartRecord{o.component.count, p, 0.0, 0.0}, kTraversalGrowth);
+    CollectPart(e, start);
+    ClosePart(p);
+  }
+  for (std::int32_t p = 0; p < o.parts.count; ++p) {
+    const std::int32_t root = Group(o, p);
+    if (root == p) continue;
+    o.parts[root].leftLength += o.parts[p].leftLength;
+    o.parts[root].rightLength += o.parts[p].rightLength;
+  }
+  for (std::int32_t p = 0; p < o.parts.count; ++p) {
+    if (!GroupOnSide(o.parts[Group(o, p)], left)) continue;
+    const std::int32_t end = p + 1 < o.parts.count ? o.parts[p + 1].firstEdge : o.component.count;
+    for (std::int32_t i = o.parts[p].firstEdge; i < end; ++i) o.workList.Append(o.component[i], kTraversalGrowth);
+  }
 }
 
 }  // namespace
@@ -203,24 +271,7 @@ void InitializeEdgeData(bool left, bool right) {
     for (std::int32_t e = kFirstInnerEdge; e < n; ++e)
       if (Qualifies(g.edges[e])) o.workList.Append(e, kTraversalGrowth);
   } else {
-    o.segmentSides.Reserve(std::int64_t{g.segments.count} + 1);
-    o.segmentSides.count = g.segments.count;
-    for (std::int32_t k = 0; k < g.segments.count; ++k) o.segmentSides[k] = 0;
-    for (std::int32_t e = kFirstInnerEdge; e < n; ++e) {
-      if (!o.candidate[e]) continue;
-      const EdgeRecord& r = g.edges[e];
-      if (!Qualifies(r)) continue;
-      if (r.ltype == ARC || r.rtype == ARC) {
-        std::fputs("InitializeEdgeData: circular arcs not supported\n", stderr);
-        continue;
-      }
-      if (r.ltype != SEG && r.rtype != SEG) continue;
-      const std::int32_t start = g.nodes[r.n1].r >= g.nodes[r.n2].r ? r.n1 : r.n2;
-      if (g.nodes[start].r <= kOffsetZero) continue;
-      CollectPart(e, start);
-      if (!PartOnSide(left)) continue;
-      for (std::int32_t i = 0; i < o.component.count; ++i) o.workList.Append(o.component[i], kTraversalGrowth);
-    }
+    ListEdgesOnSide(left);
   }
   for (std::int32_t e = 0; e < n; ++e) o.candidate[e] = e >= kFirstInnerEdge ? 1 : 0;
 }
@@ -233,6 +284,7 @@ void ResetOffsetState() {
   o.workList.count = 0;
   o.stack.count = 0;
   o.component.count = 0;
+  o.parts.count = 0;
   o.bordered.count = 0;
   o.finished = true;
   o.written = false;
@@ -251,8 +303,10 @@ void FreeOffsetState() {
   o.workList.Free();
   o.stack.Free();
   o.component.Free();
+  o.parts.Free();
   o.bordered.Free();
   o.segmentSides.Free();
+  o.segmentPart.Free();
 }
 
 }  // namespace zt::vd

@@ -43,17 +43,32 @@ struct TraversalEntry {
   std::int32_t node;  // the node to cross from
 };
 
+// One part of the diagram in the side classification: its edges start at
+// component[firstEdge]; parts that face each other across segments given
+// both ways form one group (union-find through `parent`), which lies on
+// the side its one-sided segments say, by length.
+struct PartRecord {
+  std::int32_t firstEdge;
+  std::int32_t parent;
+  double leftLength;
+  double rightLength;
+};
+
 struct OffsetState {
   RecordArray<std::uint8_t> candidate;  // 1: may start a curve at this distance
   RecordArray<std::int32_t> crossedPass;  // pass in which the edge was last crossed
   RecordArray<OffsetEdgeData> data;
   RecordArray<std::int32_t> workList;
   RecordArray<TraversalEntry> stack;
-  // Side classification of one part of the diagram: its edges, the segments
-  // it borders and, per segment, the sides it lies on (kSideLeft|kSideRight).
+  // Side classification: the edges of every part, one part after another;
+  // the parts; the segments the current part borders and, per segment, the
+  // sides it lies on (kOnLeft|kOnRight); per segment given both ways, the
+  // first part seen beside it (-1 before).
   RecordArray<std::int32_t> component;
+  RecordArray<PartRecord> parts;
   RecordArray<std::int32_t> bordered;
   RecordArray<std::uint8_t> segmentSides;
+  RecordArray<std::int32_t> segmentPart;
   double distance = 0.0;  // internal units
   double step = 0.0;
   bool finished = true;

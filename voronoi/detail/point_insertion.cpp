@@ -8,6 +8,7 @@
 #include "voronoi/detail/diagram.hpp"
 #include "voronoi/detail/input_repair.hpp"
 #include "voronoi/detail/nearest_search.hpp"
+#include "voronoi/detail/nearest_walk.hpp"
 #include "voronoi/detail/point_lookahead.hpp"
 #include "voronoi/detail/preprocess.hpp"
 
@@ -202,6 +203,17 @@ void InsertPoint(std::int32_t p, const Nearest& nearest, PointLookahead& ahead) 
   }
 
   std::int32_t seed = FindSeed(q, p, ahead);
+  if (seed < 0 && g.orderPresorted && g.nearestRescans < kMaxNearestRescans) {
+    // The nearest point came from a walk through the diagram, which relies
+    // on the diagram being exact: before treating this as an input defect,
+    // check the walk's answer against every inserted point.
+    ++g.nearestRescans;
+    const Nearest scanned = ScanNearest(p);
+    if (scanned.point >= 0 && scanned.dist2 < d2) {
+      InsertPoint(p, scanned, ahead);
+      return;
+    }
+  }
   if (seed < 0) {
     g.errorFlag = true;
     if (RepairInput(p, PNT, true)) return;

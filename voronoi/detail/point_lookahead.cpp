@@ -2,11 +2,13 @@
 #include "voronoi/detail/point_lookahead.hpp"
 
 #include "voronoi/detail/insertion_order.hpp"
+#include "voronoi/detail/nearest_walk.hpp"
 
 namespace zt::vd {
 
 std::int32_t PointLookahead::Next(Nearest& nearest) {
   Engine& g = Vd();
+  if (walk_) return NextByWalk(nearest);
   while (count_ < kSlots) {
     const Draw d = DrawNext();
     if (d.entry < 0) break;
@@ -43,6 +45,23 @@ std::int32_t PointLookahead::Next(Nearest& nearest) {
   const std::int32_t p = front.point;
   first_ = (first_ + 1) % kSlots;
   --count_;
+  return p;
+}
+
+std::int32_t PointLookahead::NextByWalk(Nearest& nearest) {
+  Engine& g = Vd();
+  // The walk starts at the point inserted last; a point merged away has no
+  // region, and then the site its own walk ended at is as close.
+  if (last_ >= 0 && g.points[last_].vd >= 0 && !g.points[last_].deleted) from_ = last_;
+  const std::int32_t p = DrawNext().entry;
+  if (p < 0) return kNone;
+  // A presorted order is drawn front to back: the record of the point
+  // kSlots - 1 draws ahead is requested now.
+  const std::int32_t ahead = g.insertionOrder.count - g.orderRemaining + kSlots - 2;
+  if (ahead < g.insertionOrder.count) g.points.Prefetch(g.insertionOrder[ahead]);
+  nearest = g.points[p].deleted ? Nearest{} : WalkToNearest(from_, p);
+  if (nearest.point >= 0) from_ = nearest.point;
+  last_ = p;
   return p;
 }
 

@@ -37,6 +37,15 @@ namespace zt::vd {
 
 class PointLookahead {
  public:
+  // With a presorted order (see insertion_order.hpp) the nearest point
+  // comes from a walk through the diagram just before the insertion (see
+  // nearest_walk.hpp), and the lookahead only requests the point records;
+  // the search structure is then not used. `firstSite` is a point of the
+  // diagram the first walk starts from.
+  explicit PointLookahead(bool walk = false, std::int32_t firstSite = kNone)
+      : walk_(walk), from_(firstSite) {}
+
+
   // The next point to insert and its nearest point; -1 when the order is
   // exhausted.
   std::int32_t Next(Nearest& nearest);
@@ -44,7 +53,9 @@ class PointLookahead {
   // A checkpoint inside an insertion: one step of one of the walks under
   // way, in turn, so that a walk's next record has time to arrive.
   void Step(Engine& g) {
-    if (count_ == 0) return;
+    // Walks through the diagram need no hints: the last insertion left the
+    // records around the next point in cache.
+    if (walk_ || count_ == 0) return;
     if (++turn_ >= count_) turn_ = 0;
     Slot& s = At(turn_);
     if (s.pathNode >= 0) s.pathNode = NearestPathStep(s.pathNode, s.x, s.y);
@@ -72,11 +83,15 @@ class PointLookahead {
     double x, y;
   };
   Slot& At(int i) { return slots_[(first_ + i) % kSlots]; }
+  std::int32_t NextByWalk(Nearest& nearest);
 
   Slot slots_[kSlots] = {};
   int first_ = 0;
   int count_ = 0;
   int turn_ = 0;
+  bool walk_ = false;
+  std::int32_t from_ = kNone;  // a site of the diagram near the next point
+  std::int32_t last_ = kNone;  // the point given out last
 };
 
 }  // namespace zt::vd

@@ -199,8 +199,14 @@ void CleanInput(bool sortSegments) {
     return p.x < q.x || (p.x == q.x && p.y < q.y);
   });
   // Runs of equal coordinates collapse into one point: the first live one.
-  // A point marked deleted always coincides with the point it was merged
-  // into, so it joins that point's run and goes too.
+  // A point marked deleted coincides with the point it was merged into, so
+  // it joins that point's run and goes too, unless a later repair moved
+  // that point away: such a run of deleted points alone goes as a whole when
+  // no segment ends there, and comes back to life when one does (it must
+  // not reach the diagram as a deleted point, nor vanish under a segment).
+  std::vector<std::uint8_t> isEnd(n, 0);
+  for (std::int32_t s = 0; s < g.segments.count; ++s) isEnd[g.segments[s].i1] = isEnd[g.segments[s].i2] = 1;
+  for (std::int32_t a = 0; a < g.arcs.count; ++a) isEnd[g.arcs[a].i1] = isEnd[g.arcs[a].i2] = 1;
   std::vector<PointRecord> sorted;
   sorted.reserve(n);
   std::vector<std::int32_t> newIndex(n, -1);
@@ -211,7 +217,16 @@ void CleanInput(bool sortSegments) {
     while (end < n && g.points[order[end]].x == first.x && g.points[order[end]].y == first.y) ++end;
     std::int32_t keep = k;
     while (keep < end && g.points[order[keep]].deleted) ++keep;
-    if (keep == end) keep = k;
+    if (keep == end) {
+      bool used = false;
+      for (std::int32_t m = k; m < end; ++m) used = used || isEnd[order[m]];
+      if (!used) {
+        k = end;
+        continue;
+      }
+      keep = k;
+      g.points[order[keep]].deleted = 0;
+    }
     const std::int32_t at = static_cast<std::int32_t>(sorted.size());
     sorted.push_back(g.points[order[keep]]);
     for (std::int32_t m = k; m < end; ++m) {
@@ -244,6 +259,7 @@ void CleanInput(bool sortSegments) {
     SegmentRecord* out = b;
     for (SegmentRecord* it = b; it != e; ++it) {
       if (out != b && key(*(out - 1)) == key(*it)) {
+        AbsorbRepeatedSegment(*(out - 1), *it);
         ++g.removedSegments;
         continue;
       }

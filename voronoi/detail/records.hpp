@@ -46,6 +46,11 @@ struct SegmentRecord {
   std::int32_t i1;
   std::int32_t i2;
   std::uint8_t flag;
+  // Copies of this segment given from i1 to i2, less those given from i2 to
+  // i1: the cleaning keeps one record of a repeated segment. 0 for an edge
+  // given both ways (an edge two touching contours share, a spike), which
+  // bounds no area and has the same material on both of its sides.
+  std::int16_t directions;
   // Supporting line a*x + b*y + c = 0, (a, b) the unit normal to the left;
   // a*x + b*y + c > 0 on the left of the directed segment.
   double a;
@@ -56,6 +61,13 @@ struct SegmentRecord {
   std::int32_t tag;
   std::int32_t arc;
 };
+
+// Folds the directions of `removed`, a repeated copy of `kept` (the same
+// two end points) that the cleaning drops, into `kept`.
+inline void AbsorbRepeatedSegment(SegmentRecord& kept, const SegmentRecord& removed) {
+  const int sum = kept.directions + (removed.i1 == kept.i1 ? removed.directions : -removed.directions);
+  kept.directions = static_cast<std::int16_t>(sum < INT16_MIN ? INT16_MIN : (sum > INT16_MAX ? INT16_MAX : sum));
+}
 
 // Arcs are stored and transformed but never inserted into the diagram.
 struct ArcRecord {

@@ -66,8 +66,39 @@ double left_clearance(const EdgeFrame& e, Point2d c) {
   }
 }
 
+namespace {
+
+// The point of least clearance on the bisector of two sites where that lies
+// between the sites rather than at infinity: the midpoint of two points, the
+// apex of the parabola of a point and a segment not ending at it. False for
+// other pairs (the clearance is monotone along their edges).
+bool clearance_apex(const EdgeFrame& e, Point2d& apex, double& clearance) {
+  const SiteRef& l = e.left;
+  const SiteRef& r = e.right;
+  if (l.kind == kKindPnt && r.kind == kKindPnt) {
+    apex = mul(add(l.pnt.p, r.pnt.p), 0.5);
+    clearance = 0.5 * distance(l.pnt.p, r.pnt.p);
+    return true;
+  }
+  if ((l.kind == kKindPnt) == (r.kind == kKindPnt) || is_own_end(l, r) || is_own_end(r, l)) return false;
+  const SiteRef& s = l.kind == kKindSeg ? l : r;
+  const SiteRef& p = l.kind == kKindSeg ? r : l;
+  if (s.kind != kKindSeg) return false;
+  const double d = s.seg.D(p.pnt.p);
+  apex = sub(p.pnt.p, mul(Point2d{s.seg.a, s.seg.b}, 0.5 * d));
+  clearance = 0.5 * std::fabs(d);
+  return true;
+}
+
+}  // namespace
+
 double radius_band(const EdgeFrame& e, Point2d c) {
-  const double r1 = std::min(e.n1.r, e.n2.r);
+  double r1 = std::min(e.n1.r, e.n2.r);
+  // Along an edge that passes its apex the clearance falls below both end
+  // radii and rises again: the band reaches down to the apex's clearance.
+  Point2d apex;
+  double low;
+  if (clearance_apex(e, apex, low) && low < r1 && extent_on_edge(e, apex) == 0.0) r1 = low;
   const double r2 = std::max(e.n1.r, e.n2.r);
   const double d = left_clearance(e, c);
   if (d < r1) return r1 - d;
@@ -76,11 +107,22 @@ double radius_band(const EdgeFrame& e, Point2d c) {
 }
 
 bool first_root_wins(const EdgeFrame& e, Point2d n1, Point2d n2, const RootChain& chain) {
-  if (int v = compare(extent_on_edge(e, n1), extent_on_edge(e, n2))) return v < 0;
+  // A root at an end node lies on the edge, whichever side of that node the
+  // rounding puts it, and a root at the edge's apex lies within its radius
+  // band: C1 and C3 decide only beyond the rounding band.
+  const auto extent = [&](Point2d c) {
+    const double x = extent_on_edge(e, c);
+    return x <= kRootExtentBand ? 0.0 : x;
+  };
+  if (int v = compare(extent(n1), extent(n2))) return v < 0;
   for (int i = 0; i < chain.count; ++i) {
     if (int v = compare(chain.c2[i]->beyond(n1), chain.c2[i]->beyond(n2))) return v < 0;
   }
-  if (int v = compare(radius_band(e, n1), radius_band(e, n2))) return v < 0;
+  const auto band = [&](Point2d c) {
+    const double x = radius_band(e, c);
+    return x <= kRootExtentBand ? 0.0 : x;
+  };
+  if (int v = compare(band(n1), band(n2))) return v < 0;
   const Point2d g = e.gone().p;
   return !(norm2(sub(n2, g)) < norm2(sub(n1, g)));
 }

@@ -4,16 +4,22 @@
 // non-negative number where smaller is better; a criterion is consulted only
 // when the previous ones tie exactly (criteria that are satisfied are exactly
 // 0, so exact ties are the common case, not an accident of rounding):
-//   C1  extent on the edge: 0 inside, else the distance to the nearer end;
+//   C1  extent on the edge: 0 inside (or within kRootExtentBand of it), else
+//       the distance to the nearer end;
 //   C2  for a segment: how far the candidate's foot lies beyond it;
 //   C3  radius band: how far the candidate's clearance lies outside the
-//       radii of the edge's end nodes;
+//       radii of the edge's end nodes (down to the clearance of the edge's
+//       apex where the edge passes it), 0 within kRootExtentBand;
 //   C4  0 for the candidate nearer to the deleted end node, 1 for the other.
 #pragma once
 
 #include "voronoi/detail/node_geometry.hpp"
 
 namespace zt::vd::geo {
+
+// Distances up to this count as 0 in C1 and C3: the rounding of a root that
+// coincides with an end node, or with the apex of the edge.
+inline constexpr double kRootExtentBand = 1e-11;
 
 // Signed position of end node x along the edge relative to candidate c, as a
 // length: cross product along the bisector of two points, across the line of a

@@ -4,6 +4,7 @@
 
 #include "voronoi/detail/diagram.hpp"
 #include "voronoi/detail/input_repair.hpp"
+#include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_on_edge.hpp"
 #include "voronoi/detail/root_selection.hpp"
 #include "voronoi/detail/segment_insertion.hpp"
@@ -11,6 +12,9 @@
 
 namespace zt::vd {
 namespace {
+
+// Conflict values within this of zero are ties of rounding (internal units).
+constexpr double kTieBand = 1e-9;
 
 thread_local ThreadScratch<std::int32_t> gSegmentsBeside;  // segment sites beside the tree
 
@@ -28,13 +32,34 @@ void RecordSite(std::int32_t site, std::int32_t kind) {
   g.markedSites.Append(site, kScratchGrowth);
 }
 
+// A node whose conflict with the segment (value) is a tie within rounding (a node
+// on a circle through one of the segment's end points, its foot at that
+// end) may sit at the far end of an edge whose middle is plainly outside
+// the conflict: taking it would hand the whole edge to the segment and cut
+// the region on its side off from its site. Such a node is not reached
+// along that edge.
+bool TieAcrossEdge(const SegmentInsertion& si, std::int32_t e, double value, double tol) {
+  if (!(value > -kTieBand)) return false;
+  const geo::EdgeFrame f = EdgeFromRecords(e);
+  const Point2d mid = geo::edge_point(f, 0.5);
+  const double lam = si.line.lambda(mid);
+  if (!(lam >= -tol && lam <= si.line.len + tol)) return true;
+  return std::fabs(si.line.D(mid)) - f.left.dist(mid) > kTieBand;
+}
+
 // One attempt: depth first from the start node, through every node in
-// conflict within tol. True when the end node was reached.
-bool GrowOnce(const SegmentInsertion& si, double tol) {
+// conflict within tol. True when the end node was reached. `isTree` tells
+// whether the nodes marked VISITED form a tree: they are connected, so they
+// do when their edges among themselves number one less than they.
+bool GrowOnce(const SegmentInsertion& si, double tol, bool& isTree) {
   Engine& g = Vd();
   g.stack.count = 0;
   TouchNode(si.start, VISITED);
   g.stack.Append(si.start, kScratchGrowth);
+  // Nodes on the segment's end points are marked VISITED but not entered: an
+  // edge between two entered nodes is met from both, one to such a leaf once.
+  std::int64_t visited = 1, twiceInner = 0, leafEdges = 0;
+  const auto isLeaf = [&](std::int32_t w) { return w != si.start && g.nodes[w].site >= 0; };
   while (g.stack.count > 0) {
     const std::int32_t n = g.stack[--g.stack.count];
     const std::int32_t e0 = g.nodes[n].edge;
@@ -47,13 +72,29 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
       RecordSite(er.lft, er.ltype);
       RecordSite(er.rgt, er.rtype);
       const NodeRecord& wn = g.nodes[w];
-      if (wn.status == UNCHECKED) {
+      if (wn.status == VISITED) {
+        ++(isLeaf(w) ? leafEdges : twiceInner);
+      } else if (wn.status == UNCHECKED) {
         if (wn.site >= 0) {
           // A node on an input point: part of the tree only when the point
           // ends this segment, and never passed through.
-          TouchNode(w, (wn.site == si.i1 || wn.site == si.i2) ? VISITED : CHECKED);
-        } else if (!IsFarNode(w) && ConflictValue(si, w, tol) <= tol) {
+          const bool end = wn.site == si.i1 || wn.site == si.i2;
+          TouchNode(w, end ? VISITED : CHECKED);
+          if (end) {
+            ++visited, ++leafEdges;
+            // Edges between two such leaves are met from neither.
+            const std::int32_t f0 = wn.edge;
+            std::int32_t f = f0;
+            do {
+              const EdgeRecord& fr = g.edges[f];
+              const std::int32_t u = OtherNode(fr, w);
+              if (u != w && g.nodes[u].status == VISITED && isLeaf(u)) ++leafEdges;
+              f = CcwAt(fr, w);
+            } while (f != f0);
+          }
+        } else if (double v; !IsFarNode(w) && (v = ConflictValue(si, w, tol)) <= tol && !TieAcrossEdge(si, e, v, tol)) {
           TouchNode(w, VISITED);
+          ++visited, ++twiceInner;
           g.stack.Append(w, kScratchGrowth);
           // The growth goes on from w along its other edges.
           g.edges.Prefetch(CcwAt(er, w));
@@ -65,6 +106,7 @@ bool GrowOnce(const SegmentInsertion& si, double tol) {
       e = CcwAt(er, n);
     } while (e != e0);
   }
+  isTree = twiceInner % 2 == 0 && twiceInner / 2 + leafEdges == visited - 1;
   return g.nodes[si.end].status == VISITED;
 }
 
@@ -233,10 +275,11 @@ void CopyIntoDegree2(std::int32_t e, std::int32_t n) {
 
 bool GrowDeletedTree(SegmentInsertion& si) {
   Engine& g = Vd();
-  bool reached = false;
+  bool reached = false, isTree = false;
+  si.grownTree = false;
   for (double tol = kGrowthTol; tol <= kLadderTop; tol = NextTolerance(tol)) {
     ResetInsertionMarks();
-    if ((reached = GrowOnce(si, tol))) break;
+    if ((reached = GrowOnce(si, tol, isTree))) break;
   }
   if (!reached) {
     if (RepairInput(si.s, SEG, false)) {
@@ -245,7 +288,8 @@ bool GrowDeletedTree(SegmentInsertion& si) {
     }
     ResetInsertionMarks();
     si.end = si.start;
-    GrowOnce(si, kLadderTop);
+    GrowOnce(si, kLadderTop, isTree);
+    isTree = false;
     g.errorFlag = true;
     g.recoveryMode = true;
   }
@@ -259,6 +303,7 @@ bool GrowDeletedTree(SegmentInsertion& si) {
     }
   }
   // Every recorded point keeps part of its region.
+  const std::int32_t degree2Before = g.degree2.count;
   for (std::int32_t i = 0; i < g.markedSites.count; ++i) {
     const std::int32_t p = g.markedSites[i];
     if (!RegionSwallowed(p)) continue;
@@ -267,6 +312,9 @@ bool GrowDeletedTree(SegmentInsertion& si) {
       return false;
     }
   }
+  // A protection splits an edge of the collected set: the tree check must
+  // walk the set again.
+  si.grownTree = isTree && g.degree2.count == degree2Before && !g.errorFlag;
   return true;
 }
 

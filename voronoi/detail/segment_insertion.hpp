@@ -43,6 +43,9 @@ struct SegmentInsertion {
   geo::SegSite line;
   std::int32_t start = kNone;
   std::int32_t end = kNone;
+  // The growth found the collected nodes to be a tree, and nothing split
+  // their edges since.
+  bool grownTree = false;
 };
 
 // dist(N) − r(N): the node's distance to the segment's line while its foot

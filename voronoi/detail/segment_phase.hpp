@@ -8,6 +8,17 @@
 
 namespace zt::vd {
 
+// The segment phase's insertion order, drawn front to back. Polygon input
+// comes in contour order, and a segment inserted next to the one before it
+// finds the records its insertion touches in cache: the order is the index
+// order. That order pays only while each insertion deletes few nodes. A
+// segment long against the spacing of the points around it crosses many
+// regions of the points' diagram, and in index order its neighbours, inserted
+// just before it, leave the nodes along all its length for it to delete
+// again; such input gets a partly sorted random order instead (random rounds
+// doubling in size, each in index order), under which a new segment mostly
+// meets segments inserted near it in an earlier round.
+void BuildSegmentOrder();
 void InsertSegment(std::int32_t s);
 void SplitAtSegmentEndPoints();
 

@@ -97,10 +97,11 @@ bool RepairBesideRegion(const SegmentInsertion& si) {
 bool ComputeNewNodes(const SegmentInsertion& si) {
   Engine& g = Vd();
   bool repairTried = false;  // one local repair per insertion is enough
+  const geo::SiteRef fresh = geo::SiteRef::segment(si.line);
   for (std::int32_t k = 0; k < gBoundary.count; ++k) {
     BoundaryEntry& b = gBoundary[k];
     bool copied = false;
-    if (!ComputeNodeOnEdge(b.edge, si.s, SEG, b.x, b.y, b.r, copied, b.onPoint)) {
+    if (!ComputeNodeOnEdge(b.edge, fresh, b.x, b.y, b.r, copied, b.onPoint)) {
       if (RepairInput(si.s, SEG, true)) return false;
       const EdgeRecord& er = g.edges[b.edge];
       const NodeRecord& kept = g.nodes[InTree(er.n1) ? er.n2 : er.n1];

@@ -78,7 +78,9 @@ bool RepairSegmentSegment(std::int32_t a, std::int32_t b) {
   const bool shared21 = r2.i1 == r1.i1 || r2.i1 == r1.i2;
   const bool shared22 = r2.i2 == r1.i1 || r2.i2 == r1.i2;
   if (shared21 && shared22) {
-    RemoveSegment(r2.arc >= 0 && r1.arc < 0 ? s1 : s2);
+    const bool dropFirst = r2.arc >= 0 && r1.arc < 0;
+    AbsorbRepeatedSegment(g.segments[dropFirst ? s2 : s1], dropFirst ? r1 : r2);
+    RemoveSegment(dropFirst ? s1 : s2);
     return true;
   }
   if (shared21 || shared22 || !(r1.length > 0.0) || !(r2.length > 0.0)) return false;

@@ -150,6 +150,18 @@ bool BreakCycle(const SegmentInsertion& si) {
 
 bool MakeTree(SegmentInsertion& si) {
   Engine& g = Vd();
+  if (si.grownTree) {
+    // The depth-first walk below would find no cycle and mark the nodes in
+    // the order the growth met them, the same walk over the same nodes.
+    g.deletedNodes.count = 0;
+    for (std::int32_t i = 0; i < g.checkedNodes.count; ++i) {
+      const std::int32_t n = g.checkedNodes[i];
+      if (g.nodes[n].status != VISITED) continue;
+      g.nodes[n].status = DELETED;
+      g.deletedNodes.Append(n, kScratchGrowth);
+    }
+    return true;
+  }
   // Each round splits an edge of the collected set; the set is finite.
   const std::int64_t limit = 4 * std::int64_t{g.checkedNodes.count} + 16;
   for (std::int64_t round = 0; round < limit; ++round) {
