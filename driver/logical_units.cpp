@@ -10,6 +10,7 @@
 #include <limits>
 #include <map>
 #include <memory>
+#include <utility>
 
 #include "driver/detail/unit_cleanup.hpp"
 #include "driver/record_stream.hpp"
@@ -102,34 +103,42 @@ void attach_record_output(const std::int32_t& unit, const std::string& path) {
   }
 }
 
-bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z, RecordFaultInfo& fault) {
+namespace {
+
+// The next record's x, y, z; false at the end of the file or after handing
+// a fault to `faulted` (which may not return).
+template <typename Faulted>
+bool read_xyz(std::int32_t unit, float& x, float& y, float& z, Faulted faulted) {
   Unit& u = reader_unit(unit);
-  fault = {};
   std::uint8_t head[kPointXyzBytes];
   std::size_t length = 0;
   switch (u.in.read(head, length)) {
     case ReadStatus::kEnd: return false;
-    case ReadStatus::kFault: fault = u.in.fault(); return false;
+    case ReadStatus::kFault: faulted(u.in.fault()); return false;
     case ReadStatus::kRecord: break;
   }
   const std::int64_t record = u.in.next_record() - 1;
   if (length < kPointXyzBytes) {
-    fault = {RecordFault::kShortRecord, u.path, record, std::to_string(length) + " bytes"};
+    faulted({RecordFault::kShortRecord, u.path, record, std::to_string(length) + " bytes"});
     return false;
   }
   decode_xyz(head, x, y, z);
   if (!std::isfinite(x) || !std::isfinite(y) || !std::isfinite(z)) {
-    fault = {RecordFault::kNonFinite, u.path, record, {}};
+    faulted({RecordFault::kNonFinite, u.path, record, {}});
     return false;
   }
   return true;
 }
 
+}  // namespace
+
+bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z, RecordFaultInfo& fault) {
+  fault.fault = RecordFault::kNone;
+  return read_xyz(unit, x, y, z, [&fault](const RecordFaultInfo& info) { fault = info; });
+}
+
 bool read_record_xyz(const std::int32_t& unit, float& x, float& y, float& z) {
-  RecordFaultInfo fault;
-  if (read_record_xyz(unit, x, y, z, fault)) return true;
-  if (fault.fault != RecordFault::kNone) record_stop(fault);
-  return false;
+  return read_xyz(unit, x, y, z, [](const RecordFaultInfo& info) { record_stop(info); });
 }
 
 std::int32_t record_position(const std::int32_t& unit) {
