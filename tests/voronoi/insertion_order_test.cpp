@@ -52,11 +52,7 @@ Diagram Capture() {
 
 // Rows: name, generator list (vd_test_util.hpp), or "star n" for a star
 // polygon of n spikes of uneven lengths (segments).
-struct Input {
-  const char* name;
-  const char* list;
-};
-const Input kInputs[] = {
+const NamedList kInputs[] = {
     {"Uniform", "uniform 3000 7 1000"},
     {"Clustered", "clustered 3000 3"},
     {"LatticeCocircular", "lattice 40 1"},
@@ -84,7 +80,7 @@ Diagram Compute(const std::string& input, bool presorted) {
   return Capture();
 }
 
-class InsertionOrder : public ::testing::TestWithParam<Input> {};
+class InsertionOrder : public ::testing::TestWithParam<NamedList> {};
 
 TEST_P(InsertionOrder, PresortedOrderGivesTheDiagramOfARandomOne) {
   const Diagram random = Compute(GetParam().list, false);
@@ -102,7 +98,7 @@ TEST_P(InsertionOrder, PresortedOrderGivesTheDiagramOfARandomOne) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Inputs, InsertionOrder, ::testing::ValuesIn(kInputs),
-                         [](const ::testing::TestParamInfo<Input>& i) { return std::string(i.param.name); });
+                         NamedListName);
 
 }  // namespace
 }  // namespace zt::test

@@ -13,11 +13,7 @@
 namespace zt::test {
 namespace {
 
-struct Input {
-  const char* name;
-  const char* list;
-};
-const Input kInputs[] = {
+const NamedList kInputs[] = {
     {"Uniform", "uniform 3000 7 1000"},
     {"Clustered", "clustered 3000 3"},
     {"HalfClustered", "uniform 1500 4 1000; uniform 1500 5 1"},
@@ -26,7 +22,7 @@ const Input kInputs[] = {
     {"Collinear", "collinear 500 3"},
 };
 
-class NearestWalk : public ::testing::TestWithParam<Input> {};
+class NearestWalk : public ::testing::TestWithParam<NamedList> {};
 
 TEST_P(NearestWalk, EndsAtTheNearestSiteFromAnyStart) {
   Store(Generate(GetParam().list));
@@ -66,7 +62,7 @@ TEST_P(NearestWalk, EndsAtTheNearestSiteFromAnyStart) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Inputs, NearestWalk, ::testing::ValuesIn(kInputs),
-                         [](const auto& info) { return std::string(info.param.name); });
+                         NamedListName);
 
 }  // namespace
 }  // namespace zt::test

@@ -32,6 +32,14 @@ inline std::vector<Pt> UniformPoints(int n, std::uint32_t seed, double scale = 1
   return pts;
 }
 
+// A parameterised test's input: a row name and a generator list for Generate
+// (or a form the test reads itself); NamedListName names the instance.
+struct NamedList {
+  const char* name;
+  const char* list;
+};
+inline std::string NamedListName(const ::testing::TestParamInfo<NamedList>& info) { return info.param.name; }
+
 // The points of a generator list, parts separated by ';':
 //   points x y x y ...     the given points
 //   uniform n seed scale   UniformPoints
