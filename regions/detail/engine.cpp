@@ -35,6 +35,7 @@ void reset_set(BooleanEngine&, PolygonSet& set) {
   set.root = nullptr;
   set.firstBox = 0;
   set.lastBox = -1;
+  set.rows.built = false;
 }
 
 namespace {

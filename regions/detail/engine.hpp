@@ -120,6 +120,27 @@ struct EdgeOverlap {
   Edge* b = nullptr;
 };
 
+// A set's boxes by horizontal rows, for many rays in one operation
+// (ray_count.cpp): the boxes reaching into row k are entries
+// [starts[k], starts[k + 1]), by descending right end.
+struct RayRowEntry {
+  double xmax = 0.0;
+  const EdgeBox* box = nullptr;
+};
+struct RayRows {
+  bool built = false;
+  std::int32_t rowCount = 0;
+  double y0 = 0.0, rowsPerUnit = 0.0;
+  std::int32_t* starts = nullptr;
+  std::int32_t startCapacity = 0;
+  RayRowEntry* entries = nullptr;
+  std::int32_t entryCapacity = 0;
+  RayRows() = default;
+  RayRows(const RayRows&) = delete;
+  RayRows& operator=(const RayRows&) = delete;
+  ~RayRows();
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
@@ -127,6 +148,7 @@ struct PolygonSet {
   std::int32_t firstBox = 0;
   std::int32_t lastBox = -1;
   bool cancelled = false;  // some contour of it bounded nothing and was dropped
+  RayRows rows;
 };
 
 struct BooleanEngine {
@@ -261,7 +283,7 @@ int settle_splits(BooleanEngine& e, Edge& edge, double eps);
 int build_half_edges(BooleanEngine& e, PolygonSet& set);
 bool contour_has_splits(BooleanEngine& e, InputContour& c);
 
-// ---- classification (stars.cpp, whole_contours.cpp)
+// ---- classification (stars.cpp, whole_contours.cpp, ray_count.cpp)
 double pseudo_angle(double c, double s);
 struct StarRule {
   std::int32_t keepAInsideB;
@@ -277,6 +299,9 @@ void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std
 // leaving out the edges that start, end or are split at `skip`.
 std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py,
                                  const Vertex* skip = nullptr);
+// Readies the set for about `rays` ray counts in this operation: rows when
+// they pay, else the tree answers (the counts are the same either way).
+void prepare_ray_rows(BooleanEngine& e, PolygonSet& set, std::int64_t rays);
 
 // ---- emission (emission.cpp)
 // resultOnLeft: contours start from kept half-edges with the result on
