@@ -302,6 +302,9 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
 // Readies the set for about `rays` ray counts in this operation: rows when
 // they pay, else the tree answers (the counts are the same either way).
 void prepare_ray_rows(BooleanEngine& e, PolygonSet& set, std::int64_t rays);
+// Test hook: when set, the calling thread's operations count every ray by
+// the tree, so that a test can compare the results with and without rows.
+inline thread_local bool tl_rayRowsOff = false;
 
 // ---- emission (emission.cpp)
 // resultOnLeft: contours start from kept half-edges with the result on

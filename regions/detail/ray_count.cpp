@@ -209,7 +209,7 @@ bool count_in_row(BooleanEngine& e, const PolygonSet& set, const Vertex* skip) {
 void prepare_ray_rows(BooleanEngine& e, PolygonSet& set, std::int64_t rays) {
   set.rows.built = false;
   const std::int64_t n = set.lastBox - set.firstBox + 1;
-  if (rays * kRowsPerRayShare < n) return;
+  if (tl_rayRowsOff || rays * kRowsPerRayShare < n) return;
   set.rows.built = build_rows(e, set);
 }
 
