@@ -112,17 +112,21 @@ bool read_xyz(std::int32_t unit, float& x, float& y, float& z, Faulted faulted) 
   Unit& u = reader_unit(unit);
   std::uint8_t head[kPointXyzBytes];
   std::size_t length = 0;
-  switch (u.in.read(head, length)) {
-    case ReadStatus::kEnd: return false;
-    case ReadStatus::kFault: faulted(u.in.fault()); return false;
-    case ReadStatus::kRecord: break;
+  const std::uint8_t* data = u.in.read_in_place(length);
+  if (!data) {
+    switch (u.in.read(head, length)) {
+      case ReadStatus::kEnd: return false;
+      case ReadStatus::kFault: faulted(u.in.fault()); return false;
+      case ReadStatus::kRecord: break;
+    }
+    data = head;
   }
   const std::int64_t record = u.in.next_record() - 1;
   if (length < kPointXyzBytes) {
     faulted({RecordFault::kShortRecord, u.path, record, std::to_string(length) + " bytes"});
     return false;
   }
-  decode_xyz(head, x, y, z);
+  decode_xyz(data, x, y, z);
   if (!std::isfinite(x) || !std::isfinite(y) || !std::isfinite(z)) {
     faulted({RecordFault::kNonFinite, u.path, record, {}});
     return false;

@@ -1,6 +1,7 @@
 // Segmented record files: reading and writing the bytes of the layout.
 #include "driver/record_stream.hpp"
 
+#include <algorithm>
 #include <bit>
 #include <cassert>
 #include <cerrno>
@@ -16,6 +17,11 @@ void put_u32(std::uint8_t* p, std::uint32_t v) {
 }
 
 std::uint32_t get_u32(const std::uint8_t* p) {
+  if constexpr (std::endian::native == std::endian::little) {
+    std::uint32_t v;
+    std::memcpy(&v, p, sizeof v);
+    return v;
+  }
   std::uint32_t v = 0;
   for (int i = 0; i < 4; ++i) v |= static_cast<std::uint32_t>(p[i]) << (8 * i);
   return v;
@@ -102,6 +108,12 @@ ReadStatus RecordReader::read(std::span<std::uint8_t> head, std::size_t& length)
   length = 0;
   if (ended_) return ReadStatus::kEnd;
   const std::int64_t record = records_ + 1;
+  // Anything but the end marker, a long record, a record across the
+  // buffer's end or a fault is taken in place.
+  if (const std::uint8_t* p = read_in_place(length)) {
+    if (length > 0) std::memcpy(head.data(), p, std::min(length, head.size()));
+    return ReadStatus::kRecord;
+  }
   // Reads n bytes, keeping those that still fit in head.
   std::uint8_t scratch[kSegmentBytes];
   auto read_data = [&](std::size_t n) -> bool {

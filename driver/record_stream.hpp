@@ -63,6 +63,22 @@ class RecordReader {
   // Reads the next record: its first head.size() bytes (at most) go to head,
   // its full length to `length`; the rest of the record is skipped.
   ReadStatus read(std::span<std::uint8_t> head, std::size_t& length);
+  // The next record's data in place (valid until the next read) with its
+  // length, the record then read; null, nothing read, unless it is one
+  // segment lying whole in the buffer with agreeing lengths: read() then
+  // takes it (and reports the end of the file or a fault).
+  const std::uint8_t* read_in_place(std::size_t& length) {
+    if (ended_) return nullptr;
+    const std::uint8_t* lead = input_.peek(1);
+    if (!lead || *lead >= kSegmentContinued) return nullptr;
+    const std::size_t n = *lead;
+    const std::uint8_t* p = input_.peek(n + 2);
+    if (!p || p[n + 1] != p[0]) return nullptr;
+    input_.skip(n + 2);
+    ++records_;
+    length = n;
+    return p + 1;
+  }
 
   // Number of the next record to be read, from 1.
   std::int64_t next_record() const { return records_ + 1; }

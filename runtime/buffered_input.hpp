@@ -37,6 +37,15 @@ class BufferedInput {
   // Copies up to n bytes; fewer only at the end of the file or on an error
   // (failed() tells which). The position moves past what was copied.
   std::size_t read(void* destination, std::size_t n);
+  // The next n bytes where the buffer holds them already, else null (the
+  // caller then takes them with read()); the position stays until skip().
+  // The records are a few bytes each: handing them out in place saves the
+  // copies and the calls of read() on nearly every record.
+  const unsigned char* peek(std::size_t n) const {
+    return end_ - next_ >= n ? buffer_.get() + next_ : nullptr;
+  }
+  // Moves past n bytes that peek(n) granted.
+  void skip(std::size_t n) { next_ += n; }
   // The next byte, or -1 at the end of the file or on an error.
   int get() {
     if (next_ < end_) return buffer_[next_++];

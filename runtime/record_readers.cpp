@@ -86,6 +86,14 @@ int VCZi4UnformattedFileReader::readBytes(void* buffer, std::size_t n) {
   return state_->input.read(buffer, n) == n ? 0 : -1;
 }
 
+const unsigned char* VCZi4UnformattedFileReader::peekBytes(std::size_t n) const {
+  return state_->input.peek(n);
+}
+
+void VCZi4UnformattedFileReader::skipBytes(std::size_t n) { state_->input.skip(n); }
+
+void VCZi4UnformattedFileReader::countRecord() { ++state_->recordsRead; }
+
 std::int64_t VCZi4UnformattedFileReader::nextRecord(void* buffer, std::int64_t capacity) {
   const std::int64_t r = readNextRecord(buffer, capacity);
   if (r != 0 && r != -1) ++state_->recordsRead;
@@ -144,6 +152,19 @@ std::int64_t CZi4UnformattedSequentialFileReader::readNextRecord(void* buffer,
   if (pending_ > kContinuedSegment) return 0;
   auto* out = static_cast<unsigned char*>(buffer);
   std::int64_t remaining = buffer ? std::max<std::int64_t>(capacity, 0) : 0;
+  // A record of one segment whose bytes are buffered and whose lengths agree
+  // is taken in place; anything else goes the general way below.
+  if (pending_ < kContinuedSegment) {
+    const int n = pending_;
+    const unsigned char* segment = peekBytes(static_cast<std::size_t>(n) + 2);
+    if (segment && segment[n] == n) {
+      pending_ = segment[n + 1];
+      const std::int64_t copied = std::min<std::int64_t>(n, remaining);
+      if (copied > 0) std::memcpy(out, segment, static_cast<std::size_t>(copied));
+      skipBytes(static_cast<std::size_t>(n) + 2);
+      return n;
+    }
+  }
   std::int64_t total = 0;
   // Data, trailing length and the next segment's leading length in one read.
   unsigned char segment[kLastSegmentMax + 2];
@@ -171,6 +192,18 @@ std::int64_t CZi4UnformattedSequentialFileReader::readNextRecord(void* buffer,
     }
   } while (length >= kContinuedSegment);
   return total;
+}
+
+const unsigned char* CZi4UnformattedSequentialFileReader::takeRecordInPlace(int& length) {
+  if (pending_ >= kContinuedSegment) return nullptr;
+  const int n = pending_;
+  const unsigned char* segment = peekBytes(static_cast<std::size_t>(n) + 2);
+  if (!segment || segment[n] != n) return nullptr;
+  pending_ = segment[n + 1];
+  skipBytes(static_cast<std::size_t>(n) + 2);
+  if (n != 0) countRecord();  // as nextRecord counts
+  length = n;
+  return segment;
 }
 
 int CZi4UnformattedSequentialFileReader::seekRecord(std::int64_t offset, std::int64_t recordsRead) {
@@ -223,6 +256,16 @@ int CKvlBinaryResFileReader::seekToPoint(std::int64_t n) {
 std::int64_t CKvlBinaryResFileReader::readPoint(float& x, float& y, float& z, std::int32_t* code,
                                                 std::int16_t* flag) {
   const std::int64_t asked = flag ? kPointWithFlag : code ? kPointWithCode : kPointXyz;
+  int length = 0;
+  if (const unsigned char* in = takeRecordInPlace(length)) {
+    if (length < asked) return -1;
+    x = le_float(in);
+    y = le_float(in + 4);
+    z = le_float(in + 8);
+    if (code) *code = le_int32(in + 12);
+    if (flag) *flag = le_int16(in + 16);
+    return recordsRead() - (headerSize_ ? 1 : 0);
+  }
   unsigned char record[kPointWithFlag] = {};
   // Only the end marker ends the records: a damaged file or an empty record
   // in their midst is an error, never a quiet end of the file.

@@ -51,6 +51,12 @@ class VCZi4UnformattedFileReader {
   int close();
   // 0 when all n bytes were read, -2 with no open file, -1 when fewer came.
   int readBytes(void* buffer, std::size_t n);
+  // The next n bytes in place, or null when they are not buffered yet
+  // (BufferedInput::peek); skipBytes moves past bytes peekBytes granted.
+  const unsigned char* peekBytes(std::size_t n) const;
+  void skipBytes(std::size_t n);
+  // Counts a record delivered without nextRecord.
+  void countRecord();
   // readNextRecord, counting every record delivered (result neither 0 nor -1).
   std::int64_t nextRecord(void* buffer, std::int64_t capacity);
   // Positions at a byte offset from the start and, on success, sets the
@@ -81,6 +87,11 @@ class CZi4UnformattedSequentialFileReader : public VCZi4UnformattedFileReader {
   int openSequential(const char* path);
   std::int64_t readNextRecord(void* buffer, std::int64_t capacity) override;
   int pendingLength() const { return pending_; }
+  // The next record's data in place and its length, the record then read
+  // and counted as nextRecord counts it; null, nothing read, unless the
+  // record is one segment already buffered with agreeing lengths (the
+  // caller then reads it with nextRecord).
+  const unsigned char* takeRecordInPlace(int& length);
   // seek, then the length byte found at the offset becomes the pending one
   // (the end marker when there is none, so the next read ends the file).
   int seekRecord(std::int64_t offset, std::int64_t recordsRead);

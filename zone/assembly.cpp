@@ -51,6 +51,7 @@ std::int32_t record_level(ZoneBuilderState& state, ScratchFile& zones,
 
 // Closes both scratch files and stops the calling thread's engine.
 std::int32_t finish_assembly(ZoneBuilderState& state, ScratchFile& zones) {
+  state.grownLevels.clear();
   const bool closed = zones.close() == 0;
   if (state.levelFile.close() != 0 || !closed) return -1;
   offset_engine().terminate();
@@ -72,6 +73,7 @@ struct MergeJob {
   bool hasPoints = false;
   std::vector<Point2f> points;  // the level's zones from temp1
   TaggedPointList grown{0, kListGrowth};
+  std::unique_ptr<GrownLevel> pregrown;  // grown while the levels were computed
   std::int32_t grewStatus = -1;
   std::future<void> grew;
   TaggedPointList carried{0, kListGrowth};  // the union up to this level, shrunk in place
@@ -113,7 +115,14 @@ std::int32_t assemble_at_once(ZoneBuilderState& state, ScratchFile& zones, std::
     auto job = std::make_unique<MergeJob>();
     job->z = range.z;
     job->hasPoints = range.hasPoints();
-    if (job->hasPoints) {
+    std::unique_ptr<GrownLevel>* pregrown = static_cast<std::size_t>(L - j) < state.grownLevels.size()
+                                                ? &state.grownLevels[static_cast<std::size_t>(L - j)]
+                                                : nullptr;
+    if (job->hasPoints && pregrown && *pregrown && (*pregrown)->radius == mergeRadius) {
+      // Grown already, from the same zones and radius.
+      job->pregrown = std::move(*pregrown);
+      job->grewStatus = job->pregrown->status;
+    } else if (job->hasPoints) {
       const std::int32_t n = range.last - range.first + 1;
       job->points.resize(static_cast<std::size_t>(n > 0 ? n : 0));
       if (read_points(state.levelFile, job->points.data(), n, std::int64_t{range.first} - 1) != 0) return -1;
@@ -160,8 +169,10 @@ std::int32_t assemble_at_once(ZoneBuilderState& state, ScratchFile& zones, std::
     MergeJob& job = *jobs[static_cast<std::size_t>(j)];
     if (job.hasPoints) {
       if (job.grew.valid()) job.grew.wait();
-      if (job.grewStatus != 0 || unite_level_zones(A, job.grown) != 0) return -1;
+      TaggedPointList& grown = job.pregrown ? job.pregrown->points : job.grown;
+      if (job.grewStatus != 0 || unite_level_zones(A, grown) != 0) return -1;
       job.grown.Free();
+      job.pregrown.reset();
       append_all(A, job.carried);
       MergeJob* p = &job;
       if (pool.size() > 0) {

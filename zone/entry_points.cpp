@@ -53,9 +53,10 @@ ZoneContext* level_context(ZoneBuilderState& state) {
 }
 
 // Appends a level's zones to temp1 on the contour level of z (none stored
-// when the result is too small); -1 when z lies below every remaining
-// contour level or the write failed.
-std::int32_t store_level_zone(ZoneBuilderState& state, float z, const std::vector<Point2f>& result) {
+// when the result is too small), with their grown form when there is one;
+// -1 when z lies below every remaining contour level or the write failed.
+std::int32_t store_level_zone(ZoneBuilderState& state, float z, const std::vector<Point2f>& result,
+                              std::unique_ptr<GrownLevel> grown = nullptr) {
   const std::int32_t n = static_cast<std::int32_t>(result.size());
   if (n < kMinStoredPoints) return 0;
   const std::int32_t at =
@@ -64,6 +65,11 @@ std::int32_t store_level_zone(ZoneBuilderState& state, float z, const std::vecto
   const std::int32_t first = state.pointsWritten + 1;
   const std::int32_t wrote = write_points(state.levelFile, result.data(), n, state.pointsWritten);
   state.levelRanges[at] = {first, state.pointsWritten, z};
+  // A later level stored on the same entry replaces this one's zones, and
+  // so its grown zones too.
+  if (static_cast<std::size_t>(at) < state.grownLevels.size()) {
+    state.grownLevels[static_cast<std::size_t>(at)] = std::move(grown);
+  }
   return wrote == 0 ? 0 : -1;
 }
 
@@ -80,6 +86,8 @@ struct LevelJob {
   TaggedPointList contour{0, kContextListGrowth};
   std::vector<Point2f> result;
   std::int32_t status = -1;
+  float growRadius = -1.0f;  // at least 0: the zones are grown here too, by this
+  std::unique_ptr<GrownLevel> grown;
   std::future<void> done;
 };
 
@@ -93,6 +101,15 @@ void compute_job(LevelJob& job) {
                                   static_cast<std::int32_t>(job.points.size()), job.result);
   job.points = {};
   job.contour.Free();
+  const auto n = static_cast<std::int32_t>(job.result.size());
+  if (job.status == 0 && job.growRadius >= 0.0f && n >= kMinStoredPoints) {
+    // The assembly's grow of these zones, done now on this worker: in the
+    // assembly only the unions wait for the level below.
+    job.grown = std::make_unique<GrownLevel>();
+    job.grown->radius = job.growRadius;
+    TaggedPointList scratch(0, kContextListGrowth);
+    job.grown->status = grow_level_zones(job.result.data(), n, scratch, job.grown->points);
+  }
 }
 
 void add_levels_in_turn(LevelSource& source, std::int32_t& ierr) {
@@ -133,6 +150,7 @@ void wf_init_czone(const float* levels, const std::int32_t& count, std::int32_t&
   if (state.levelFile.create(name) != 0) return;
   state.levelCount = count;
   state.levelRanges.assign(static_cast<std::size_t>(count) + 2, LevelRange{});
+  state.grownLevels.clear();
   for (std::int32_t i = 0; i < count; ++i) state.levelRanges[i].z = levels[i];
   ierr = 0;
 }
@@ -155,6 +173,20 @@ void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
   if (pool.size() < 1) return add_levels_in_turn(source, ierr);
 
   ZoneBuilderState& state = zone_builder();
+  // The merge radius now, so that the workers grow each level's zones for the
+  // assembly as they go; without it the assembly grows them (and reports a
+  // missing or bad grid.tmp).
+  float growRadius = -1.0f;
+  state.grownLevels.clear();
+  {
+    char name[kNameCapacity];
+    float radius = 0.0f;
+    if (expand_name("$TMP/grid.tmp", name) && read_merge_radius(name, radius) == 0) {
+      mergeRadius = radius;
+      growRadius = radius;
+      state.grownLevels.resize(state.levelRanges.size());
+    }
+  }
   // Stores the oldest level and reports it done; false when it failed.
   auto finish_oldest = [&]() {
     LevelJob& job = *running.front();
@@ -164,7 +196,10 @@ void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
     }
     if (job.active) {
       if (job.done.valid()) job.done.wait();
-      if (job.failed || job.status != 0 || store_level_zone(state, job.z, job.result) != 0) return false;
+      if (job.failed || job.status != 0 ||
+          store_level_zone(state, job.z, job.result, std::move(job.grown)) != 0) {
+        return false;
+      }
     }
     source.done(job.index);
     running.pop_front();
@@ -193,6 +228,7 @@ void wf_add_levels(LevelSource& source, std::int32_t& ierr) {
         reading = false;  // the levels before it still end in order
       } else {
         job->offsetDistance = context->offsetDistance;
+        job->growRadius = growRadius;
         LevelJob* j = job.get();
         job->done = pool.run([j] { compute_job(*j); });
       }

@@ -41,6 +41,14 @@ struct ZoneContext {
   double offsetDistance = kMinOffsetDistance;
 };
 
+// A level's zones grown for the assembly while the levels were computed
+// at once (the grow needs only the level's own zones).
+struct GrownLevel {
+  float radius = 0.0f;  // the merge radius they were grown by
+  std::int32_t status = -1;
+  TaggedPointList points{0, kContextListGrowth};
+};
+
 struct ZoneBuilderState {
   std::unique_ptr<ZoneContext> context;  // created by the first wf_add_level
   ScratchFile levelFile;                 // "$TMP/temp1"
@@ -51,6 +59,9 @@ struct ZoneBuilderState {
   std::int32_t pointsWritten = 0;
   std::vector<LevelRange> resultRanges;
   std::int32_t resultCount = 0;
+  // By entry of levelRanges: the zones stored there, grown (null: grown in
+  // the assembly). Filled only when the levels are computed at once.
+  std::vector<std::unique_ptr<GrownLevel>> grownLevels;
 };
 
 ZoneBuilderState& zone_builder();
