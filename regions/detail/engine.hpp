@@ -129,6 +129,8 @@ struct RayRowEntry {
 };
 struct RayRows {
   bool built = false;
+  bool refused = false;  // not worth building, or no storage: the tree answers
+  std::int32_t treeRays = 0;  // rays answered by the tree so far
   std::int32_t rowCount = 0;
   double y0 = 0.0, rowsPerUnit = 0.0;
   std::int32_t* starts = nullptr;
@@ -296,12 +298,11 @@ int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t kee
 void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag,
                              bool resultOnLeft);
 // Crossings of the ray from (px, py) towards +x with the set's edges,
-// leaving out the edges that start, end or are split at `skip`.
+// leaving out the edges that start, end or are split at `skip`; by the
+// set's box tree, or by its rows once it has been asked many times (the
+// counts are the same either way).
 std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py,
                                  const Vertex* skip = nullptr);
-// Readies the set for about `rays` ray counts in this operation: rows when
-// they pay, else the tree answers (the counts are the same either way).
-void prepare_ray_rows(BooleanEngine& e, PolygonSet& set, std::int64_t rays);
 // Test hook: when set, the calling thread's operations count every ray by
 // the tree, so that a test can compare the results with and without rows.
 inline thread_local bool tl_rayRowsOff = false;

@@ -19,16 +19,19 @@
 
 namespace zt::detail {
 
-// Rows are built only for a set of at least this many boxes, and only when
-// the rays to be cast number at least its boxes over kRowsPerRayShare:
-// fewer rays are cheaper through the tree than the rows are to build.
+// Rows are built only for a set of at least this many boxes, and only once
+// the tree has answered its boxes over kTreeRaysBeforeRows rays into it in
+// one operation: the tree has then spent about what the rows cost to build,
+// so a set asked a few times never pays for rows and one asked many times
+// pays for the tree on a small share of its rays only.
 inline constexpr std::int32_t kRowsMinBoxes = 32;
-inline constexpr std::int32_t kRowsPerRayShare = 16;
+inline constexpr std::int32_t kTreeRaysBeforeRows = 32;
 // Rows per box at most, and the budget of row entries per box beyond one
 // each, which sets a floor on the row height where boxes are tall.
 inline constexpr double kRowsPerBox = 0.5;
 inline constexpr double kRowEntriesPerBox = 3.0;
-// A ray in a row of more boxes than this goes to the tree.
+// A ray in a row of more boxes than this goes to the tree; rows that hold
+// more than half of it on average are not built.
 inline constexpr std::int32_t kRowScanLimit = 64;
 // Rows sorted by insertion up to this length, by std::sort beyond.
 inline constexpr std::int32_t kRowInsertionSort = 16;
@@ -155,6 +158,7 @@ bool build_rows(BooleanEngine& e, PolygonSet& set) {
     total += r1 - r0 + 1;
   }
   if (total > static_cast<std::int64_t>(2 + kRowEntriesPerBox) * n + r.rowCount) return false;
+  if (2 * total > static_cast<std::int64_t>(kRowScanLimit) * r.rowCount) return false;
   if (!reserve(r.entries, r.entryCapacity, total)) return false;
   // Counts, then the first entry of each row, advanced while filling and
   // shifted back after.
@@ -206,13 +210,6 @@ bool count_in_row(BooleanEngine& e, const PolygonSet& set, const Vertex* skip) {
 
 }  // namespace
 
-void prepare_ray_rows(BooleanEngine& e, PolygonSet& set, std::int64_t rays) {
-  set.rows.built = false;
-  const std::int64_t n = set.lastBox - set.firstBox + 1;
-  if (tl_rayRowsOff || rays * kRowsPerRayShare < n) return;
-  set.rows.built = build_rows(e, set);
-}
-
 std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py, const Vertex* skip) {
   IntersectionProbe& pr = e.probe;
   pr.mode = 0;
@@ -225,7 +222,13 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
   q.xmin = px;
   q.xmax = std::numeric_limits<double>::max();
   q.ymin = q.ymax = py;
-  if (set.rows.built && count_in_row(e, set, skip)) {
+  RayRows& rows = set.rows;
+  if (!rows.built && !rows.refused && !tl_rayRowsOff &&
+      ++rows.treeRays * kTreeRaysBeforeRows >= set.lastBox - set.firstBox + 1) {
+    rows.built = build_rows(e, set);
+    rows.refused = !rows.built;
+  }
+  if (rows.built && count_in_row(e, set, skip)) {
 #ifndef NDEBUG
     const std::int32_t byRows = pr.crossingCount;
     pr.crossingCount = 0;

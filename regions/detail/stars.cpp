@@ -285,11 +285,6 @@ int sweep_vertex(BooleanEngine& e, Vertex* vertex, const StarRule& rule, std::in
 
 int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t keepBInsideA) {
   const StarRule rule{keepAInsideB, keepBInsideA};
-  // Each shared vertex may cast a ray into each set.
-  std::int64_t sharedCount = 0;
-  for (Vertex* v = e.grid.sharedHead; v; v = v->nextShared) ++sharedCount;
-  prepare_ray_rows(e, e.a, sharedCount);
-  prepare_ray_rows(e, e.b, sharedCount);
   // Vertices are swept in the order their chains reach them, so that most
   // take their anchor from a piece decided at its other end.
   for (Vertex* v = e.grid.sharedHead; v; v = v->nextShared) {
