@@ -188,6 +188,7 @@ int rg_boolean(const TaggedPointList& a, const TaggedPointList& b, const char* o
   TaggedPointList& out = aliased ? engine->output : *result;
   int rc = attempt(a, b, op, out, box, false);
   const bool touched = rc != -1;
+  if (rc == 0 && tl_firstAttemptInconsistent) rc = kInconsistent;
   if (rc == kInconsistent) rc = attempt(a, b, op, out, box, true);
   if (rc != 0) {
     // Never a partial result: once the result was cleared, a failure leaves

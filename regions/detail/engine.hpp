@@ -306,6 +306,10 @@ std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, d
 // Test hook: when set, the calling thread's operations count every ray by
 // the tree, so that a test can compare the results with and without rows.
 inline thread_local bool tl_rayRowsOff = false;
+// Test hook: when set, the calling thread's operations take their first
+// attempt for inconsistent, so that a test reaches the retry on coarser
+// coordinates, which consistent input never needs.
+inline thread_local bool tl_firstAttemptInconsistent = false;
 
 // ---- emission (emission.cpp)
 // resultOnLeft: contours start from kept half-edges with the result on
