@@ -24,38 +24,6 @@
 namespace zt::test {
 namespace {
 
-class SegmentDiagrams : public CaseRows {};
-
-TEST_P(SegmentDiagrams, AreSound) {
-  const Keys k(row().field(1));
-  Store(ParseSites(row().field(0)));
-  // The checker after every `every`-th insertion and in full, then the segment edges.
-  const std::string error = CheckedCompute(false, int(k.num("every", 1)), k.num("brute", 1) != 0);
-  EXPECT_EQ(error.empty() ? vd::CheckSegmentEdges() : error, "");
-  const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
-  EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? VD_GetRestartCount() > 0 : VD_GetRestartCount() == 0))
-      << VD_GetRestartCount();
-  EXPECT_FALSE(VD_InRecoveryMode());
-  EXPECT_TRUE(!k.has("segments") || vd::Vd().segments.count == k.num("segments")) << vd::Vd().segments.count;
-}
-
-INSTANTIATE_TEST_SUITE_P(Data, SegmentDiagrams, RowsOf("segment_diagrams.txt"), RowName);
-
-// The orientation memory of the point-segment-segment construction is reset
-// by every segment insertion: a memory left set by anything before gives
-// the same diagram.
-TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
-  const Sites input = ParseSites("star 60 3; rev circle 9 0.5 0.5 0.1");
-  Store(input);
-  ASSERT_TRUE(ComputeSegments());
-  const std::vector<double> first = Snapshot();
-  Store(input);
-  vd::Vd().pssOrientByKeptNode = true;
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
-  EXPECT_EQ(Snapshot(), first);
-}
-
 // Regular and uneven stars of 100 to 1,000 spikes (ParseSites bursts),
 // their contours given in either direction, from any start, points and
 // segments stored in shuffled orders, built in the point phase's fully
