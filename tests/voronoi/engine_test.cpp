@@ -1,6 +1,5 @@
-// The diagram and the engine around it: the rows of data/point_sets.txt and
-// data/segment_diagrams.txt (invariant checker after insertions and in full,
-// segment edges, reproducibility); the edge cases that need more than a row (restarts, corner
+// The diagram of points and the engine around it (its rows are run in
+// segment_diagram_test.cpp): the edge cases that need more than a row (restarts, corner
 // points); the facade's life cycle, indices and staleness (bad coordinates
 // are rows); edge splits and the degree-2 clean-up; record arrays through
 // growth; the allocation failure report.
@@ -9,68 +8,10 @@
 #include "vd_test_util.hpp"
 #include "voronoi/detail/diagram.hpp"
 #include "voronoi/detail/records.hpp"
-#include "voronoi/detail/segment_checks.hpp"
 #include "voronoi/detail/storage.hpp"
 
 namespace zt::test {
 namespace {
-
-// Rows of points (data/point_sets.txt) and of segments (data/segment_diagrams.txt).
-class Diagrams : public CaseRows {};
-
-TEST_P(Diagrams, KeepTheInvariantsAndTheExpectations) {
-  const Keys k(row().field(1));
-  const Sites s = ParseSites(row().field(0));
-  const auto compute = [&] { return s.segs.empty() ? ComputePoints() : ComputeSegments(); };
-  Store(s);
-  vd::Vd().presortPointOrder = k.num("random", 0) == 0;
-  std::string error = CheckedCompute(s.segs.empty(), int(k.num("every", 1)), k.num("brute", 1) != 0, int(k.num("allUpTo", 0)));
-  vd::Vd().presortPointOrder = true;
-  if (k.num("computed", 1) == 0) {
-    EXPECT_EQ(error, "not computed");
-    EXPECT_FALSE(VD_IsUpToDate());
-    EXPECT_EQ(VD_GetNodeCount(), 0);
-    return;
-  }
-  ASSERT_EQ(error.empty() && !s.segs.empty() ? vd::CheckSegmentEdges() : error, "");
-  EXPECT_FALSE(VD_InRecoveryMode());
-  const vd::Engine& g = vd::Vd();
-  const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
-  EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? g.restartCount > 0 : g.restartCount == Num(restarts))) << g.restartCount;
-  const std::pair<const char*, double> values[] = {
-      {"nodes", VD_GetNodeCount()}, {"edges", VD_GetEdgeCount()}, {"dups", VD_GetDuplicateCount()},
-      {"count", g.points.count},    {"quadtree", g.usedQuadtree}, {"scaled", g.scaled},
-      {"scale", g.scale},           {"shiftX", g.shiftX},         {"shiftY", g.shiftY},
-      {"segments", g.segments.count}};
-  for (const auto& [key, value] : values) {
-    if (k.has(key)) { EXPECT_EQ(value, k.num(key)) << key; }
-  }
-  if (k.has("deleted")) {
-    EXPECT_EQ(g.points[static_cast<int>(k.num("deleted"))].deleted, 1);
-  }
-  if (k.has("point")) {
-    const std::vector<double> xy = Nums(k.str("point"));
-    bool found = false;
-    for (std::int32_t i = 2; i < g.points.count - 2; ++i) found |= g.points[i].x == xy[0] && g.points[i].y == xy[1];
-    EXPECT_TRUE(found);
-  }
-  if (k.has("again")) {
-    // The same diagram again after a reset, with the orientation memory of
-    // the point-segment-segment construction left set (every segment
-    // insertion resets it), and once more without a reset.
-    const std::vector<double> first = Snapshot();
-    Store(s);
-    vd::Vd().pssOrientByKeptNode = !s.segs.empty();
-    ASSERT_TRUE(compute());
-    EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
-    EXPECT_EQ(Snapshot(), first);
-    ASSERT_TRUE(compute());
-    EXPECT_EQ(Snapshot(), first);
-  }
-}
-
-INSTANTIATE_TEST_SUITE_P(PointSets, Diagrams, RowsOf("point_sets.txt"), RowName);
-INSTANTIATE_TEST_SUITE_P(SegmentDiagrams, Diagrams, RowsOf("segment_diagrams.txt"), RowName);
 
 TEST(PointDiagram, SmallRandomSets) {
   for (int n = 1; n <= 40; ++n) {
