@@ -157,14 +157,6 @@ void ExpectOffsetsOf(const Sites& in, int side, double t, bool someCurve, const 
   ASSERT_TRUE(side == 3 || in.pts.size() != in.segs.size() || CheckSide(in.contours, curves, side == 1).empty()) << what;
 }
 
-// Random points at distances where the circles overlap: arcs at distance t
-// from their nearest point.
-TEST(TracedOffsets, RandomPointsAgainstBruteForce) {
-  for (std::uint32_t seed = 1; seed <= 12; ++seed)
-    for (const double t : {2.0, 5.0, 9.0, 20.0})
-      ExpectOffsetsOf(Sites{UniformPoints(60, seed, 100.0), {}, {}}, 3, t, true, "seed " + std::to_string(seed) + " t " + std::to_string(t));
-}
-
 // Necks at random places and depths, with distances below, near and above
 // half the neck's width.
 TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
