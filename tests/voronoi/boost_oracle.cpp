@@ -225,10 +225,13 @@ bool Simple(const std::vector<Polygon>& polys) {
   return true;
 }
 
-Polygon IntegerStar(int n, std::mt19937& rng, double cx, double cy, double rmin, double rmax, bool clockwise) {
+Polygon Rounded(const Contour& c) {
   Polygon p;
-  for (const Pt& q : Star(rng, cx, cy, rmin, rmax, n, clockwise)) p.emplace_back(std::llround(q.x), std::llround(q.y));
+  for (const Pt& q : c) p.emplace_back(std::llround(q.x), std::llround(q.y));
   return p;
+}
+Polygon IntegerStar(int n, std::mt19937& rng, double cx, double cy, double rmin, double rmax, bool clockwise) {
+  return Rounded(Star(rng, cx, cy, rmin, rmax, n, clockwise));
 }
 
 Match ComparePolygons(const std::vector<Polygon>& polys) {
@@ -308,13 +311,7 @@ TEST(BoostSegmentOracle, PocketWithIslands) {
 }
 
 TEST(BoostSegmentOracle, AxisAlignedStaircase) {
-  Polygon p{{0, 0}};
-  for (int i = 0; i < 30; ++i) {
-    p.emplace_back((i + 1) * 1000, i * 1000);
-    p.emplace_back((i + 1) * 1000, (i + 1) * 1000);
-  }
-  p.emplace_back(0, 30000);
-  const Match o = ComparePolygons({p});
+  const Match o = ComparePolygons({Rounded(ParseSites("staircase 30 30000").contours.at(0))});
   EXPECT_EQ(o.error, "");
   EXPECT_GT(o.theirsChecked, 100);
 }

@@ -2,8 +2,9 @@
 // same arc tolerance: random star-shaped pockets with star-shaped islands,
 // inside and outside; rest material with spikes, there-and-back contours,
 // and the ring sets of data/ring_sets.txt (squares touching by edges or
-// corners, triangles sharing a vertex), whose curves do not depend on the
-// order of the contours nor on their starts.
+// corners, triangles sharing a vertex, a spiked square, a there-and-back
+// contour), whose curves do not depend on the order of the contours nor on
+// their starts.
 // The number of curves agrees and every vertex of either result lies within
 // 0.01 of the other's boundary.
 #include <gtest/gtest.h>
@@ -97,7 +98,9 @@ double OneWay(const std::vector<Ring>& from, const std::vector<Ring>& to) {
 void ExpectLikeClipper(const std::vector<Ring>& rings, double t, std::int32_t side, const std::string& what) {
   SCOPED_TRACE(what);
   const auto ours = OursOffset(rings, t, side);
-  const auto theirs = ClipperOffsetOf(rings, side == kSideLeft ? -t : t);
+  // Strokes alone have no inside: either side is their round-ended stroke.
+  const bool strokes = std::all_of(rings.begin(), rings.end(), [](const Ring& r) { return r.size() == 2; });
+  const auto theirs = ClipperOffsetOf(rings, side == kSideLeft && !strokes ? -t : t);
   ASSERT_EQ(ours.size(), theirs.size());
   EXPECT_LE(OneWay(ours, theirs), kBoundaryTolerance);
   EXPECT_LE(OneWay(theirs, ours), kBoundaryTolerance);
@@ -112,24 +115,6 @@ TEST(ClipperOffsetOracle, PocketsWithIslandsInsideAndOutside) {
     // Counter-clockwise outer contour: its left is the inside.
     ExpectLikeClipper(rings, t, trial % 2 ? kSideLeft : kSideRight, "trial " + std::to_string(trial));
   }
-}
-
-// A two-point contour (A, B, A) leaves one segment with the same region on
-// both sides: either side, and either way round, gives its stroke.
-TEST(DegenerateRestMaterial, ThereAndBackContourGivesItsStrokeOnEitherSide) {
-  for (const Ring& r : {Ring{{3, 0}, {-1, 4}}, Ring{{-1, 4}, {3, 0}}})
-    for (const std::int32_t side : {kSideLeft, kSideRight}) {
-      const auto ours = OursOffset({r}, 2.0, side);
-      ASSERT_EQ(ours.size(), 1u) << "side " << side;
-      EXPECT_LE(OneWay(ours, ClipperOffsetOf({r}, 2.0)), kBoundaryTolerance);
-      EXPECT_LE(OneWay(ClipperOffsetOf({r}, 2.0), ours), kBoundaryTolerance);
-    }
-}
-
-TEST(DegenerateRestMaterial, SpikedSquareKeepsItsOutwardOffset) {
-  const Ring square{{0, 0}, {4, 0}, {2.0822978, -3.5103302}, {4, 0}, {8, 0}, {8, 8}, {0, 8}};
-  ExpectLikeClipper({square}, 2.4, kSideRight, "outward");
-  ExpectLikeClipper({square}, 2.4, kSideLeft, "inward");
 }
 
 // A spike at each corner and at two points of each edge of a unit square,

@@ -1,6 +1,5 @@
-// The diagram of points and the engine around it: the point-set rows of
-// data/point_sets.txt (invariant checker after insertions and in full); the
-// edge cases that need more than a row (reproducibility, restarts, corner
+// The diagram of points and the engine around it (its rows are run in
+// segment_diagram_test.cpp): the edge cases that need more than a row (restarts, corner
 // points); the facade's life cycle, indices and staleness (bad coordinates
 // are rows); edge splits and the degree-2 clean-up; record arrays through
 // growth; the allocation failure report.
@@ -14,61 +13,11 @@
 namespace zt::test {
 namespace {
 
-class PointSets : public CaseRows {};
-
-TEST_P(PointSets, KeepTheInvariantsAndTheExpectations) {
-  const Keys k(row().field(1));
-  Store(Generate(row().field(0)));
-  vd::Vd().presortPointOrder = k.num("random", 0) == 0;
-  const std::string error = CheckedCompute(true, int(k.num("every", 1)), k.num("brute", 1) != 0, int(k.num("allUpTo", 0)));
-  vd::Vd().presortPointOrder = true;
-  if (k.num("computed", 1) == 0) {
-    EXPECT_EQ(error, "not computed");
-    EXPECT_FALSE(VD_IsUpToDate());
-    EXPECT_EQ(VD_GetNodeCount(), 0);
-    return;
-  }
-  ASSERT_EQ(error, "");
-  const vd::Engine& g = vd::Vd();
-  const std::pair<const char*, double> values[] = {
-      {"nodes", VD_GetNodeCount()},    {"edges", VD_GetEdgeCount()},  {"dups", VD_GetDuplicateCount()},
-      {"restarts", g.restartCount},    {"count", g.points.count},     {"quadtree", g.usedQuadtree},
-      {"scaled", g.scaled},            {"scale", g.scale},            {"shiftX", g.shiftX},
-      {"shiftY", g.shiftY}};
-  for (const auto& [key, value] : values) {
-    if (k.has(key)) { EXPECT_EQ(value, k.num(key)) << key; }
-  }
-  if (k.has("deleted")) {
-    EXPECT_EQ(g.points[static_cast<int>(k.num("deleted"))].deleted, 1);
-  }
-  if (k.has("point")) {
-    const std::vector<double> xy = Nums(k.str("point"));
-    bool found = false;
-    for (std::int32_t i = 2; i < g.points.count - 2; ++i) found |= g.points[i].x == xy[0] && g.points[i].y == xy[1];
-    EXPECT_TRUE(found);
-  }
-}
-
-INSTANTIATE_TEST_SUITE_P(Data, PointSets, RowsOf("point_sets.txt"), RowName);
-
 TEST(PointDiagram, SmallRandomSets) {
   for (int n = 1; n <= 40; ++n) {
     Store(UniformPoints(n, 100 + n));
     EXPECT_EQ(CheckedCompute(), "") << n;
   }
-}
-
-TEST(PointDiagram, RepeatedComputationIsReproducible) {
-  const std::vector<Pt> pts = UniformPoints(500, 11, 10.0);
-  Store(pts);
-  ASSERT_TRUE(ComputePoints());
-  const auto first = Snapshot();
-  Store(pts);
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(Snapshot(), first);
-  // Computing again without a reset gives the same diagram too.
-  ASSERT_TRUE(ComputePoints());
-  EXPECT_EQ(Snapshot(), first);
 }
 
 TEST(PointDiagram, InsertionOrderDrawsLargePositionsDirectly) {

@@ -1,6 +1,7 @@
-// Diagrams of points and segments through the facade. The clean and the
-// repairable rows of data/segment_diagrams.txt are checked after every
-// insertion and in full. Dirty input (segments meeting at one point,
+// Diagrams of points and segments through the facade. The rows of
+// data/point_sets.txt and the clean and the repairable rows of
+// data/segment_diagrams.txt are checked after every insertion and in full
+// (segment edges too), with their expectations. Dirty input (segments meeting at one point,
 // near-duplicate points, crossing segments, crossings that leave tiny
 // segments, jittered integer grids) runs in a child process, so that a fatal
 // end of the engine (status 2) is counted as such; a computed diagram must
@@ -23,38 +24,6 @@
 
 namespace zt::test {
 namespace {
-
-class SegmentDiagrams : public CaseRows {};
-
-TEST_P(SegmentDiagrams, AreSound) {
-  const Keys k(row().field(1));
-  Store(ParseSites(row().field(0)));
-  // The checker after every `every`-th insertion and in full, then the segment edges.
-  const std::string error = CheckedCompute(false, int(k.num("every", 1)), k.num("brute", 1) != 0);
-  EXPECT_EQ(error.empty() ? vd::CheckSegmentEdges() : error, "");
-  const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
-  EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? VD_GetRestartCount() > 0 : VD_GetRestartCount() == 0))
-      << VD_GetRestartCount();
-  EXPECT_FALSE(VD_InRecoveryMode());
-  EXPECT_TRUE(!k.has("segments") || vd::Vd().segments.count == k.num("segments")) << vd::Vd().segments.count;
-}
-
-INSTANTIATE_TEST_SUITE_P(Data, SegmentDiagrams, RowsOf("segment_diagrams.txt"), RowName);
-
-// The orientation memory of the point-segment-segment construction is reset
-// by every segment insertion: a memory left set by anything before gives
-// the same diagram.
-TEST(SegmentDiagram, OrientationMemoryDoesNotLeakIntoInsertions) {
-  const Sites input = ParseSites("star 60 3; rev circle 9 0.5 0.5 0.1");
-  Store(input);
-  ASSERT_TRUE(ComputeSegments());
-  const std::vector<double> first = Snapshot();
-  Store(input);
-  vd::Vd().pssOrientByKeptNode = true;
-  ASSERT_TRUE(ComputeSegments());
-  EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
-  EXPECT_EQ(Snapshot(), first);
-}
 
 // Regular and uneven stars of 100 to 1,000 spikes (ParseSites bursts),
 // their contours given in either direction, from any start, points and
@@ -293,21 +262,73 @@ Outcome RunIsolated(const Sites& s, int maxRestarts, std::string* detail = nullp
   return code <= kCrash ? static_cast<Outcome>(code) : kCrash;
 }
 
-// Rows: sites in the language of ParseSites, or "family NAME seed" for one
-// input of a campaign family; restarts=N allows at most N (default 500).
-class DirtyInput : public CaseRows {};
+// Rows of points (data/point_sets.txt), of segments (data/segment_diagrams.txt)
+// and of dirty input (data/dirty_input.txt: isolated, with at most `restarts`).
+class Diagrams : public CaseRows {};
 
-TEST_P(DirtyInput, GivesAValidDiagram) {
+TEST_P(Diagrams, KeepTheInvariantsAndTheExpectations) {
+  const Keys k(row().field(1));
   const std::vector<std::string> w = Split(row().field(0));
-  Sites s = ParseSites(w.at(0) == "family" ? "" : row().field(0));
+  Sites s = ParseSites(!w.empty() && w[0] == "family" ? "" : row().field(0));
   for (const NamedFamily& f : kFamilies)
-    if (w[0] == "family" && w.at(1) == f.name) s = f.make(static_cast<std::uint32_t>(std::stoul(w.at(2))));
-  std::string detail;
-  const Outcome o = RunIsolated(s, static_cast<int>(Keys(row().field(1)).num("restarts", 500)), &detail);
-  EXPECT_EQ(o, kValid) << kOutcomeNames[o] << ": " << detail;
+    if (!w.empty() && w[0] == "family" && w.at(1) == f.name) s = f.make(static_cast<std::uint32_t>(std::stoul(w.at(2))));
+  if (k.has("isolated")) {
+    std::string detail;
+    const Outcome o = RunIsolated(s, static_cast<int>(k.num("restarts", 500)), &detail);
+    EXPECT_EQ(o, kValid) << kOutcomeNames[o] << ": " << detail;
+    return;
+  }
+  const auto compute = [&] { return s.segs.empty() ? ComputePoints() : ComputeSegments(); };
+  Store(s);
+  vd::Vd().presortPointOrder = k.num("random", 0) == 0;
+  std::string error = CheckedCompute(s.segs.empty(), int(k.num("every", 1)), k.num("brute", 1) != 0, int(k.num("allUpTo", 0)));
+  vd::Vd().presortPointOrder = true;
+  if (k.num("computed", 1) == 0) {
+    EXPECT_EQ(error, "not computed");
+    EXPECT_FALSE(VD_IsUpToDate());
+    EXPECT_EQ(VD_GetNodeCount(), 0);
+    return;
+  }
+  ASSERT_EQ(error.empty() && !s.segs.empty() ? vd::CheckSegmentEdges() : error, "");
+  EXPECT_FALSE(VD_InRecoveryMode());
+  const vd::Engine& g = vd::Vd();
+  const std::string restarts = k.has("restarts") ? k.str("restarts") : "0";
+  EXPECT_TRUE(restarts == "any" || (restarts == "1+" ? g.restartCount > 0 : g.restartCount == Num(restarts))) << g.restartCount;
+  const std::pair<const char*, double> values[] = {
+      {"nodes", VD_GetNodeCount()}, {"edges", VD_GetEdgeCount()}, {"dups", VD_GetDuplicateCount()},
+      {"count", g.points.count},    {"quadtree", g.usedQuadtree}, {"scaled", g.scaled},
+      {"scale", g.scale},           {"shiftX", g.shiftX},         {"shiftY", g.shiftY},
+      {"segments", g.segments.count}};
+  for (const auto& [key, value] : values) {
+    if (k.has(key)) { EXPECT_EQ(value, k.num(key)) << key; }
+  }
+  if (k.has("deleted")) {
+    EXPECT_EQ(g.points[static_cast<int>(k.num("deleted"))].deleted, 1);
+  }
+  if (k.has("point")) {
+    const std::vector<double> xy = Nums(k.str("point"));
+    bool found = false;
+    for (std::int32_t i = 2; i < g.points.count - 2; ++i) found |= g.points[i].x == xy[0] && g.points[i].y == xy[1];
+    EXPECT_TRUE(found);
+  }
+  if (k.has("again")) {
+    // The same diagram again after a reset, with the orientation memory of
+    // the point-segment-segment construction left set (every segment
+    // insertion resets it), and once more without a reset.
+    const std::vector<double> first = Snapshot();
+    Store(s);
+    vd::Vd().pssOrientByKeptNode = !s.segs.empty();
+    ASSERT_TRUE(compute());
+    EXPECT_FALSE(vd::Vd().pssOrientByKeptNode);
+    EXPECT_EQ(Snapshot(), first);
+    ASSERT_TRUE(compute());
+    EXPECT_EQ(Snapshot(), first);
+  }
 }
 
-INSTANTIATE_TEST_SUITE_P(Data, DirtyInput, RowsOf("dirty_input.txt"), RowName);
+INSTANTIATE_TEST_SUITE_P(PointSets, Diagrams, RowsOf("point_sets.txt"), RowName);
+INSTANTIATE_TEST_SUITE_P(SegmentDiagrams, Diagrams, RowsOf("segment_diagrams.txt"), RowName);
+INSTANTIATE_TEST_SUITE_P(DirtyInput, Diagrams, RowsOf("dirty_input.txt"), RowName);
 
 void PrintTo(const NamedFamily& f, std::ostream* os) { *os << f.name; }
 
