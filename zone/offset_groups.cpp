@@ -19,11 +19,17 @@
 // and whatever was remembered before: the files stay the same for every
 // thread count. The groups are remembered once for all threads (a level
 // four levels down may have been offset on another thread), behind a lock
-// taken only to look a group up and to add one.
+// taken only to look a group up and to add one. A group another thread is
+// offsetting at the time is waited for rather than offset twice: levels
+// computed at once share most of their groups with the level beside them,
+// which is not remembered yet. A thread waits only while it offsets
+// nothing, so no two threads ever wait for each other.
 #include <algorithm>
 #include <bit>
 #include <cmath>
+#include <condition_variable>
 #include <cstdint>
+#include <memory>
 #include <mutex>
 #include <numeric>
 #include <vector>
@@ -36,11 +42,13 @@ namespace zt {
 namespace {
 
 // Groups and points remembered; the least recently used group goes first.
-constexpr std::size_t kRememberedGroups = 64;
-constexpr std::size_t kRememberedGroupPoints = std::size_t{1} << 16;
+constexpr std::size_t kRememberedGroups = 256;
+constexpr std::size_t kRememberedGroupPoints = std::size_t{1} << 18;
 // More polylines than this are offset as one group (the grouping compares
 // boxes pairwise within a sweep).
 constexpr std::size_t kMaxGroupedPolylines = 4096;
+// Room the lists of a group's curves start with.
+constexpr std::int32_t kGroupListCapacity = 4096;
 
 struct FedRun {
   std::int32_t begin = 0;  // into the fed points
@@ -60,9 +68,20 @@ struct RememberedGroup {
   std::uint64_t used = 0;
 };
 
+// A group a thread is offsetting: its key (the thread's own, valid while
+// the group is pending) and, once done, its curves.
+struct PendingGroup {
+  const RememberedGroup* key = nullptr;
+  bool done = false;
+  bool failed = false;
+  std::vector<TaggedPoint> output;
+};
+
 struct GroupMemory {
   std::mutex mutex;
+  std::condition_variable settled;  // a pending group was done or given up
   std::vector<RememberedGroup> groups;
+  std::vector<std::shared_ptr<PendingGroup>> pending;
   std::uint64_t clock = 0;
 };
 
@@ -139,34 +158,83 @@ std::vector<std::int32_t> group_runs(const std::vector<FedRun>& runs, double gap
   return group;
 }
 
+bool same_group(const RememberedGroup& g, const RememberedGroup& key) {
+  return g.hash == key.hash && g.distanceBits == key.distanceBits && g.tBits == key.tBits &&
+         g.arcBits == key.arcBits && g.side == key.side && g.lengths == key.lengths &&
+         g.input.size() == key.input.size() &&
+         std::equal(g.input.begin(), g.input.end(), key.input.begin(), [](const Point2d& a, const Point2d& b) {
+           return std::bit_cast<std::uint64_t>(a.x) == std::bit_cast<std::uint64_t>(b.x) &&
+                  std::bit_cast<std::uint64_t>(a.y) == std::bit_cast<std::uint64_t>(b.y);
+         });
+}
+
 // The remembered group equal to `key`, or nullptr; the caller holds the lock.
 RememberedGroup* find_group(std::vector<RememberedGroup>& groups, const RememberedGroup& key) {
   for (RememberedGroup& g : groups) {
-    if (g.hash == key.hash && g.distanceBits == key.distanceBits && g.tBits == key.tBits &&
-        g.arcBits == key.arcBits && g.side == key.side && g.lengths == key.lengths &&
-        g.input.size() == key.input.size() &&
-        std::equal(g.input.begin(), g.input.end(), key.input.begin(), [](const Point2d& a, const Point2d& b) {
-          return std::bit_cast<std::uint64_t>(a.x) == std::bit_cast<std::uint64_t>(b.x) &&
-                 std::bit_cast<std::uint64_t>(a.y) == std::bit_cast<std::uint64_t>(b.y);
-        })) {
-      return &g;
-    }
+    if (same_group(g, key)) return &g;
   }
   return nullptr;
 }
 
-// Copies the curves of the remembered group equal to `key` into `curves`;
-// false when none is remembered.
-bool recall_group(const RememberedGroup& key, TaggedPointList& curves) {
-  GroupMemory& memory = group_memory();
-  std::lock_guard<std::mutex> lock(memory.mutex);
-  RememberedGroup* known = find_group(memory.groups, key);
-  if (!known) return false;
-  known->used = ++memory.clock;
-  make_room(curves, static_cast<std::int32_t>(known->output.size()));
-  for (const TaggedPoint& p : known->output) curves.Add(p);
-  return true;
+void copy_curves(const std::vector<TaggedPoint>& from, TaggedPointList& curves) {
+  make_room(curves, static_cast<std::int32_t>(from.size()));
+  for (const TaggedPoint& p : from) curves.Add(p);
 }
+
+// Copies the curves of the group equal to `key` into `curves`, remembered or
+// offset by another thread meanwhile (waited for); false when there are none,
+// `claim` then holding the group as pending on the calling thread until
+// settle_group.
+bool recall_group(const RememberedGroup& key, TaggedPointList& curves, std::shared_ptr<PendingGroup>& claim) {
+  GroupMemory& memory = group_memory();
+  std::unique_lock<std::mutex> lock(memory.mutex);
+  for (;;) {
+    if (RememberedGroup* known = find_group(memory.groups, key)) {
+      known->used = ++memory.clock;
+      copy_curves(known->output, curves);
+      return true;
+    }
+    auto it = std::find_if(memory.pending.begin(), memory.pending.end(),
+                           [&](const std::shared_ptr<PendingGroup>& p) { return same_group(*p->key, key); });
+    if (it == memory.pending.end()) break;
+    const std::shared_ptr<PendingGroup> other = *it;
+    memory.settled.wait(lock, [&] { return other->done || other->failed; });
+    if (other->done) {
+      copy_curves(other->output, curves);
+      return true;
+    }
+    // Given up there: look again, and offset it here if nobody else does.
+  }
+  claim = std::make_shared<PendingGroup>();
+  claim->key = &key;
+  memory.pending.push_back(claim);
+  return false;
+}
+
+// Ends the calling thread's pending group: done with `curves`, or given up
+// (curves null); the threads waiting for it go on.
+void settle_group(std::shared_ptr<PendingGroup>& claim, const TaggedPointList* curves) {
+  if (!claim) return;
+  GroupMemory& memory = group_memory();
+  {
+    std::lock_guard<std::mutex> lock(memory.mutex);
+    if (curves) {
+      claim->output.assign(curves->begin(), curves->end());
+      claim->done = true;
+    } else {
+      claim->failed = true;
+    }
+    memory.pending.erase(std::find(memory.pending.begin(), memory.pending.end(), claim));
+  }
+  memory.settled.notify_all();
+  claim.reset();
+}
+
+// Gives a pending group up when its offset ends early.
+struct PendingClaim {
+  std::shared_ptr<PendingGroup> group;
+  ~PendingClaim() { settle_group(group, nullptr); }
+};
 
 void remember_group(RememberedGroup&& group) {
   const std::size_t size = group.input.size() + group.output.size();
@@ -225,8 +293,8 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
   std::int32_t groups = 0;
   const std::vector<std::int32_t> group = group_runs(runs, 2.0 * request.t + kGroupGapMargin, groups);
 
-  TaggedPointList result(0, kRememberedGroupPoints / 16);
-  TaggedPointList curves(0, kRememberedGroupPoints / 16);
+  TaggedPointList result(0, kGroupListCapacity);
+  TaggedPointList curves(0, kGroupListCapacity);
   for (std::int32_t g = 0; g < groups; ++g) {
     RememberedGroup key;
     key.distanceBits = std::bit_cast<std::uint64_t>(offsetDistance);
@@ -249,7 +317,8 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
     }
     key.hash = hash;
     curves.Clear();
-    if (!recall_group(key, curves)) {
+    PendingClaim claim;
+    if (!recall_group(key, curves, claim.group)) {
       engine_.reset();
       std::int32_t tag = 0;  // the polyline's number within the group
       for (std::size_t r = 0; r < runs.size(); ++r) {
@@ -270,6 +339,7 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
       out_ = &curves;
       emit_offsets(engine_, *this);
       out_ = &list;
+      settle_group(claim.group, &curves);
       key.output.assign(curves.begin(), curves.end());
       remember_group(std::move(key));
     }
