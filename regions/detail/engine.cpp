@@ -35,6 +35,8 @@ void reset_set(BooleanEngine&, PolygonSet& set) {
   set.root = nullptr;
   set.firstBox = 0;
   set.lastBox = -1;
+  set.rows.built = set.rows.refused = false;
+  set.rows.treeRays = 0;
 }
 
 namespace {

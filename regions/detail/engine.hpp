@@ -120,6 +120,29 @@ struct EdgeOverlap {
   Edge* b = nullptr;
 };
 
+// A set's boxes by horizontal rows, for many rays in one operation
+// (ray_count.cpp): the boxes reaching into row k are entries
+// [starts[k], starts[k + 1]), by descending right end.
+struct RayRowEntry {
+  double xmax = 0.0;
+  const EdgeBox* box = nullptr;
+};
+struct RayRows {
+  bool built = false;
+  bool refused = false;  // not worth building, or no storage: the tree answers
+  std::int32_t treeRays = 0;  // rays answered by the tree so far
+  std::int32_t rowCount = 0;
+  double y0 = 0.0, rowsPerUnit = 0.0;
+  std::int32_t* starts = nullptr;
+  std::int32_t startCapacity = 0;
+  RayRowEntry* entries = nullptr;
+  std::int32_t entryCapacity = 0;
+  RayRows() = default;
+  RayRows(const RayRows&) = delete;
+  RayRows& operator=(const RayRows&) = delete;
+  ~RayRows();
+};
+
 struct PolygonSet {
   std::int32_t owner = 0;
   ContourPool contours;
@@ -127,6 +150,7 @@ struct PolygonSet {
   std::int32_t firstBox = 0;
   std::int32_t lastBox = -1;
   bool cancelled = false;  // some contour of it bounded nothing and was dropped
+  RayRows rows;
 };
 
 struct BooleanEngine {
@@ -261,7 +285,7 @@ int settle_splits(BooleanEngine& e, Edge& edge, double eps);
 int build_half_edges(BooleanEngine& e, PolygonSet& set);
 bool contour_has_splits(BooleanEngine& e, InputContour& c);
 
-// ---- classification (stars.cpp, whole_contours.cpp)
+// ---- classification (stars.cpp, whole_contours.cpp, ray_count.cpp)
 double pseudo_angle(double c, double s);
 struct StarRule {
   std::int32_t keepAInsideB;
@@ -274,9 +298,14 @@ int classify_stars(BooleanEngine& e, std::int32_t keepAInsideB, std::int32_t kee
 void classify_whole_contours(BooleanEngine& e, PolygonSet& x, PolygonSet& y, std::int32_t flag,
                              bool resultOnLeft);
 // Crossings of the ray from (px, py) towards +x with the set's edges,
-// leaving out the edges that start, end or are split at `skip`.
+// leaving out the edges that start, end or are split at `skip`; by the
+// set's box tree, or by its rows once it has been asked many times (the
+// counts are the same either way).
 std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py,
                                  const Vertex* skip = nullptr);
+// Test hook: when set, the calling thread's operations count every ray by
+// the tree, so that a test can compare the results with and without rows.
+inline thread_local bool tl_rayRowsOff = false;
 
 // ---- emission (emission.cpp)
 // resultOnLeft: contours start from kept half-edges with the result on

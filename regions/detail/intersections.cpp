@@ -174,9 +174,20 @@ int walk(BooleanEngine& e, const BoxTreeNode* a, const BoxTreeNode* b, std::int3
   if (a->low) return (walk(e, a->low, b, sameOwner) || walk(e, a->high, b, sameOwner)) ? -1 : 0;
   if (b->low) return (walk(e, a, b->low, sameOwner) || walk(e, a, b->high, sameOwner)) ? -1 : 0;
   e.leafPairTests += std::int64_t{a->last - a->first + 1} * (b->last - b->first + 1);
-  for (std::int32_t i = a->first; i <= a->last; ++i)
-    for (std::int32_t j = b->first; j <= b->last; ++j)
-      if (test_boxes(e, e.treeBoxes[i], e.treeBoxes[j], sameOwner) != 0) return -1;
+  // A box far from the other leaf's extent is near none of its boxes: each
+  // side is sifted against the other leaf once, and only the pairs left are
+  // tested, in the order the full double loop would take them.
+  std::int32_t bNearA[kLeafSpan + 1];
+  std::int32_t bNearCount = 0;
+  for (std::int32_t j = b->first; j <= b->last; ++j)
+    if (boxes_near(e.treeBoxes[j], *a)) bNearA[bNearCount++] = j;
+  if (bNearCount == 0) return 0;
+  for (std::int32_t i = a->first; i <= a->last; ++i) {
+    const EdgeBox& bi = e.treeBoxes[i];
+    if (!boxes_near(bi, *b)) continue;
+    for (std::int32_t k = 0; k < bNearCount; ++k)
+      if (test_boxes(e, bi, e.treeBoxes[bNearA[k]], sameOwner) != 0) return -1;
+  }
   return 0;
 }
 

@@ -4,87 +4,9 @@
 // contours, a kept contour is turned when its own operand's region lies on
 // its right: an outer boundary given clockwise, or a hole given
 // counter-clockwise.
-#include <algorithm>
-#include <cmath>
-#include <limits>
-#include <functional>
-
 #include "regions/detail/engine.hpp"
 
 namespace zt::detail {
-
-namespace {
-
-bool meets(const Edge& edge, const Vertex* v) {
-  if (edge.start == v || edge.end == v) return true;
-  for (const SplitPoint* sp = edge.splits; sp; sp = sp->next)
-    if (sp->vertex == v) return true;
-  return false;
-}
-
-// Whether edge is one of the pool's records [first, end): the records of one
-// chunk are contiguous, so each chunk the range spans is checked by address.
-bool edge_in_range(const EdgePool& pool, const Edge* edge, std::int32_t first, std::int32_t end) {
-  constexpr std::int32_t k = EdgePool::kChunkSize;
-  const std::less<const Edge*> below;
-  for (std::int32_t lo = first; lo < end;) {
-    const std::int32_t hi = std::min(end, (lo / k + 1) * k) - 1;
-    if (!below(edge, &pool[lo]) && !below(&pool[hi], edge)) return true;
-    lo = hi + 1;
-  }
-  return false;
-}
-
-void count_in_node(BooleanEngine& e, const BoxTreeNode* node, const Vertex* skip) {
-  const BoxTreeNode& q = e.queryBox;
-  if (!boxes_near(q, *node)) return;
-  if (node->low) {
-    count_in_node(e, node->low, skip);
-    count_in_node(e, node->high, skip);
-    return;
-  }
-  IntersectionProbe& pr = e.probe;
-  for (std::int32_t i = node->first; i <= node->last; ++i) {
-    const EdgeBox& b = e.treeBoxes[i];
-    if (!boxes_near(q, b)) continue;
-    const Edge& edge = *b.edge;
-    if (edge.open) continue;
-    if (skip && meets(edge, skip)) {
-      // The pieces of the edge that do not end at skip still count: a split
-      // vertex within the tolerance of the ray's line bends the edge there,
-      // and the piece beyond it may cross the ray.
-      const Vertex* from = edge.start;
-      for (const SplitPoint* sp = edge.splits;; sp = sp->next) {
-        const Vertex* to = sp ? sp->vertex : edge.end;
-        if (from != skip && to != skip)
-          pr.crossingCount += pr.cross(pr.qx, pr.qy, from->x, from->y, to->x, to->y, pr.eps);
-        from = to;
-        if (!sp) break;
-      }
-      continue;
-    }
-    if (pr.skipEnd > pr.skipFirst && edge_in_range(e.edges, &edge, pr.skipFirst, pr.skipEnd)) continue;
-    pr.crossingCount += pr.cross(pr.qx, pr.qy, edge.start->x, edge.start->y, edge.end->x, edge.end->y, pr.eps);
-  }
-}
-
-}  // namespace
-
-std::int32_t count_ray_crossings(BooleanEngine& e, PolygonSet& set, double px, double py, const Vertex* skip) {
-  IntersectionProbe& pr = e.probe;
-  pr.mode = 0;
-  pr.crossingCount = 0;
-  pr.qx = px;
-  pr.qy = py;
-  BoxTreeNode& q = e.queryBox;
-  // The ray itself: an edge it crosses reaches below and above py and to
-  // the right of px, so its box is near this one.
-  q.xmin = px;
-  q.xmax = std::numeric_limits<double>::max();
-  q.ymin = q.ymax = py;
-  if (set.root) count_in_node(e, set.root, skip);
-  return pr.crossingCount;
-}
 
 namespace {
 

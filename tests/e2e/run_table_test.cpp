@@ -7,6 +7,9 @@
 
 #include <sys/stat.h>
 
+#include <map>
+
+#include "driver/main_flow.hpp"
 #include "e2e/e2e_support.hpp"
 #include "support/case_rows.hpp"
 
@@ -59,9 +62,10 @@ Bytes recipe(const std::string& r, Bytes old) {
   return records(contours);
 }
 
-void set_up(ProgramRun& r, const std::string& setup) {
+// `tmpdir` is the $TMP of a "tmpdir:NAME" step, left empty without one.
+void set_up(ProgramRun& r, const std::string& setup, std::string& tmpdir) {
   for (const std::string& step : Parts(setup, ' ')) {
-    if (step.empty()) continue;
+    if (step.rfind("tmpdir:", 0) == 0) tmpdir = r.path(step.substr(7));
     if (step == "params" || step == "usual") r.parameters();
     if (step == "usual") {
       r.put("contour.bin", pocket({10, 5, 0}));
@@ -75,7 +79,7 @@ void set_up(ProgramRun& r, const std::string& setup) {
       std::filesystem::create_directory(r.path(file));
     } else if (what == "fifo") {
       std::filesystem::remove(r.path(file));
-      ASSERT_EQ(::mkfifo(r.path(file).c_str(), 0600), 0);
+      EXPECT_EQ(::mkfifo(r.path(file).c_str(), 0600), 0);
     } else if (what.rfind("link:", 0) == 0) {
       std::filesystem::remove(r.path(file));
       std::filesystem::create_symlink(what.substr(5), r.path(file));
@@ -111,17 +115,36 @@ void check(const ProgramRun& r, const std::vector<Contour>& zones, const std::st
   }
 }
 
+std::map<std::string, Bytes> files_in(const ProgramRun& r) {
+  std::map<std::string, Bytes> files;
+  for (const auto& e : std::filesystem::directory_iterator(r.tmp()))
+    files[e.path().filename().string()] = e.is_regular_file() ? r.bytes(e.path().filename().string()) : Bytes{};
+  return files;
+}
+
 // NAME | SETUP | END | CHECKS
 class RunTable : public test::CaseRows {};
 
 TEST_P(RunTable, EndsAsListed) {
   ProgramRun r;
-  set_up(r, row().field(0));
-  const int status = r.run();
+  std::string tmpdir;
+  set_up(r, row().field(0), tmpdir);
+  const std::map<std::string, Bytes> before = files_in(r);
+  const int status = r.run("", tmpdir.empty() ? "" : "env KVLTMPDIR='" + tmpdir + "'");
   ASSERT_NE(status, kTimedOut) << "hang";
   ASSERT_LT(status, 128) << "killed by signal " << status - 128;
   EXPECT_EQ(r.err.find("Sanitizer"), std::string::npos) << r.err;
   EXPECT_EQ(r.err.find("runtime error"), std::string::npos) << r.err;
+  const std::string end = row().field(1), how = end.substr(0, end.find(' ')), detail = end.substr(end.find(' ') + 1);
+  if (how == "nomarker") {  // one line on standard error, and nothing done
+    EXPECT_EQ(status, kNoMarkerExitStatus) << r.err;
+    EXPECT_EQ(r.out, "");
+    EXPECT_EQ(std::count(r.err.begin(), r.err.end(), '\n'), 1) << r.err;
+    for (const std::string& said : {std::string("status marker cannot be created in $TMP"), tmpdir, detail})
+      EXPECT_NE(r.err.find(said), std::string::npos) << r.err;
+    EXPECT_EQ(files_in(r), before);
+    return;
+  }
 
   const bool normal = !r.marker_left();
   std::vector<Contour> zones;
@@ -137,7 +160,6 @@ TEST_P(RunTable, EndsAsListed) {
     EXPECT_FALSE(r.has("stock2.bin"));
     EXPECT_TRUE(!r.messages().empty() || !r.err.empty()) << "stopped without a message";
   }
-  const std::string end = row().field(1), how = end.substr(0, end.find(' ')), detail = end.substr(end.find(' ') + 1);
   if (how == "fault") {
     EXPECT_EQ(status, std::stoi(detail)) << r.err;
     EXPECT_FALSE(normal);

@@ -3,7 +3,10 @@
 // generated part whose levels differ (levels without rest material, with too
 // few records, with zones that the finishing region cuts away) and on one
 // whose levels are all alike (each thread reuses the offsets it remembers
-// for other levels than the one-thread run does).
+// for other levels than the one-thread run does). The one-thread run is
+// made twice in the same directory (the second finds the first one's
+// scratch files and result) with the same result; zones come from the top
+// down.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -24,12 +27,17 @@ struct RunFiles {
   std::string console;
 };
 
-RunFiles run_with(int threads, const std::function<void(const ProgramRun&)>& fill) {
+RunFiles run_with(int threads, const std::function<void(const ProgramRun&)>& fill, int runs = 1) {
   ProgramRun r;
   fill(r);
-  const int status = r.run("export RESTZONES_THREADS=" + std::to_string(threads));
-  EXPECT_EQ(status, 0) << threads << " threads: " << r.err;
-  return {r.bytes("temp1"), r.bytes("temp2"), r.bytes("stock2.bin"), r.out};
+  RunFiles first;
+  for (int k = 0; k < runs; ++k) {
+    EXPECT_EQ(r.run("export RESTZONES_THREADS=" + std::to_string(threads)), 0) << threads << " threads: " << r.err;
+    EXPECT_FALSE(r.marker_left()) << r.out;
+    if (k == 0) first = {r.bytes("temp1"), r.bytes("temp2"), r.bytes("stock2.bin"), r.out};
+    EXPECT_EQ(r.bytes("stock2.bin"), first.result) << "run " << k + 1 << " in the same directory";
+  }
+  return first;
 }
 
 // A pocket with a wavy wall on every level; per level some of: a band along
@@ -71,12 +79,16 @@ void fill_part(const ProgramRun& r, bool alike) {
   r.parameters();
 }
 
-void expect_same_for_every_thread_count(const std::function<void(const ProgramRun&)>& fill, std::size_t minLevels) {
-  const RunFiles one = run_with(1, fill);
-  std::vector<Contour> zones;
+// The one-thread run's files and zones in `one` and `zones`.
+void expect_same_for_every_thread_count(const std::function<void(const ProgramRun&)>& fill, std::size_t minLevels,
+                                        RunFiles& one, std::vector<Contour>& zones) {
+  one = run_with(1, fill, 2);
   ASSERT_TRUE(read_result(one.result, zones));
   std::set<float> levels;
-  for (const Contour& c : zones) levels.insert(c.z);
+  for (const Contour& c : zones) {
+    EXPECT_TRUE(levels.empty() || c.z <= *levels.begin()) << "from the top down";
+    levels.insert(c.z);
+  }
   ASSERT_GE(levels.size(), minLevels);  // enough levels for the threads to share
   for (int threads : kThreadCounts) {
     const RunFiles other = run_with(threads, fill);
@@ -87,14 +99,24 @@ void expect_same_for_every_thread_count(const std::function<void(const ProgramRu
   }
 }
 
-TEST(ThreadCount, ExampleIsTheSameOnEveryThreadCount) { expect_same_for_every_thread_count(copy_example, 2); }
-
-TEST(ThreadCount, GeneratedPartIsTheSameOnEveryThreadCount) {
-  expect_same_for_every_thread_count([](const ProgramRun& r) { fill_part(r, false); }, kPartLevels - 1);
+TEST(ThreadCount, ExampleIsTheSameOnEveryThreadCount) {
+  RunFiles one;
+  std::vector<Contour> zones;
+  expect_same_for_every_thread_count(copy_example, 2, one, zones);
+  ASSERT_FALSE(zones.empty());
+  EXPECT_EQ(zones.front().z, -1.0f);
+  EXPECT_EQ(zones.back().z, -20.0f);
+  EXPECT_NE(one.console.find("Calcul des zones de reprise par niveau"), std::string::npos) << one.console;
 }
 
-TEST(ThreadCount, PartOfLevelsAlikeIsTheSameOnEveryThreadCount) {
-  expect_same_for_every_thread_count([](const ProgramRun& r) { fill_part(r, true); }, kPartLevels);
+TEST(ThreadCount, GeneratedPartsAreTheSameOnEveryThreadCount) {
+  for (const bool alike : {false, true}) {
+    SCOPED_TRACE(alike ? "levels alike" : "levels that differ");
+    RunFiles one;
+    std::vector<Contour> zones;
+    expect_same_for_every_thread_count([alike](const ProgramRun& r) { fill_part(r, alike); },
+                                       alike ? kPartLevels : kPartLevels - 1, one, zones);
+  }
 }
 
 }  // namespace

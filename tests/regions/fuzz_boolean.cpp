@@ -13,21 +13,7 @@
 #include <cstdlib>
 #include <cstring>
 
-#include "regions/boolean.hpp"
-
-namespace {
-
-bool same(const zt::TaggedPointList& a, const zt::TaggedPointList& b) {
-  if (a.count() != b.count()) return false;
-  for (int i = 0; i < a.count(); ++i) {
-    if (a[i].tag != b[i].tag || std::memcmp(&a[i].x, &b[i].x, sizeof(double)) != 0 ||
-        std::memcmp(&a[i].y, &b[i].y, sizeof(double)) != 0)
-      return false;
-  }
-  return true;
-}
-
-}  // namespace
+#include "region_test_support.hpp"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   if (size < 1) return 0;
@@ -57,6 +43,6 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   zt::TaggedPointList r1, r2;
   const int rc1 = zt::rg_boolean(lists[0], lists[1], op, &r1);
   const int rc2 = zt::rg_boolean(lists[0], lists[1], op, &r2);
-  if ((rc1 != 0 && rc1 != -1) || rc1 != rc2 || !same(r1, r2)) std::abort();
+  if ((rc1 != 0 && rc1 != -1) || rc1 != rc2 || !zt::test::same_list(r1, r2)) std::abort();
   return 0;
 }

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstring>
 #include <utility>
 #include <vector>
 
@@ -71,10 +72,13 @@ inline void fill_list(TaggedPointList& l, const std::vector<Contour>& cs) {
   for (const Contour& c : cs) add_contour(l, c);
 }
 
+// Bit for bit, so that NaN and the sign of zero count too.
 inline bool same_list(const TaggedPointList& a, const TaggedPointList& b) {
   if (a.count() != b.count()) return false;
   for (int i = 0; i < a.count(); ++i)
-    if (a[i].tag != b[i].tag || a[i].x != b[i].x || a[i].y != b[i].y) return false;
+    if (a[i].tag != b[i].tag || std::memcmp(&a[i].x, &b[i].x, sizeof(double)) != 0 ||
+        std::memcmp(&a[i].y, &b[i].y, sizeof(double)) != 0)
+      return false;
   return true;
 }
 

@@ -1,11 +1,10 @@
 // The configuration files beyond the cases of data/configuration.cases:
-// random files, and the diagnostics' routing.
+// random files.
 #include "runtime/environment.hpp"
 
 #include <random>
 #include <string>
 
-#include "runtime/diagnostics.hpp"
 #include "runtime/path_expansion.hpp"
 #include "runtime_fixture.hpp"
 
@@ -31,31 +30,6 @@ TEST_F(EnvironmentTest, RandomConfigurationFilesNeverCrash) {
     table.value("var", "Y");
   }
   SUCCEED();
-}
-
-TEST_F(EnvironmentTest, DefaultHandlersRouteByVerboseMode) {
-  set_warning_handler(nullptr);
-  set_trace_handler(nullptr);
-  ::testing::internal::CaptureStdout();
-  ::testing::internal::CaptureStderr();
-  diagnose_warning("w1");
-  diagnose_trace("t1");
-  set_env("KVL_KVLFILES_VERBOSE", "off");
-  diagnose_trace("t2");
-  set_diagnostics_quiet(true);
-  diagnose_warning("w2");
-  set_env("KVL_KVLFILES_VERBOSE", "on");
-  diagnose_warning("w3");
-  diagnose_trace("t3");
-  set_diagnostics_quiet(false);
-  unset_env("KVL_KVLFILES_VERBOSE");
-  set_diagnostics_to_stdout(true);
-  diagnose_warning("w4");
-  set_diagnostics_to_stdout(false);
-  const std::string err = ::testing::internal::GetCapturedStderr();
-  const std::string out = ::testing::internal::GetCapturedStdout();
-  EXPECT_EQ(err, "w1\n");
-  EXPECT_EQ(out, "w3\nt3\nw4\n");
 }
 
 }  // namespace

@@ -13,6 +13,7 @@
 #include <sstream>
 
 #include "runtime/detail/runtime_state.hpp"
+#include "runtime/diagnostics.hpp"
 #include "runtime/dynamic_storage.hpp"
 #include "runtime/environment.hpp"
 #include "runtime/error_report.hpp"
@@ -207,8 +208,17 @@ void RuntimeCases::run(const Words& raw) {
     EXPECT_EQ(call == "begin" ? report_begin(text) : call == "status" ? report_status(text, n)
               : call == "message" ? report_message(text, n) : call == "end" ? report_end() : report_mark_empty(),
               status(w.size() - 1));
-  } else if (op == "capture") ::testing::internal::CaptureStdout();
-  else if (op == "stdout") EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(1));
+  } else if (op == "progress-value") EXPECT_GT(progress_value(status(1), status(2)), -1);
+  else if (op == "progress-finish") EXPECT_EQ(progress_finish(), status(1));
+  else if (op == "capture") ::testing::internal::CaptureStdout(), ::testing::internal::CaptureStderr();
+  else if (op == "stdout") {  // TEXT [STDERR]
+    EXPECT_EQ(::testing::internal::GetCapturedStdout(), w.at(1));
+    const std::string err = ::testing::internal::GetCapturedStderr();
+    if (w.size() > 2) { EXPECT_EQ(err, w[2]); }
+  } else if (op == "default-handlers") set_warning_handler(nullptr), set_trace_handler(nullptr);
+  else if (op == "diagnose") (w.at(1) == "warning" ? diagnose_warning : diagnose_trace)(w.at(2));
+  else if (op == "quiet") set_diagnostics_quiet(w.at(1) == "on");
+  else if (op == "to-stdout") set_diagnostics_to_stdout(w.at(1) == "on");
   else if (op == "counters") counted_ = tracked_counters();
   else if (op == "counted") {  // BYTES PERMANENT SERIALS since "counters" ("*": not checked)
     const TrackedCounters now = tracked_counters();

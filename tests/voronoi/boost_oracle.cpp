@@ -153,16 +153,19 @@ Match ComparePoints(const std::vector<BPoint>& input) {
   return MatchBothWays(bd, clearance, nodes, 1e-9 * std::max(Extent(pts), 1.0));
 }
 
+Match CompareSites(const std::string& text) {
+  std::vector<BPoint> pts;
+  for (const Pt& p : Generate(text)) pts.emplace_back(int(p.x), int(p.y));
+  return ComparePoints(pts);
+}
+
+// Random integer points in small ranges (duplicates and cocircular points)
+// and large ones.
 TEST(BoostOracle, RandomIntegerPoints) {
-  std::mt19937 rng(42);
   int checked = 0, skipped = 0;
   for (int round = 0; round < 60; ++round) {
-    const int n = 3 + round * 25;
-    const int range = round % 3 == 0 ? 30 : 100000;  // small ranges: duplicates and cocircular points
-    std::uniform_int_distribution<int> u(-range, range);
-    std::vector<BPoint> pts;
-    for (int i = 0; i < n; ++i) pts.emplace_back(u(rng), u(rng));
-    const Match o = ComparePoints(pts);
+    const int range = round % 3 == 0 ? 60 : 200000;
+    const Match o = CompareSites("dice " + std::to_string(3 + round * 25) + " " + std::to_string(42 + round) + " " + std::to_string(range));
     ASSERT_EQ(o.error, "") << "round " << round;
     checked += o.theirsChecked;
     skipped += o.skipped;
@@ -172,42 +175,25 @@ TEST(BoostOracle, RandomIntegerPoints) {
   EXPECT_LT(skipped, checked / 100);
 }
 
-TEST(BoostOracle, IntegerLatticeIsCocircularEverywhere) {
-  std::vector<BPoint> pts;
-  for (int i = 0; i < 40; ++i)
-    for (int j = 0; j < 30; ++j) pts.emplace_back(7 * i, 7 * j);
-  const Match o = ComparePoints(pts);
+TEST(BoostOracle, IntegerLatticeIsCocircularEverywhereAndCollinearPoints) {
+  const Match o = CompareSites("lattice 35 7");
   EXPECT_EQ(o.error, "");
   EXPECT_GT(o.theirsChecked, 1000);
+  // One point off the line gives vertices between real points.
+  EXPECT_EQ(CompareSites("collinear 500 3; points 0 1").error, "");
 }
 
+// Nearest points by walks through the diagram (the partly sorted order), and
+// by the quadtree (a random order).
 TEST(BoostOracle, ClusteredIntegerPoints) {
-  std::mt19937 rng(5);
-  std::normal_distribution<double> spread(0.0, 40.0);
-  std::uniform_int_distribution<int> centre(-1000000, 1000000);
-  std::vector<BPoint> pts, centres;
-  for (int c = 0; c < 6; ++c) centres.emplace_back(centre(rng), centre(rng));
-  for (int i = 0; i < 9000; ++i) {
-    const BPoint& c = centres[i % 6];
-    pts.emplace_back(c.x() + int(std::lround(spread(rng))), c.y() + int(std::lround(spread(rng))));
-  }
-  // Nearest points by walks through the diagram (the partly sorted order),
-  // and by the quadtree (a random order).
   for (const bool presorted : {true, false}) {
     vd::Vd().presortPointOrder = presorted;
-    const Match o = ComparePoints(pts);
+    const Match o = CompareSites("blocks 9000 5 80");
     vd::Vd().presortPointOrder = true;
     EXPECT_EQ(o.error, "") << presorted;
     EXPECT_EQ(vd::Vd().usedQuadtree, !presorted);
     EXPECT_GT(o.oursChecked, 5000);
   }
-}
-
-TEST(BoostOracle, CollinearIntegerPoints) {
-  std::vector<BPoint> pts;
-  for (int i = 0; i < 500; ++i) pts.emplace_back(3 * ((i * 37) % 500), 5 * ((i * 37) % 500) - 11);
-  pts.emplace_back(0, 1);  // one point off the line gives vertices between real points
-  EXPECT_EQ(ComparePoints(pts).error, "");
 }
 
 double Orient(const LPoint& a, const LPoint& b, const LPoint& c) {
@@ -239,14 +225,9 @@ bool Simple(const std::vector<Polygon>& polys) {
   return true;
 }
 
-Polygon IntegerStar(int n, std::mt19937& rng, double cx, double cy, double rmin, double rmax, bool reverse) {
-  std::uniform_real_distribution<double> ua(0.0, 0.8), ur(rmin, rmax);
+Polygon IntegerStar(int n, std::mt19937& rng, double cx, double cy, double rmin, double rmax, bool clockwise) {
   Polygon p;
-  for (int i = 0; i < n; ++i) {
-    const double a = 2 * M_PI * (i + ua(rng)) / n, r = ur(rng);
-    p.emplace_back(std::llround(cx + r * std::cos(a)), std::llround(cy + r * std::sin(a)));
-  }
-  if (reverse) std::reverse(p.begin(), p.end());
+  for (const Pt& q : Star(rng, cx, cy, rmin, rmax, n, clockwise)) p.emplace_back(std::llround(q.x), std::llround(q.y));
   return p;
 }
 
@@ -262,7 +243,7 @@ Match ComparePolygons(const std::vector<Polygon>& polys) {
     }
     pts.insert(pts.end(), contours.back().begin(), contours.back().end());
   }
-  StoreContours(contours, 1);
+  StoreContours(contours);
   if (!ComputeSegments()) return {0, 0, 0, "not computed"};
   if (VD_GetRestartCount() != 0 || VD_InRecoveryMode()) return {0, 0, 0, "restart or recovery on clean input"};
   // Proper nodes of ours: degree 3 and no corner site around.

@@ -1,8 +1,9 @@
 // Offsets collected by SlopeDomain against Clipper's round offset at the
 // same arc tolerance: random star-shaped pockets with star-shaped islands,
 // inside and outside; rest material with spikes, there-and-back contours,
-// squares touching by edges or corners and triangles sharing a vertex, whose
-// curves do not depend on the order of the contours nor on their starts.
+// and the ring sets of data/ring_sets.txt (squares touching by edges or
+// corners, triangles sharing a vertex), whose curves do not depend on the
+// order of the contours nor on their starts.
 // The number of curves agrees and every vertex of either result lies within
 // 0.01 of the other's boundary.
 #include <gtest/gtest.h>
@@ -206,95 +207,40 @@ TEST(DegenerateRestMaterial, SameCurvesWhateverTheOrderOfTheContours) {
   }
 }
 
-// Squares that touch edge to edge, by a corner or along half an edge, as
-// the zone builder feeds rest material: each contour closed on a repeated
-// point. An edge two squares share is given once each way and kept once;
-// it bounds no area, so both sides of it lie inside. The curves on either
-// side are those of Clipper whatever the order of the squares and where
-// each starts.
-struct SquareLayout {
-  const char* name;
-  std::vector<Pt> corners;  // lower left corners of unit squares
-};
+// The ring sets of data/ring_sets.txt on both sides, in their variants.
+class RingSets : public test::CaseRows {};
 
-class TouchingSquares : public ::testing::TestWithParam<SquareLayout> {};
-
-TEST_P(TouchingSquares, OffsetLikeClipperWhateverTheOrder) {
-  constexpr int kOrders = 8;
-  std::vector<Ring> rings;
-  for (const Pt& c : GetParam().corners)
-    rings.push_back({{c.x, c.y}, {c.x + 1, c.y}, {c.x + 1, c.y + 1}, {c.x, c.y + 1}});
+TEST_P(RingSets, OffsetLikeClipperWhateverTheOrderAndStarts) {
+  const std::vector<Ring> rings = test::ParseSites(row().field(0)).contours;
+  const test::Keys k(row().field(1));
+  const std::size_t n = rings.size();
+  std::size_t all = n;
+  for (const Ring& r : rings) all *= r.size();
+  const std::size_t variants = k.str("variants") == "all" ? all : static_cast<std::size_t>(k.num("variants"));
   std::mt19937 rng(1414);
-  for (int order = 0; order < kOrders; ++order) {
-    if (order > 0) {
-      std::shuffle(rings.begin(), rings.end(), rng);
-      for (Ring& r : rings) std::rotate(r.begin(), r.begin() + rng() % r.size(), r.end());
+  std::vector<Ring> shuffled = rings;
+  for (std::size_t v = 0; v < variants; ++v) {
+    std::vector<Ring> cur = shuffled;
+    if (k.str("variants") == "all") {
+      // v: the cyclic shift of the order, then each ring's start.
+      std::size_t code = v / n;
+      for (std::size_t i = 0; i < n; ++i) {
+        cur[i] = rings[(i + v) % n];
+        std::rotate(cur[i].begin(), cur[i].begin() + code % cur[i].size(), cur[i].end());
+        code /= cur[i].size();
+      }
+    } else if (v > 0) {
+      std::shuffle(shuffled.begin(), shuffled.end(), rng);
+      for (Ring& r : shuffled) std::rotate(r.begin(), r.begin() + rng() % r.size(), r.end());
+      cur = shuffled;
     }
-    for (const double t : {0.1, 0.3})
+    for (const double t : test::Nums(k.str("t")))
       for (const std::int32_t side : {kSideLeft, kSideRight})
-        ExpectLikeClipper(rings, t, side,
-                          "order " + std::to_string(order) + " t " + std::to_string(t) + " side " + std::to_string(side));
+        ExpectLikeClipper(cur, t, side, "variant " + std::to_string(v) + " t " + std::to_string(t) + " side " + std::to_string(side));
   }
 }
 
-std::vector<Pt> Grid(int n) {
-  std::vector<Pt> c;
-  for (int i = 0; i < n; ++i)
-    for (int j = 0; j < n; ++j) c.push_back({1.0 * i, 1.0 * j});
-  return c;
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    DegenerateRestMaterial, TouchingSquares,
-    ::testing::Values(SquareLayout{"Grid2x2", Grid(2)}, SquareLayout{"Grid3x3", Grid(3)},
-                      SquareLayout{"Grid4x4", Grid(4)},
-                      SquareLayout{"CornersOnly", {{0, 0}, {1, 1}, {2, 0}, {0, 2}, {2, 2}}},
-                      SquareLayout{"HalfEdges", {{0, 0}, {1, 0}, {2, 0}, {0.5, 1}, {1.5, 1}, {3, 0.5}}},
-                      SquareLayout{"RingAroundAHole", {{0, 0}, {1, 0}, {2, 0}, {2, 1}, {2, 2}, {1, 2}, {0, 2}, {0, 1}}}),
-    [](const ::testing::TestParamInfo<SquareLayout>& info) { return std::string(info.param.name); });
-
-// Three counter-clockwise triangles sharing one vertex, in three wedges of
-// a shape: every start of each triangle's contour and every cyclic order of
-// the triangles (81 variants a shape), offset 0.2 on both sides.
-struct SharedVertexShape {
-  const char* name;
-  double firstAngle;                 // degrees, of the first wedge
-  double opening[3];                 // degrees, of each triangle at the shared vertex
-  double reach[3][2];                // distances of each triangle's two other corners
-};
-
-class TrianglesSharingAVertex : public ::testing::TestWithParam<SharedVertexShape> {};
-
-TEST_P(TrianglesSharingAVertex, OffsetLikeClipperWhateverTheStartsAndOrder) {
-  constexpr double kDistance = 0.2;
-  const SharedVertexShape& shape = GetParam();
-  const Pt v{0.3, -0.2};
-  std::vector<Ring> triangles;
-  for (int i = 0; i < 3; ++i) {
-    const double a = (shape.firstAngle + 120.0 * i) * std::numbers::pi / 180;
-    const double b = a + shape.opening[i] * std::numbers::pi / 180;
-    triangles.push_back({v,
-                         {v.x + shape.reach[i][0] * std::cos(a), v.y + shape.reach[i][0] * std::sin(a)},
-                         {v.x + shape.reach[i][1] * std::cos(b), v.y + shape.reach[i][1] * std::sin(b)}});
-  }
-  for (int variant = 0; variant < 81; ++variant) {
-    std::vector<Ring> rings;
-    for (int i = 0, code = variant; i < 3; ++i, code /= 3) {
-      Ring r = triangles[(i + variant / 27) % 3];
-      std::rotate(r.begin(), r.begin() + code % 3, r.end());
-      rings.push_back(r);
-    }
-    for (const std::int32_t side : {kSideLeft, kSideRight})
-      ExpectLikeClipper(rings, kDistance, side, "variant " + std::to_string(variant) + " side " + std::to_string(side));
-  }
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    DegenerateRestMaterial, TrianglesSharingAVertex,
-    ::testing::Values(SharedVertexShape{"Even", 10, {100, 100, 100}, {{1.4, 1.4}, {1.4, 1.4}, {1.4, 1.4}}},
-                      SharedVertexShape{"Uneven", 37, {70, 115, 95}, {{1.2, 1.8}, {1.5, 1.3}, {2.0, 1.4}}},
-                      SharedVertexShape{"NarrowGaps", -20, {117, 117, 117}, {{1.3, 1.6}, {1.6, 1.3}, {1.45, 1.45}}}),
-    [](const ::testing::TestParamInfo<SharedVertexShape>& info) { return std::string(info.param.name); });
+INSTANTIATE_TEST_SUITE_P(DegenerateRestMaterial, RingSets, test::RowsOf("ring_sets.txt"), test::RowName);
 
 }  // namespace
 }  // namespace zt

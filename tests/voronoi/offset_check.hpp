@@ -17,31 +17,10 @@
 
 namespace zt::test {
 
-struct Seg2 {
-  Pt a, b;
-};
-
-struct InputSites {
-  std::vector<Pt> points;
-  std::vector<Seg2> segments;
-  std::vector<Contour> contours;
-};
-
-inline InputSites SitesOf(const std::vector<Contour>& contours) {
-  InputSites in;
-  in.contours = contours;
-  for (const Contour& c : contours)
-    for (std::size_t i = 0; i < c.size(); ++i) {
-      in.points.push_back(c[i]);
-      in.segments.push_back({c[i], c[(i + 1) % c.size()]});
-    }
-  return in;
-}
-
-inline double Clearance(const InputSites& in, const Pt& p) {
+inline double Clearance(const Sites& in, const Pt& p) {
   double m = INFINITY;
-  for (const Pt& q : in.points) m = std::min(m, std::hypot(p.x - q.x, p.y - q.y));
-  for (const Seg2& s : in.segments) m = std::min(m, test::segment_distance(p, s.a, s.b));
+  for (const Pt& q : in.pts) m = std::min(m, std::hypot(p.x - q.x, p.y - q.y));
+  for (const auto& [a, b, tag] : in.segs) m = std::min(m, test::segment_distance(p, in.pts[a], in.pts[b]));
   return m;
 }
 
@@ -114,7 +93,7 @@ inline std::vector<Pt> Samples(const Curve& c, std::size_t k, int n = 16) {
 }
 
 // Empty when every sample of every curve lies at distance t within tol.
-inline std::string CheckAtDistance(const InputSites& in, const std::vector<Curve>& curves, double t, double tol) {
+inline std::string CheckAtDistance(const Sites& in, const std::vector<Curve>& curves, double t, double tol) {
   for (std::size_t ci = 0; ci < curves.size(); ++ci) {
     const Curve& c = curves[ci];
     if (c.elements.empty()) return "curve " + std::to_string(ci) + " is empty";
@@ -141,21 +120,6 @@ inline std::string CheckSide(const std::vector<Contour>& contours, const std::ve
       for (const Pt& p : Samples(curves[ci], k, 4))
         if (Inside(contours, p) != inside) return "curve " + std::to_string(ci) + " leaves its side";
   return {};
-}
-
-// A star-shaped polygon around (cx, cy) with n vertices, counter-clockwise
-// unless `clockwise`.
-template <class P = Pt>
-std::vector<P> Star(std::mt19937& rng, double cx, double cy, double rmin, double rmax, int n, bool clockwise) {
-  std::uniform_real_distribution<double> radius(rmin, rmax), jitter(-0.3, 0.3);
-  std::vector<P> c;
-  for (int i = 0; i < n; ++i) {
-    const double a = 2 * std::numbers::pi * (i + 0.5 + jitter(rng)) / n;
-    const double r = radius(rng);
-    c.push_back({cx + r * std::cos(a), cy + r * std::sin(a)});
-  }
-  if (clockwise) std::reverse(c.begin(), c.end());
-  return c;
 }
 
 // A star-shaped pocket of radius 70 to 100 about the origin with `vertices`

@@ -1,7 +1,7 @@
 // Offsets and the offset store: the request cases of data/offsets.txt;
-// refusals, isolated point circles, random points and polygons against
-// brute force; broken diagrams that must end the request instead of
-// looping; the store written to a file.
+// refusals; random points and polygons against brute force; broken
+// diagrams that must end the request instead of looping; the store written
+// to a file.
 #include <gtest/gtest.h>
 
 #include <cmath>
@@ -31,25 +31,11 @@ bool KindsFollow(const Curve& c, const std::string& pattern) {
 class OffsetCases : public CaseRows {};
 
 TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
-  const std::string sites = row().field(0);
   const std::vector<std::string> request = Split(row().field(1));
   const Keys want(row().field(2));
-  InputSites in;
-  if (sites.rfind("contour", 0) == 0) {
-    std::vector<Contour> cs;
-    for (const std::string& part : Parts(sites, ';')) {
-      const std::vector<double> v = Nums(Trim(part).substr(7));
-      cs.emplace_back();
-      for (std::size_t i = 0; i + 1 < v.size(); i += 2) cs.back().push_back({v[i], v[i + 1]});
-    }
-    StoreContours(cs);
-    in = SitesOf(cs);
-    ASSERT_TRUE(ComputeSegments());
-  } else {
-    in.points = Generate(sites);
-    Store(in.points);
-    ASSERT_TRUE(ComputePoints());
-  }
+  const Sites in = ParseSites(row().field(0));
+  Store(in);
+  ASSERT_TRUE(in.segs.empty() ? ComputePoints() : ComputeSegments());
   const int side = std::stoi(request.at(0));
   const double maxUser = vd::Vd().maxOffset / vd::Vd().scale, step = Num(request.at(2));
   const double t = Num(request.at(1)) * (request[1].ends_with("max") ? maxUser : 1.0);
@@ -63,7 +49,7 @@ TEST_P(OffsetCases, TraceAtTheirDistanceOnTheirSide) {
     const std::string n = want.str("curves");
     EXPECT_TRUE(n.ends_with("+") ? curves.size() >= Num(n) : curves.size() == Num(n)) << curves.size();
   }
-  const double tol = want.has("reltol") ? want.num("reltol") * Extent(in.points) : want.num("tol", kTol);
+  const double tol = want.has("reltol") ? want.num("reltol") * Extent(in.pts) : want.num("tol", kTol);
   for (const Curve& c : curves) {
     // A multiple of the step within 1e-9 of a step (and of 1e-9 for steps above 1).
     EXPECT_NEAR(step > 0 ? std::remainder(c.offset - t, step) : 0.0, 0.0, 1e-9 * std::min(step, 1.0)) << c.offset;
@@ -135,49 +121,6 @@ TEST(OffsetReadOut, IndicesOutsideTheStoreAreRefused) {
   EXPECT_FALSE(PointsCoincide({0, 0}, {1e-6, 1e-7}));
 }
 
-// A lone point has no extent: the frame around it, and with it the maximal
-// offset, is tiny in user units.
-TEST(IsolatedPoints, SinglePointGivesCirclesOfTwoHalves) {
-  Store({{3, 4}});
-  ASSERT_TRUE(ComputePoints());
-  const double t = vd::Vd().maxOffset / vd::Vd().scale / 4;
-  ASSERT_TRUE(VD_ComputeOffsets(3, t, 0.0));
-  const auto curves = ReadStore();
-  ASSERT_EQ(curves.size(), 1u);
-  const Curve& c = curves[0];
-  EXPECT_NEAR(c.offset, t, 1e-12 * t);
-  ASSERT_EQ(c.elements.size(), 2u);
-  for (const Element& e : c.elements) {
-    EXPECT_EQ(e.kind, 2);
-    EXPECT_EQ(e.site, 2);
-    EXPECT_EQ(VD_GetPointTag(e.site), 0);
-  }
-  EXPECT_NEAR(c.elements[0].start.x, 3 + c.offset, 1e-12);
-  EXPECT_NEAR(c.elements[1].start.x, 3 - c.offset, 1e-12);
-  EXPECT_NEAR(c.elements[0].start.y, 4, 1e-12);
-  // The tag read-out of the element is always -1.
-  std::int32_t kind, site, tag = 0;
-  double x, y;
-  GetOffsetElement(0, kind, site, x, y, tag);
-  EXPECT_EQ(tag, -1);
-}
-
-// Random points at distances where the circles overlap: the traced curves
-// are made of arcs at distance t from their nearest point.
-TEST(TracedOffsets, RandomPointsAgainstBruteForce) {
-  for (std::uint32_t seed = 1; seed <= 12; ++seed) {
-    const auto pts = UniformPoints(60, seed, 100.0);
-    for (const double t : {2.0, 5.0, 9.0, 20.0}) {
-      Store(pts);
-      ASSERT_TRUE(ComputePoints());
-      ASSERT_TRUE(VD_ComputeOffsets(3, t, 0.0)) << "seed " << seed << " t " << t;
-      const auto curves = ReadStore();
-      ASSERT_FALSE(curves.empty());
-      EXPECT_EQ(CheckAtDistance(InputSites{pts, {}, {}}, curves, t, kTol * 100.0), "") << "seed " << seed << " t " << t;
-    }
-  }
-}
-
 // The edges that a request at distance 1.5 crosses on a diagram of 40
 // random points, after one good request.
 std::vector<std::int32_t> CrossedEdgesOfAGoodRequest() {
@@ -223,21 +166,24 @@ TEST(TracedOffsets, WalkBackOntoACrossedEdgeEndsTheRequestWithFailure) {
   EXPECT_FALSE(GetOffsetElement(vd::Vd().offsetElements.count, kind, site, x, y, tag));
 }
 
-// Stores contours (and loose points tagged from 100), computes, requests
-// and checks the curves against brute force; inside and outside requests
-// of contours alone also keep their side.
-void ExpectOffsetsOf(const std::vector<Contour>& cs, const std::vector<Pt>& loose, int side, double t,
-                     bool someCurve, const std::string& what) {
-  StoreContours(cs);
-  InputSites in = SitesOf(cs);
-  for (std::size_t k = 0; k < loose.size(); ++k) API_AddPoint(loose[k].x, loose[k].y, 100 + static_cast<int>(k));
-  in.points.insert(in.points.end(), loose.begin(), loose.end());
-  ASSERT_TRUE(ComputeSegments()) << what;
+// Stores the sites, computes, requests and checks the curves against brute
+// force; inside and outside requests of contours alone also keep their side.
+void ExpectOffsetsOf(const Sites& in, int side, double t, bool someCurve, const std::string& what) {
+  Store(in);
+  ASSERT_TRUE(in.segs.empty() ? ComputePoints() : ComputeSegments()) << what;
   ASSERT_TRUE(VD_ComputeOffsets(side, t, 0.0)) << what;
   const auto curves = ReadStore();
   ASSERT_TRUE(!someCurve || !curves.empty()) << what;
-  ASSERT_EQ(CheckAtDistance(in, curves, t, 1e-9 * Extent(in.points)), "") << what;
-  ASSERT_TRUE(side == 3 || !loose.empty() || CheckSide(cs, curves, side == 1).empty()) << what;
+  ASSERT_EQ(CheckAtDistance(in, curves, t, 1e-9 * Extent(in.pts)), "") << what;
+  ASSERT_TRUE(side == 3 || in.pts.size() != in.segs.size() || CheckSide(in.contours, curves, side == 1).empty()) << what;
+}
+
+// Random points at distances where the circles overlap: arcs at distance t
+// from their nearest point.
+TEST(TracedOffsets, RandomPointsAgainstBruteForce) {
+  for (std::uint32_t seed = 1; seed <= 12; ++seed)
+    for (const double t : {2.0, 5.0, 9.0, 20.0})
+      ExpectOffsetsOf(Sites{UniformPoints(60, seed, 100.0), {}, {}}, 3, t, true, "seed " + std::to_string(seed) + " t " + std::to_string(t));
 }
 
 // Necks at random places and depths, with distances below, near and above
@@ -247,36 +193,30 @@ TEST(PolygonOffsets, RandomNecksAgainstBruteForce) {
   std::uniform_real_distribution<double> ux(-5, 10), uy(0.3, 3.6), ut(0.2, 2.2), uw(0.3, 3);
   for (int trial = 0; trial < 60; ++trial) {
     const double x = ux(rng), y = uy(rng), w = uw(rng), t = ut(rng);
-    ExpectOffsetsOf({{{-10, 0}, {14, 0}, {14, 4}, {x + w, 4}, {x, y}, {x - w, 4}, {-10, 4}}}, {}, 1, t, t < 2.0,
-                    "trial " + std::to_string(trial));
+    Sites in;
+    in.AddContour({{-10, 0}, {14, 0}, {14, 4}, {x + w, 4}, {x, y}, {x - w, 4}, {-10, 4}});
+    ExpectOffsetsOf(in, 1, t, t < 2.0, "trial " + std::to_string(trial));
   }
 }
 
-// Random outer contours with star-shaped holes; inside, outside and both.
-TEST(PolygonOffsets, RandomPolygonsWithHolesAgainstBruteForce) {
+// Random outer contours with star-shaped holes, inside, outside and both;
+// loose points inside a pocket: their circles (both sides) and the curves
+// where circles meet the walls' offsets.
+TEST(PolygonOffsets, RandomPocketsWithIslandsOrLoosePointsAgainstBruteForce) {
   std::mt19937 rng(11);
-  for (int trial = 0; trial < 200; ++trial) {
-    const std::vector<Contour> cs = PocketWithIslands(rng, 8 + trial % 40, trial % 4, 5 + trial % 9);
-    const int side = 1 + trial % 3;
-    std::uniform_real_distribution<double> td(0.5, 12.0);
-    const double t = td(rng);
-    ExpectOffsetsOf(cs, {}, side, t, side != 3, "trial " + std::to_string(trial) + " side " + std::to_string(side));
-  }
-}
-
-// Loose points inside a pocket: their circles (both sides) and the curves
-// where circles meet the walls' offsets, against brute force.
-TEST(PolygonOffsets, PocketWithLoosePointsAgainstBruteForce) {
-  std::mt19937 rng(5);
-  for (int trial = 0; trial < 30; ++trial) {
-    const std::vector<Contour> cs{Star(rng, 0, 0, 70, 100, 12 + trial, false)};
-    std::uniform_real_distribution<double> u(-40, 40);
-    std::vector<Pt> loose;
-    for (int k = 0; k < 1 + trial % 6; ++k) {
+  for (int trial = 0; trial < 230; ++trial) {
+    Sites in;
+    const bool loose = trial >= 200;
+    for (const Contour& c : PocketWithIslands(rng, loose ? 12 + trial % 30 : 8 + trial % 40, loose ? 0 : trial % 4, 5 + trial % 9))
+      in.AddContour(c);
+    std::uniform_real_distribution<double> td(0.5, 12.0), u(-40, 40);
+    for (int k = 0; loose && k < 1 + trial % 6; ++k) {
       const double x = u(rng);
-      loose.push_back({x, u(rng)});
+      in.Add(x, u(rng));
     }
-    ExpectOffsetsOf(cs, loose, 1 + trial % 3, 2.0 + trial % 7 * 1.5, false, "trial " + std::to_string(trial));
+    const int side = 1 + trial % 3;
+    ExpectOffsetsOf(in, side, loose ? 2.0 + trial % 7 * 1.5 : td(rng), !loose && side != 3,
+                    "trial " + std::to_string(trial) + " side " + std::to_string(side));
   }
 }
 

@@ -8,6 +8,7 @@
 #include <cmath>
 #include <random>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "support/case_rows.hpp"
@@ -19,14 +20,12 @@ namespace {
 // Slack for the triangle-inequality bound: sqrt and the projection round.
 constexpr double kBoundSlack = 1e-12;
 
-::testing::AssertionResult Same(const std::vector<Point2d>& got, const std::vector<Point2d>& want) {
-  bool same = got.size() == want.size();
-  for (size_t k = 0; same && k < got.size(); ++k) same = got[k].x == want[k].x && got[k].y == want[k].y;
-  if (same) return ::testing::AssertionSuccess();
-  ::testing::AssertionResult r = ::testing::AssertionFailure();
-  r << "got";
-  for (const Point2d& p : got) r << " (" << p.x << "," << p.y << ")";
-  return r;
+// Points as pairs, which gtest compares exactly and prints.
+template <class Points>
+std::vector<std::pair<double, double>> xy(const Points& points) {
+  std::vector<std::pair<double, double>> out;
+  for (const Point2d& p : points) out.emplace_back(p.x, p.y);
+  return out;
 }
 
 // Every dropped point lies within `bound` of the kept chain between the kept
@@ -143,7 +142,7 @@ TEST_P(SimplifyExact, KeepsTheListedPoints) {
   const std::vector<double> a = test::Nums(form.substr(form.find(' ')));
   const std::vector<Point2d> in = points(input);
   const bool vector = form.rfind("vector", 0) == 0;
-  EXPECT_TRUE(Same(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0)), points(kept)));
+  EXPECT_EQ(xy(vector ? run_vector(in, a.at(0), a.at(1)) : run_polyline(in, a.at(0))), xy(points(kept)));
 }
 
 INSTANTIATE_TEST_SUITE_P(Rows, SimplifyExact, test::RowsOf("simplify.txt"), test::RowName);
@@ -154,8 +153,7 @@ TEST(PolylineSimplifier, AppendsWithoutClear) {
   out.Add({-7, -7});
   const std::vector<Point2d> line{{0, 0}, {1, 0}, {2, 0}, {3, 0}};
   ps.simplify(line.data(), 4, 0.01, out, false);
-  EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()),
-                   std::vector<Point2d>{{-7, -7}, {0, 0}, {3, 0}}));
+  EXPECT_EQ(xy(out), xy(std::vector<Point2d>{{-7, -7}, {0, 0}, {3, 0}}));
   ps.simplify(line.data(), 0, 0.01, out, true);
   EXPECT_EQ(out.count(), 0);
   VectorSimplifier vs;
@@ -168,7 +166,7 @@ TEST(PolylineSimplifier, WithoutFlagsReturnsInputUnthinned) {
   std::vector<Point2d> line{{0, 0}, {0, 0}, {1, 0}, {2, 0}, {3, 0}};
   Array<Point2d> out;
   ps.simplify(line.data(), 5, 0.01, out, true);
-  EXPECT_TRUE(Same(std::vector<Point2d>(out.begin(), out.end()), line));
+  EXPECT_EQ(xy(out), xy(line));
 }
 
 }  // namespace

@@ -17,7 +17,7 @@ std::int32_t PopOrAppend(RecordArray<std::int32_t>& freeStack, std::int32_t& cou
   } else {
     index = count;
   }
-  if (index >= capacity) records.Reserve(std::int64_t{capacity} + growth);
+  if (index >= capacity) records.Reserve(records.GrownCapacity(growth));
   if (index >= count) count = index + 1;
   return index;
 }

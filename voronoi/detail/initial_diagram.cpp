@@ -17,8 +17,9 @@ void BuildInitialDiagram() {
   ++g.generation;
   g.upToDate = false;
   const std::int64_t m = std::max(g.points.count, g.segments.count);
-  g.nodes.Reserve(4 * m);
-  g.edges.Reserve(6 * m);
+  // Whatever the arrays held is dropped below: not copied when they grow.
+  g.nodes.ReserveEmpty(4 * m);
+  g.edges.ReserveEmpty(6 * m);
   g.freeNodes.Reserve(kFreeStackGrowth);
   g.freeEdges.Reserve(kFreeStackGrowth);
   g.nodes.count = g.edges.count = g.freeNodes.count = g.freeEdges.count = 0;

@@ -106,7 +106,7 @@ void BuildOrder(std::int32_t first, std::int32_t end) {
   Engine& g = Vd();
   g.orderPresorted = false;
   g.insertionOrder.count = 0;
-  g.insertionOrder.Reserve(std::max<std::int64_t>(end - first, 1));
+  g.insertionOrder.ReserveEmpty(std::max<std::int64_t>(end - first, 1));
   for (std::int32_t i = first; i < end; ++i) g.insertionOrder.data[g.insertionOrder.count++] = i;
   g.orderRemaining = g.insertionOrder.count;
 }

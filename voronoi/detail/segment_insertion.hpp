@@ -65,8 +65,9 @@ bool MakeTree(SegmentInsertion& si);
 bool RebuildRegion(SegmentInsertion& si);
 
 // Splits every edge between segment s and one of its end points that passes
-// through that point, with a permanent node of radius 0 on it.
-void SplitRegionAtEndPoints(std::int32_t s);
+// through that point, with a permanent node of radius 0 on it; returns how
+// many it split.
+std::int32_t SplitRegionAtEndPoints(std::int32_t s);
 
 // Statuses and marks of the stages back to their resting values.
 void ResetInsertionMarks();

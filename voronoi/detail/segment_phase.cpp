@@ -105,15 +105,17 @@ void InsertSegment(std::int32_t s) {
   }
 }
 
-void SplitAtSegmentEndPoints() {
+std::int32_t SplitAtSegmentEndPoints() {
   Engine& g = Vd();
+  std::int32_t splits = 0;
   // The regions lie scattered in memory: the walk of one region overlaps
   // with fetching where the next one starts.
   constexpr std::int32_t kAhead = 4;
   for (std::int32_t s = 0; s < g.segments.count; ++s) {
     if (s + kAhead < g.segments.count && g.segments[s + kAhead].vd >= 0) g.edges.Prefetch(g.segments[s + kAhead].vd);
-    SplitRegionAtEndPoints(s);
+    splits += SplitRegionAtEndPoints(s);
   }
+  return splits;
 }
 
 }  // namespace zt::vd

@@ -20,6 +20,11 @@ namespace zt::vd {
 // meets segments inserted near it in an earlier round.
 void BuildSegmentOrder();
 void InsertSegment(std::int32_t s);
-void SplitAtSegmentEndPoints();
+// Splits every edge between a segment and one of its end points that passes
+// through that point (see SplitRegionAtEndPoints); returns how many it split.
+// An insertion splits its own new edges so, and later insertions only cut
+// edges shorter, so after insertions that all built their regions this pass
+// finds nothing; only a fallback's region may need it.
+std::int32_t SplitAtSegmentEndPoints();
 
 }  // namespace zt::vd

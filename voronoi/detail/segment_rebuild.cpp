@@ -121,29 +121,31 @@ bool ComputeNewNodes(const SegmentInsertion& si) {
 }
 
 // Places a node of radius 0 on end point p of the segment, splitting edge e
-// (between the segment and p) there, when e passes through p.
-void SplitAtEndPoint(const geo::SegSite& line, std::int32_t e, std::int32_t p) {
+// (between the segment and p) there, when e passes through p; true when it
+// did.
+bool SplitAtEndPoint(const geo::SegSite& line, std::int32_t e, std::int32_t p) {
   Engine& g = Vd();
   const EdgeRecord& er = g.edges[e];
   const NodeRecord& a = g.nodes[er.n1];
   const NodeRecord& b = g.nodes[er.n2];
-  if (!(a.r > 0.0) || !(b.r > 0.0)) return;
+  if (!(a.r > 0.0) || !(b.r > 0.0)) return false;
   const double da = line.D({a.x, a.y}), db = line.D({b.x, b.y});
-  if (!((da > kSideBand && db < -kSideBand) || (da < -kSideBand && db > kSideBand))) return;
+  if (!((da > kSideBand && db < -kSideBand) || (da < -kSideBand && db > kSideBand))) return false;
   PointRecord& pr = g.points[p];
   const std::int32_t n = NewNode(pr.x, pr.y, 0.0);
   g.nodes[n].site = p;
   SplitEdge(e, n, false);
   pr.hasNode = 1;
   pr.node = n;
+  return true;
 }
 
 }  // namespace
 
-void SplitRegionAtEndPoints(std::int32_t s) {
+std::int32_t SplitRegionAtEndPoints(std::int32_t s) {
   Engine& g = Vd();
   const std::int32_t e0 = g.segments[s].vd;
-  if (e0 < 0) return;
+  if (e0 < 0) return 0;
   const geo::SegSite line = SiteFromRecords(s, SEG).seg;
   gNewEdges.count = 0;
   std::int32_t e = e0;
@@ -152,13 +154,15 @@ void SplitRegionAtEndPoints(std::int32_t s) {
     gNewEdges.Append(e, kScratchGrowth);
     e = NextRegionEdge(e, s, SEG);
   } while (e >= 0 && e != e0 && ++guard < g.edges.count + 4);
+  std::int32_t splits = 0;
   for (std::int32_t i = 0; i < gNewEdges.count; ++i) {
     const EdgeRecord& er = g.edges[gNewEdges[i]];
     const bool leftIsSeg = er.lft == s && er.ltype == SEG;
     const std::int32_t p = leftIsSeg ? er.rgt : er.lft;
     const std::int32_t kind = leftIsSeg ? er.rtype : er.ltype;
-    if (kind == PNT && (p == line.i1 || p == line.i2)) SplitAtEndPoint(line, gNewEdges[i], p);
+    if (kind == PNT && (p == line.i1 || p == line.i2) && SplitAtEndPoint(line, gNewEdges[i], p)) ++splits;
   }
+  return splits;
 }
 
 bool RebuildRegion(SegmentInsertion& si) {

@@ -71,6 +71,22 @@ void* ReallocateArray(void* ptr, std::int64_t count, std::int64_t size) {
   return block;
 }
 
+void* AllocateArrayUncleared(std::int64_t count, std::int64_t size) {
+  const std::int64_t bytes = count * size;
+  void* block = nullptr;
+  // Cleared memory costs a pass over the whole block when the allocator
+  // recycles it; a fresh array whose records are all written before they
+  // are read does not need it.
+  if (count >= 0 && size > 0 && count <= INT32_MAX && bytes > 0) block = std::malloc(static_cast<std::size_t>(bytes));
+  if (!block) {
+    std::fprintf(stderr, "AllocateArrayUncleared() - Cannot get %d elements of %d bytes...\n",
+                 static_cast<int>(count), static_cast<int>(size));
+    VdFatal("AllocateArrayUncleared() - memory allocation failed!\n");
+  }
+  AdviseHugePages(block, bytes);
+  return block;
+}
+
 void FreeArray(void*& ptr) {
   std::free(ptr);
   ptr = nullptr;

@@ -4,7 +4,10 @@
 // (see fatal.hpp). RecordArray<T> is an index-addressed array of plain
 // records with an explicit count, capacity and growth step; growing it may
 // move the records, so the engine keeps indices, never pointers, across any
-// operation that can append.
+// operation that can append. Growth by one record adds the step or half the
+// capacity, whichever is more: a fixed step would copy a large array once
+// per step (when the allocator cannot grow it in place), quadratic in its
+// size.
 #pragma once
 
 #include <cstddef>
@@ -16,6 +19,8 @@ namespace zt::vd {
 // ptr null: count*size zeroed bytes; else resized to count*size bytes (new
 // bytes not cleared). Sizes are computed in 64 bits.
 void* ReallocateArray(void* ptr, std::int64_t count, std::int64_t size);
+// count*size bytes, not cleared (as the bytes a growth adds).
+void* AllocateArrayUncleared(std::int64_t count, std::int64_t size);
 void FreeArray(void*& ptr);
 
 template <typename T>
@@ -38,9 +43,24 @@ struct RecordArray {
     data = static_cast<T*>(ReallocateArray(data, n, sizeof(T)));
     capacity = static_cast<std::int32_t>(n);
   }
-  // Makes room for one more record, growing by `step` records.
+  // Room for n records whose present contents are not wanted: an array
+  // too small is given up and taken afresh, not cleared, rather than grown,
+  // which would copy what was there (the records from count on are
+  // undefined, as after any growth).
+  void ReserveEmpty(std::int64_t n) {
+    if (n <= capacity) return;
+    Free();
+    if (n > INT32_MAX) n = INT32_MAX;  // AllocateArrayUncleared reports what cannot be had
+    data = static_cast<T*>(AllocateArrayUncleared(n, sizeof(T)));
+    capacity = static_cast<std::int32_t>(n);
+  }
+  // The capacity after growing from a full array by at least `step`.
+  std::int64_t GrownCapacity(std::int32_t step) const {
+    return std::int64_t{capacity} + (capacity / 2 > step ? capacity / 2 : step);
+  }
+  // Makes room for one more record (see GrownCapacity).
   void EnsureOneMore(std::int32_t step) {
-    if (count >= capacity) Reserve(std::int64_t{capacity} + step);
+    if (count >= capacity) Reserve(GrownCapacity(step));
   }
   // A hint that record i is wanted soon: a traversal of the diagram hops
   // between records far apart in memory, and starting the next loads while

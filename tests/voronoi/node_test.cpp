@@ -1,22 +1,103 @@
-// Node constructions against brute force: three sites tangent to a known
-// circle (points on it, segments touching it), an edge of two of them cut
-// around the circle's centre, and the third as the new site. The computed
-// node must be the centre, with the radius as clearance, by true distances.
-// The configurations are the rows of data/node_random.txt.
+// Node constructions and their quadratic solver. Worked examples and
+// degenerate inputs on hand-made edges (data/node_examples.txt), the root
+// forms of data/quadratic.txt and the normalisation by powers of 128. Against
+// brute force (data/node_random.txt): three sites tangent to a known circle
+// (points on it, segments touching it), an edge of two of them cut around
+// the circle's centre, and the third as the new site; the computed node must
+// be the centre, with the radius as clearance, by true distances.
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <map>
 #include <random>
 #include <sstream>
-#include <string>
 
 #include "support/case_rows.hpp"
 #include "support/segment_distance.hpp"
 #include "voronoi/detail/node_check.hpp"
 #include "voronoi/detail/node_constructions.hpp"
+#include "voronoi/detail/quadratic.hpp"
 
 namespace zt::vd::geo {
 namespace {
+
+using test::Keys;
+using test::Nums;
+
+// The sites of a row by name: "p2", "s0", "arc".
+std::map<std::string, SiteRef> ReadSites(const std::string& text) {
+  std::map<std::string, SiteRef> sites;
+  std::map<int, PointSite> points;
+  for (const std::string& part : test::Parts(text, ';')) {
+    const std::string name = test::Split(part).at(0);
+    const std::vector<double> v = Nums(test::Trim(part).substr(name.size()));
+    const std::int32_t index = std::stoi(name.substr(1));
+    if (name[0] == 'p') {
+      points[index] = {index, {v.at(0), v.at(1)}};
+      sites[name] = SiteRef::point(points[index]);
+    } else {
+      const PointSite a = points.at(int(v.at(0))), b = points.at(int(v.at(1)));
+      sites[name] = SiteRef::segment(SegSite::make(index, a.index, a.p, b.index, b.p));
+    }
+  }
+  sites["arc"].kind = kKindArc;
+  return sites;
+}
+
+EdgeEnd End(const std::string& text) {
+  const std::vector<double> v = Nums(text);
+  return {{v.at(0), v.at(1)}, v.at(2), v.at(3) != 0};
+}
+
+std::int32_t KindOf(const std::string& w) { return w == "pnt" ? kKindPnt : w == "seg" ? kKindSeg : -2; }
+
+class NodeExamples : public test::CaseRows {};
+
+TEST_P(NodeExamples, GiveTheirNodeOrNameTheirSuspects) {
+  auto sites = ReadSites(row().field(0));
+  const Keys edge(row().field(1)), want(row().field(2));
+  const EdgeFrame e{End(edge.str("n1")), End(edge.str("n2")), sites.at(edge.str("left")), sites.at(edge.str("right"))};
+  NodeMemory memory;
+  SuspectPair suspect;
+  NodeResult out;
+  out.copied = true;  // compute_node must clear it
+  out.on_point = 99;
+  const bool ok = compute_node(e, sites.at(edge.str("fresh")), memory, suspect, out);
+  ASSERT_EQ(ok, want.num("ok") != 0);
+  const double tol = want.num("tol", 0);
+  const std::pair<const char*, double> values[] = {
+      {"copied", out.copied}, {"on", out.on_point}, {"x", out.n.x}, {"y", out.n.y}, {"r", out.r}};
+  for (const auto& [key, value] : values) {
+    if (want.has(key)) { EXPECT_NEAR(value, want.num(key), tol) << key; }
+  }
+  if (want.has("suspect")) {
+    ASSERT_TRUE(suspect.set);
+    const std::vector<std::string> p = test::List(want.str("suspect"));
+    if (p.size() == 4) {
+      EXPECT_EQ(suspect.site1, std::stoi(p[0]));
+      EXPECT_EQ(suspect.kind1, KindOf(p[1]));
+      EXPECT_EQ(suspect.site2, std::stoi(p[2]));
+      EXPECT_EQ(suspect.kind2, KindOf(p[3]));
+    }
+  }
+  if (want.has("memory")) {
+    EXPECT_TRUE(memory.orient_by_kept);
+    memory.reset();
+    EXPECT_FALSE(memory.orient_by_kept);
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, NodeExamples, test::RowsOf("node_examples.txt"), test::RowName);
+
+TEST(NodeExamples, TheSamePointTwiceIsNoConstruction) {
+  const PointSite p{6, {0.5, 0.5}};
+  const SegSite s = SegSite::make(1, 4, {0, 0}, 5, {1, 0});
+  const EdgeFrame same{{{0, 1}, 1, false}, {{1, 0.5}, 1, true}, SiteRef::point(p), SiteRef::segment(s)};
+  SuspectPair sp;
+  NodeResult out;
+  EXPECT_FALSE(node_pps(same, SiteRef::point(p), p, p, s, sp, out));
+  EXPECT_FALSE(sp.set);
+}
 
 double site_dist(const SiteRef& s, Point2d q) {
   return s.kind == kKindPnt ? std::hypot(q.x - s.pnt.p.x, q.y - s.pnt.p.y) : test::segment_distance(q, s.seg.p1, s.seg.p2);
@@ -188,6 +269,40 @@ TEST_P(NodeRandom, FindsTheCentreOfTheTangentCircle) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Configurations, NodeRandom, test::RowsOf("node_random.txt"), test::RowName);
+
+class Quadratic : public test::CaseRows {};
+
+TEST_P(Quadratic, FindsItsRoots) {
+  const std::vector<double> c = test::Nums(row().field(0));
+  const std::vector<std::string> want = test::Split(row().field(1));
+  const double tol = test::Num(row().field(2));
+  const QuadRoots r = solve_quadratic({c.at(0), c.at(1), c.at(2)});
+  ASSERT_EQ(r.count, std::stoi(want.at(0)));
+  const double roots[] = {std::min(r.t1, r.t2), std::max(r.t1, r.t2)};
+  for (std::size_t i = 1; i < want.size(); ++i) {
+    const double root = r.count == 1 ? r.t1 : roots[i - 1];
+    EXPECT_TRUE(want[i] == "*" || std::fabs(root - test::Num(want[i])) <= tol) << i << ": " << root;
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Data, Quadratic, test::RowsOf("quadratic.txt"), test::RowName);
+
+TEST(QuadraticNormalisation, StopsAndCounts) {
+  QuadCoefs q{1.0 / (128.0 * 128.0 * 128.0), 0.0, 0.0};
+  EXPECT_EQ(normalize_quadratic(q), 3);
+  EXPECT_EQ(q.a, 1.0);
+  QuadCoefs zero{0.0, 0.0, 0.0};
+  EXPECT_EQ(normalize_quadratic(zero), 0);
+  QuadCoefs nan{std::nan(""), 0.0, 0.0};
+  EXPECT_EQ(normalize_quadratic(nan), 0);
+  // The smallest subnormal reaches the threshold in finitely many steps.
+  QuadCoefs tiny{0.0, 4.9406564584124654e-324, 0.0};
+  EXPECT_GT(normalize_quadratic(tiny), 100);
+  EXPECT_GT(std::fabs(tiny.b), kQuadSmall);
+  // A large A stops the scaling even when B and C are tiny.
+  QuadCoefs big{1.0, 1e-30, 1e-30};
+  EXPECT_EQ(normalize_quadratic(big), 0);
+}
 
 }  // namespace
 }  // namespace zt::vd::geo

@@ -1,11 +1,19 @@
-// Contour store: the level rules of the scan, the z lookup's cursor, the
-// level read with its tags, and the refusals (full table, unreadable level).
-#include "zone/contour_store.hpp"
-
+// The files of the zone builder: the contour store (the level rules of the
+// scan, the z lookup's cursor, the level read with its tags, the refusals of
+// a full table and an unreadable level); the scratch files (byte layout,
+// round trips, positions past 4 GB, every failure reported: reads past the
+// end, a full disk, a failed close); the offset distance of zstock.ok and
+// the merge radius of grid.tmp (the rows of data/parameter_files.txt).
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <cmath>
+#include <filesystem>
 
+#include "support/case_rows.hpp"
+#include "zone/contour_store.hpp"
+#include "zone/parameter_files.hpp"
+#include "zone/scratch_file.hpp"
 #include "zone_test_support.hpp"
 
 namespace zt::testing {
@@ -132,6 +140,94 @@ TEST_F(ContourStoreTest, RefusesATooLongFileAndAnUnreadableLevel) {
   ContourStore none;
   EXPECT_EQ(load_contours(none, read_contour_record), -1);
 }
+
+class ScratchFiles : public ZoneTmpTest {};
+
+TEST_F(ScratchFiles, LayoutRoundTripAndReopenKeepsTheContents) {
+  ScratchFile f;
+  ASSERT_EQ(f.create(path("t").c_str()), 0);
+  const Point2f pts[2] = {{1.0f, -2.0f}, {99999.0f, 99999.0f}};
+  std::int32_t written = 0;
+  ASSERT_EQ(write_points(f, pts, 2, written), 0);
+  EXPECT_EQ(written, 2);
+  ASSERT_EQ(f.close(), 0);
+  const std::string bytes = read_file("t");
+  ASSERT_EQ(bytes.size(), 16u);
+  EXPECT_EQ(bytes.substr(0, 8), std::string("\x00\x00\x80\x3f\x00\x00\x00\xc0", 8));
+  ASSERT_EQ(f.reopen(path("t").c_str()), 0);
+  Point2f back[2];
+  ASSERT_EQ(read_points(f, back, 1, 1), 0);
+  EXPECT_EQ(back[0].x, 99999.0f);
+  // Appends go after point `written`, wherever reads left the position.
+  ASSERT_EQ(read_points(f, back, 1, 0), 0);
+  ASSERT_EQ(write_points(f, pts, 1, written), 0);
+  ASSERT_EQ(f.close(), 0);
+  EXPECT_EQ(read_file("t").size(), 24u);
+  EXPECT_EQ(f.reopen(path("absent").c_str()), -1);
+}
+
+TEST_F(ScratchFiles, ReadsPastTheEndAndBadCallsFail) {
+  ScratchFile f;
+  Point2f p[4];
+  EXPECT_EQ(read_points(f, p, 1, 0), -1);  // not open
+  EXPECT_EQ(read_points(f, p, 0, 0), 0);   // nothing asked
+  ASSERT_EQ(f.create(path("t").c_str()), 0);
+  std::int32_t written = 0;
+  ASSERT_EQ(write_points(f, p, 3, written), 0);
+  EXPECT_EQ(read_points(f, p, 4, 0), -1);
+  EXPECT_EQ(read_points(f, p, 1, 3), -1);
+  EXPECT_EQ(read_points(f, p, 1, -1), -1);
+}
+
+// Regression: positions were formed in 32 bits, so a point beyond 4 GB was
+// read from the wrong place.
+TEST_F(ScratchFiles, PositionsBeyondFourGigabytes) {
+  ScratchFile f;
+  ASSERT_EQ(f.create(path("big").c_str()), 0);
+  const std::int64_t start = (std::int64_t{1} << 32) / kScratchPointBytes + 3;
+  ASSERT_EQ(::ftruncate(::fileno(f.stream()), start * kScratchPointBytes), 0);
+  std::int32_t written = static_cast<std::int32_t>(start);
+  const Point2f p{7.0f, 8.0f};
+  ASSERT_EQ(write_points(f, &p, 1, written), 0);
+  Point2f back{};
+  ASSERT_EQ(read_points(f, &back, 1, start), 0);
+  EXPECT_EQ(back.y, 8.0f);
+  EXPECT_EQ(std::filesystem::file_size(path("big")), static_cast<std::uintmax_t>(start + 1) * 8);
+}
+
+// Regression: a write the disk refused went unnoticed.
+TEST_F(ScratchFiles, AFullDiskIsAFailure) {
+  if (!std::filesystem::exists("/dev/full")) GTEST_SKIP() << "no /dev/full";
+  ScratchFile f;
+  ASSERT_EQ(f.create("/dev/full"), 0);
+  const Point2f p[3] = {};
+  std::int32_t written = 0;
+  EXPECT_EQ(write_points(f, p, 3, written), -1);
+  ASSERT_EQ(f.create("/dev/full"), 0);
+  std::fwrite("x", 1, 1, f.stream());
+  EXPECT_EQ(f.close(), -1);
+  EXPECT_FALSE(f.isOpen());
+}
+
+class ParameterFiles : public ZoneTmpTest, public ::testing::WithParamInterface<test::Row> {};
+
+// CONTENT <none>: no such file, which changes nothing.
+TEST_P(ParameterFiles, ValueAsListed) {
+  ASSERT_EQ(GetParam().error, "");
+  const std::string file = GetParam().field(0), content = GetParam().field(1), value = GetParam().field(2);
+  if (content != "<none>") write_file(file, test::Unescape(content));
+  if (file == "zstock.ok") {
+    double d = 1.0;
+    read_offset_distance(path(file).c_str(), d);
+    EXPECT_EQ(d, std::strtod(value.c_str(), nullptr));
+  } else {
+    float r = 10.0f;
+    EXPECT_EQ(read_merge_radius(path(file).c_str(), r), content == "<none>" ? -1 : 0);
+    EXPECT_EQ(r, std::strtof(value.c_str(), nullptr));
+  }
+}
+
+INSTANTIATE_TEST_SUITE_P(Rows, ParameterFiles, test::RowsOf("parameter_files.txt"), test::RowName);
 
 }  // namespace
 }  // namespace zt::testing

@@ -1,12 +1,18 @@
-// Faults in a run on several threads end it as a one-thread run ends: two
-// threads reporting fatal errors at once give one report and its status; a
-// level whose reading faults, read ahead while earlier levels are computed,
-// ends the run only once those levels are done, and not at all when one of
-// them fails first. Each on 1, 2 and 8 threads.
+// The worker threads: how many a run takes (RESTZONES_THREADS caps the
+// hardware threads, a value that is not a whole number from 1 on leaves no
+// cap, the work and a stand-in engine bound it), the pool running every job
+// once. Faults in a run on several threads end it as a one-thread run ends:
+// two threads reporting fatal errors at once give one report and its status;
+// a level whose reading faults, read ahead while earlier levels are
+// computed, ends the run only once those levels are done, and not at all
+// when one of them fails first. Each on 1, 2 and 8 threads.
+#include "zone/worker_pool.hpp"
+
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cstdlib>
 #include <latch>
 #include <string>
@@ -14,13 +20,54 @@
 #include <vector>
 
 #include "voronoi/detail/fatal.hpp"
-#include "zone/worker_pool.hpp"
 #include "zone_test_support.hpp"
 
 namespace zt::testing {
 namespace {
 
 constexpr int kThreadCounts[] = {1, 2, 8};
+
+struct ThreadsRow {
+  const char* value;  // nullptr: unset
+  std::int32_t items;
+  std::int32_t cap;   // the expected count is min(cap, hardware threads, items); 0: no cap
+};
+
+constexpr ThreadsRow kThreadsRows[] = {
+    {nullptr, 100, 0}, {"1", 100, 1}, {"2", 100, 2}, {"8", 100, 8},  {"3", 2, 3},
+    {"0", 100, 0},     {"-2", 100, 0}, {"x", 100, 0}, {"2x", 100, 0}, {"", 100, 0},
+    {"99999999999999999999", 100, 0}, {nullptr, 1, 0}, {"4", 0, 4},
+};
+
+TEST(ZoneThreadCount, EnvironmentCapsTheHardwareThreadsAndTheWork) {
+  const std::int32_t hardware = std::max(1u, std::thread::hardware_concurrency());
+  for (const ThreadsRow& row : kThreadsRows) {
+    row.value ? setenv(kThreadsVariable, row.value, 1) : unsetenv(kThreadsVariable);
+    std::int32_t expected = row.cap > 0 ? std::min(row.cap, hardware) : hardware;
+    expected = std::max(1, std::min(expected, row.items));
+    EXPECT_EQ(zone_thread_count(row.items), expected) << (row.value ? row.value : "(unset)") << " items " << row.items;
+  }
+  // A stand-in engine runs on one thread.
+  BoxOffsetEngine engine;
+  set_offset_engine(&engine);
+  setenv(kThreadsVariable, "8", 1);
+  EXPECT_EQ(zone_thread_count(100), 1);
+  set_offset_engine(nullptr);
+  unsetenv(kThreadsVariable);
+}
+
+TEST(WorkerPool, RunsEveryJobOnceOnItsWorkers) {
+  constexpr int kJobs = 200;
+  std::atomic<int> runs[kJobs] = {};
+  std::vector<std::future<void>> done;
+  {
+    WorkerPool pool(3);
+    ASSERT_EQ(pool.size(), 3);
+    for (int i = 0; i < kJobs; ++i) done.push_back(pool.run([&runs, i] { runs[i].fetch_add(1); }));
+    for (auto& f : done) f.wait();
+  }
+  for (int i = 0; i < kJobs; ++i) EXPECT_EQ(runs[i].load(), 1) << i;
+}
 
 int occurrences(const std::string& text, const std::string& what) {
   int n = 0;
@@ -31,13 +78,11 @@ int occurrences(const std::string& text, const std::string& what) {
 // `threads` threads report fatal errors at once, the array's and the
 // Voronoi engine's in turn, in a child process: its output and status.
 std::pair<std::string, int> race_fatal_reports(int threads) {
-  int pipe_fds[2];
-  if (::pipe(pipe_fds) != 0) return {"", -1};
+  int fds[2];
+  if (::pipe(fds) != 0) return {"", -1};
   const pid_t pid = ::fork();
   if (pid == 0) {
-    ::dup2(pipe_fds[1], 1);
-    ::dup2(pipe_fds[1], 2);
-    ::close(pipe_fds[0]);
+    ::dup2(fds[1], 1), ::dup2(fds[1], 2), ::close(fds[0]);
     std::latch start(threads);
     std::vector<std::thread> racers;
     for (int i = 0; i < threads; ++i) {
@@ -50,11 +95,11 @@ std::pair<std::string, int> race_fatal_reports(int threads) {
     for (std::thread& t : racers) t.join();
     std::_Exit(99);  // never reached: a report ends the process
   }
-  ::close(pipe_fds[1]);
+  ::close(fds[1]);
   std::string out;
   char buf[4096];
-  for (ssize_t n; (n = ::read(pipe_fds[0], buf, sizeof buf)) > 0;) out.append(buf, static_cast<std::size_t>(n));
-  ::close(pipe_fds[0]);
+  for (ssize_t n; (n = ::read(fds[0], buf, sizeof buf)) > 0;) out.append(buf, static_cast<std::size_t>(n));
+  ::close(fds[0]);
   int status = 0;
   ::waitpid(pid, &status, 0);
   return {out, WIFEXITED(status) ? WEXITSTATUS(status) : -1};
