@@ -19,17 +19,11 @@
 // and whatever was remembered before: the files stay the same for every
 // thread count. The groups are remembered once for all threads (a level
 // four levels down may have been offset on another thread), behind a lock
-// taken only to look a group up and to add one. A group another thread is
-// offsetting at the time is waited for rather than offset twice: levels
-// computed at once share most of their groups with the level beside them,
-// which is not remembered yet. A thread waits only while it offsets
-// nothing, so no two threads ever wait for each other.
+// taken only to look a group up and to add one.
 #include <algorithm>
 #include <bit>
 #include <cmath>
-#include <condition_variable>
 #include <cstdint>
-#include <memory>
 #include <mutex>
 #include <numeric>
 #include <vector>
@@ -68,20 +62,9 @@ struct RememberedGroup {
   std::uint64_t used = 0;
 };
 
-// A group a thread is offsetting: its key (the thread's own, valid while
-// the group is pending) and, once done, its curves.
-struct PendingGroup {
-  const RememberedGroup* key = nullptr;
-  bool done = false;
-  bool failed = false;
-  std::vector<TaggedPoint> output;
-};
-
 struct GroupMemory {
   std::mutex mutex;
-  std::condition_variable settled;  // a pending group was done or given up
   std::vector<RememberedGroup> groups;
-  std::vector<std::shared_ptr<PendingGroup>> pending;
   std::uint64_t clock = 0;
 };
 
@@ -158,83 +141,34 @@ std::vector<std::int32_t> group_runs(const std::vector<FedRun>& runs, double gap
   return group;
 }
 
-bool same_group(const RememberedGroup& g, const RememberedGroup& key) {
-  return g.hash == key.hash && g.distanceBits == key.distanceBits && g.tBits == key.tBits &&
-         g.arcBits == key.arcBits && g.side == key.side && g.lengths == key.lengths &&
-         g.input.size() == key.input.size() &&
-         std::equal(g.input.begin(), g.input.end(), key.input.begin(), [](const Point2d& a, const Point2d& b) {
-           return std::bit_cast<std::uint64_t>(a.x) == std::bit_cast<std::uint64_t>(b.x) &&
-                  std::bit_cast<std::uint64_t>(a.y) == std::bit_cast<std::uint64_t>(b.y);
-         });
-}
-
 // The remembered group equal to `key`, or nullptr; the caller holds the lock.
 RememberedGroup* find_group(std::vector<RememberedGroup>& groups, const RememberedGroup& key) {
   for (RememberedGroup& g : groups) {
-    if (same_group(g, key)) return &g;
+    if (g.hash == key.hash && g.distanceBits == key.distanceBits && g.tBits == key.tBits &&
+        g.arcBits == key.arcBits && g.side == key.side && g.lengths == key.lengths &&
+        g.input.size() == key.input.size() &&
+        std::equal(g.input.begin(), g.input.end(), key.input.begin(), [](const Point2d& a, const Point2d& b) {
+          return std::bit_cast<std::uint64_t>(a.x) == std::bit_cast<std::uint64_t>(b.x) &&
+                 std::bit_cast<std::uint64_t>(a.y) == std::bit_cast<std::uint64_t>(b.y);
+        })) {
+      return &g;
+    }
   }
   return nullptr;
 }
 
-void copy_curves(const std::vector<TaggedPoint>& from, TaggedPointList& curves) {
-  make_room(curves, static_cast<std::int32_t>(from.size()));
-  for (const TaggedPoint& p : from) curves.Add(p);
-}
-
-// Copies the curves of the group equal to `key` into `curves`, remembered or
-// offset by another thread meanwhile (waited for); false when there are none,
-// `claim` then holding the group as pending on the calling thread until
-// settle_group.
-bool recall_group(const RememberedGroup& key, TaggedPointList& curves, std::shared_ptr<PendingGroup>& claim) {
+// Copies the curves of the remembered group equal to `key` into `curves`;
+// false when none is remembered.
+bool recall_group(const RememberedGroup& key, TaggedPointList& curves) {
   GroupMemory& memory = group_memory();
-  std::unique_lock<std::mutex> lock(memory.mutex);
-  for (;;) {
-    if (RememberedGroup* known = find_group(memory.groups, key)) {
-      known->used = ++memory.clock;
-      copy_curves(known->output, curves);
-      return true;
-    }
-    auto it = std::find_if(memory.pending.begin(), memory.pending.end(),
-                           [&](const std::shared_ptr<PendingGroup>& p) { return same_group(*p->key, key); });
-    if (it == memory.pending.end()) break;
-    const std::shared_ptr<PendingGroup> other = *it;
-    memory.settled.wait(lock, [&] { return other->done || other->failed; });
-    if (other->done) {
-      copy_curves(other->output, curves);
-      return true;
-    }
-    // Given up there: look again, and offset it here if nobody else does.
-  }
-  claim = std::make_shared<PendingGroup>();
-  claim->key = &key;
-  memory.pending.push_back(claim);
-  return false;
+  std::lock_guard<std::mutex> lock(memory.mutex);
+  RememberedGroup* known = find_group(memory.groups, key);
+  if (!known) return false;
+  known->used = ++memory.clock;
+  make_room(curves, static_cast<std::int32_t>(known->output.size()));
+  for (const TaggedPoint& p : known->output) curves.Add(p);
+  return true;
 }
-
-// Ends the calling thread's pending group: done with `curves`, or given up
-// (curves null); the threads waiting for it go on.
-void settle_group(std::shared_ptr<PendingGroup>& claim, const TaggedPointList* curves) {
-  if (!claim) return;
-  GroupMemory& memory = group_memory();
-  {
-    std::lock_guard<std::mutex> lock(memory.mutex);
-    if (curves) {
-      claim->output.assign(curves->begin(), curves->end());
-      claim->done = true;
-    } else {
-      claim->failed = true;
-    }
-    memory.pending.erase(std::find(memory.pending.begin(), memory.pending.end(), claim));
-  }
-  memory.settled.notify_all();
-  claim.reset();
-}
-
-// Gives a pending group up when its offset ends early.
-struct PendingClaim {
-  std::shared_ptr<PendingGroup> group;
-  ~PendingClaim() { settle_group(group, nullptr); }
-};
 
 void remember_group(RememberedGroup&& group) {
   const std::size_t size = group.input.size() + group.output.size();
@@ -317,8 +251,7 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
     }
     key.hash = hash;
     curves.Clear();
-    PendingClaim claim;
-    if (!recall_group(key, curves, claim.group)) {
+    if (!recall_group(key, curves)) {
       engine_.reset();
       std::int32_t tag = 0;  // the polyline's number within the group
       for (std::size_t r = 0; r < runs.size(); ++r) {
@@ -339,7 +272,6 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
       out_ = &curves;
       emit_offsets(engine_, *this);
       out_ = &list;
-      settle_group(claim.group, &curves);
       key.output.assign(curves.begin(), curves.end());
       remember_group(std::move(key));
     }
