@@ -36,11 +36,13 @@ namespace zt {
 namespace {
 
 // Groups and points remembered; the least recently used group goes first.
-constexpr std::size_t kRememberedGroups = 64;
-constexpr std::size_t kRememberedGroupPoints = std::size_t{1} << 16;
+constexpr std::size_t kRememberedGroups = 256;
+constexpr std::size_t kRememberedGroupPoints = std::size_t{1} << 18;
 // More polylines than this are offset as one group (the grouping compares
 // boxes pairwise within a sweep).
 constexpr std::size_t kMaxGroupedPolylines = 4096;
+// Room the lists of a group's curves start with.
+constexpr std::int32_t kGroupListCapacity = 4096;
 
 struct FedRun {
   std::int32_t begin = 0;  // into the fed points
@@ -225,8 +227,8 @@ std::int32_t SlopeDomain::compute_in_groups(TaggedPointList& list, std::int32_t 
   std::int32_t groups = 0;
   const std::vector<std::int32_t> group = group_runs(runs, 2.0 * request.t + kGroupGapMargin, groups);
 
-  TaggedPointList result(0, kRememberedGroupPoints / 16);
-  TaggedPointList curves(0, kRememberedGroupPoints / 16);
+  TaggedPointList result(0, kGroupListCapacity);
+  TaggedPointList curves(0, kGroupListCapacity);
   for (std::int32_t g = 0; g < groups; ++g) {
     RememberedGroup key;
     key.distanceBits = std::bit_cast<std::uint64_t>(offsetDistance);
