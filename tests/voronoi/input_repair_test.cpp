@@ -128,6 +128,7 @@ TEST_P(SegmentRepair, LeavesTheExpectedInput) {
     if (w[0] == "sp") answer = RepairSegmentPoint(a, b);
     if (w[0] == "ss") answer = RepairSegmentSegment(a, b);
     if (w[0] == "input") answer = RepairInput(a, SEG, w[2] == "all");
+    if (w[0] == "point") answer = RepairInput(a, PNT, false);
     EXPECT_EQ(answer, w.back() == "1") << call;
   }
   const Keys want(row().field(3));
