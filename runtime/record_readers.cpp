@@ -154,16 +154,11 @@ std::int64_t CZi4UnformattedSequentialFileReader::readNextRecord(void* buffer,
   std::int64_t remaining = buffer ? std::max<std::int64_t>(capacity, 0) : 0;
   // A record of one segment whose bytes are buffered and whose lengths agree
   // is taken in place; anything else goes the general way below.
-  if (pending_ < kContinuedSegment) {
-    const int n = pending_;
-    const unsigned char* segment = peekBytes(static_cast<std::size_t>(n) + 2);
-    if (segment && segment[n] == n) {
-      pending_ = segment[n + 1];
-      const std::int64_t copied = std::min<std::int64_t>(n, remaining);
-      if (copied > 0) std::memcpy(out, segment, static_cast<std::size_t>(copied));
-      skipBytes(static_cast<std::size_t>(n) + 2);
-      return n;
-    }
+  int inPlace = 0;
+  if (const unsigned char* data = takeSegmentInPlace(inPlace)) {
+    const std::int64_t copied = std::min<std::int64_t>(inPlace, remaining);
+    if (copied > 0) std::memcpy(out, data, static_cast<std::size_t>(copied));
+    return inPlace;
   }
   std::int64_t total = 0;
   // Data, trailing length and the next segment's leading length in one read.
@@ -194,15 +189,20 @@ std::int64_t CZi4UnformattedSequentialFileReader::readNextRecord(void* buffer,
   return total;
 }
 
-const unsigned char* CZi4UnformattedSequentialFileReader::takeRecordInPlace(int& length) {
+const unsigned char* CZi4UnformattedSequentialFileReader::takeSegmentInPlace(int& length) {
   if (pending_ >= kContinuedSegment) return nullptr;
   const int n = pending_;
   const unsigned char* segment = peekBytes(static_cast<std::size_t>(n) + 2);
   if (!segment || segment[n] != n) return nullptr;
   pending_ = segment[n + 1];
   skipBytes(static_cast<std::size_t>(n) + 2);
-  if (n != 0) countRecord();  // as nextRecord counts
   length = n;
+  return segment;
+}
+
+const unsigned char* CZi4UnformattedSequentialFileReader::takeRecordInPlace(int& length) {
+  const unsigned char* segment = takeSegmentInPlace(length);
+  if (segment && length != 0) countRecord();  // as nextRecord counts
   return segment;
 }
 

@@ -97,6 +97,10 @@ class CZi4UnformattedSequentialFileReader : public VCZi4UnformattedFileReader {
   int seekRecord(std::int64_t offset, std::int64_t recordsRead);
 
  private:
+  // takeRecordInPlace without the count, for readNextRecord, whose caller
+  // counts.
+  const unsigned char* takeSegmentInPlace(int& length);
+
   std::uint8_t pending_ = 0;
 };
 
